@@ -1,0 +1,17 @@
+# Warnings as errors for every target of the project, and the sanitizers a preset asks for.
+
+set(QVX_SANITIZE "" CACHE STRING "Sanitizers, as for -fsanitize= (address,undefined or thread)")
+
+add_compile_options(
+    -Wall -Wextra -Werror
+    -Wcast-align -Wconversion -Wno-sign-conversion -Wformat=2 -Wimplicit-fallthrough -Wshadow
+    -Wno-maybe-uninitialized  # GCC cannot follow std::variant and std::optional
+    $<$<COMPILE_LANGUAGE:CXX>:-Wnon-virtual-dtor>
+    $<$<COMPILE_LANGUAGE:CXX>:-Wold-style-cast>
+    $<$<COMPILE_LANGUAGE:CXX>:-Woverloaded-virtual>)
+
+if(QVX_SANITIZE)
+    add_compile_options(-fsanitize=${QVX_SANITIZE} -fno-sanitize-recover=all
+                        -fno-omit-frame-pointer)
+    add_link_options(-fsanitize=${QVX_SANITIZE})
+endif()

@@ -1,0 +1,45 @@
+# The target "lint": clang-format on every C++ file, and clang-tidy on every source that is neither
+# a test nor a fuzzer, each file again only when it, a header or the configuration has changed.
+
+find_program(CLANG_FORMAT clang-format REQUIRED)
+find_program(CLANG_TIDY clang-tidy REQUIRED)
+
+set(lint_sources "")
+set(lint_headers "")
+foreach(component IN LISTS QVX_COMPONENTS)
+    file(GLOB_RECURSE found CONFIGURE_DEPENDS ${CMAKE_SOURCE_DIR}/${component}/*.cpp)
+    list(APPEND lint_sources ${found})
+    file(GLOB_RECURSE found CONFIGURE_DEPENDS ${CMAKE_SOURCE_DIR}/${component}/*.h)
+    list(APPEND lint_headers ${found})
+endforeach()
+list(REMOVE_DUPLICATES lint_sources)
+list(REMOVE_DUPLICATES lint_headers)
+
+set(lint_stamps "")
+foreach(file IN LISTS lint_sources lint_headers)
+    file(RELATIVE_PATH name ${CMAKE_SOURCE_DIR} ${file})
+    string(REPLACE "/" "_" stamp ${name})
+    set(stamp ${CMAKE_BINARY_DIR}/lint/${stamp})
+    add_custom_command(OUTPUT ${stamp}.format
+        COMMAND ${CLANG_FORMAT} --dry-run --Werror ${file}
+        COMMAND ${CMAKE_COMMAND} -E touch ${stamp}.format
+        DEPENDS ${file} ${CMAKE_SOURCE_DIR}/.clang-format
+        COMMENT "clang-format ${name}" VERBATIM)
+    list(APPEND lint_stamps ${stamp}.format)
+endforeach()
+list(FILTER lint_sources EXCLUDE REGEX "/(tests|fuzz)/")
+foreach(file IN LISTS lint_sources)
+    file(RELATIVE_PATH name ${CMAKE_SOURCE_DIR} ${file})
+    string(REPLACE "/" "_" stamp ${name})
+    set(stamp ${CMAKE_BINARY_DIR}/lint/${stamp})
+    # Findings go to standard output; standard error only counts suppressed ones.
+    add_custom_command(OUTPUT ${stamp}.tidy
+        COMMAND sh -c "exec \"$@\" 2>/dev/null" sh ${CLANG_TIDY} --quiet -p ${CMAKE_BINARY_DIR}
+                --extra-arg=-Wno-unknown-warning-option ${file}
+        COMMAND ${CMAKE_COMMAND} -E touch ${stamp}.tidy
+        DEPENDS ${file} ${lint_headers} ${CMAKE_SOURCE_DIR}/.clang-tidy
+        COMMENT "clang-tidy ${name}" VERBATIM)
+    list(APPEND lint_stamps ${stamp}.tidy)
+endforeach()
+file(MAKE_DIRECTORY ${CMAKE_BINARY_DIR}/lint)
+add_custom_target(lint DEPENDS ${lint_stamps})
