@@ -1,0 +1,23 @@
+// SPDX-License-Identifier: Apache-2.0
+// For parts of the platform only, not for services: becoming the service manager.
+#pragma once
+
+#include <android/binder_ibinder.h>
+
+__BEGIN_DECLS
+
+/** Makes a local object the one every process reaches as handle 0, for as long as this process
+ * lives, and takes a strong reference to it. STATUS_OK, STATUS_UNEXPECTED_NULL for null,
+ * STATUS_INVALID_OPERATION for a proxy, else what the driver says, with a line on the log: -EBUSY
+ * when there is a manager, -EPERM when an earlier one ran as another user. */
+binder_status_t ABinderProcess_becomeContextManager(AIBinder* binder);
+
+/** True when the object promises VINTF stability, so that a manifest has to declare its name. */
+bool AIBinder_requiresVintfDeclaration(AIBinder* binder);
+
+/** Gives a proxy its class without asking the object for its descriptor: for a process that must
+ * not wait for its clients. Calls to an object of another interface are refused by that object.
+ * True when the proxy has this class now. */
+bool AIBinder_assumeClass(AIBinder* binder, const AIBinder_Class* clazz);
+
+__END_DECLS

@@ -1,0 +1,55 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "kernel_log.h"
+
+#include <fcntl.h>
+#include <sys/klog.h>
+#include <unistd.h>
+
+#include <sstream>
+#include <string_view>
+
+namespace qvx::test {
+namespace {
+
+constexpr std::string_view kBegin = "qvx-test: complaints expected from here\n";
+constexpr std::string_view kEnd = "qvx-test: complaints expected up to here\n";
+constexpr int kReadAll = 3;      // SYSLOG_ACTION_READ_ALL of syslog(2)
+constexpr int kSizeBuffer = 10;  // SYSLOG_ACTION_SIZE_BUFFER
+
+void writeMarker(std::string_view text) {
+    const int fd = open("/dev/kmsg", O_WRONLY | O_CLOEXEC);
+    if (fd < 0) return;
+    [[maybe_unused]] const ssize_t written = write(fd, text.data(), text.size());
+    close(fd);
+}
+
+std::string readKernelLog() {
+    const int size = klogctl(kSizeBuffer, nullptr, 0);
+    std::string text(size > 0 ? static_cast<size_t>(size) : 0, '\0');
+    const int count = klogctl(kReadAll, text.data(), size);
+    text.resize(count > 0 ? static_cast<size_t>(count) : 0);
+    return text;
+}
+
+}  // namespace
+
+ExpectBinderComplaints::ExpectBinderComplaints() {
+    writeMarker(kBegin);
+}
+ExpectBinderComplaints::~ExpectBinderComplaints() {
+    writeMarker(kEnd);
+}
+
+std::vector<std::string> binderComplaints() {
+    std::vector<std::string> complaints;
+    std::istringstream log(readKernelLog());
+    bool expected = false;
+    for (std::string line; std::getline(log, line);) {
+        if (line.find("complaints expected from here") != std::string::npos) expected = true;
+        if (line.find("complaints expected up to here") != std::string::npos) expected = false;
+        if (!expected && line.find("binder") != std::string::npos) complaints.push_back(line);
+    }
+    return complaints;
+}
+
+}  // namespace qvx::test

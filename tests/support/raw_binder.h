@@ -1,0 +1,73 @@
+// SPDX-License-Identifier: Apache-2.0
+// A client that talks to /dev/binder without the binder library, so that a test can send what the
+// library never would, and so that the library is not its own witness.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace qvx::test {
+
+// The bytes of a request, written word by word.
+class RequestBytes {
+  public:
+    RequestBytes& int32(int32_t value);
+    RequestBytes& string16(std::string_view ascii);
+    // Strict-mode word, work-source word, header word 'SYST', descriptor.
+    RequestBytes& token(std::string_view descriptor);
+    // A null binder object with its stability word.
+    RequestBytes& nullBinder();
+    RequestBytes& bytes(size_t count, uint8_t value);
+
+    const std::vector<uint8_t>& data() const { return data_; }
+
+  private:
+    std::vector<uint8_t> data_;
+};
+
+struct RawReply {
+    enum class Kind {
+        kData,    // BR_REPLY with data
+        kStatus,  // BR_REPLY with TF_STATUS_CODE: `status` is the callee's
+        kDead,    // BR_DEAD_REPLY
+        kFailed,  // BR_FAILED_REPLY: the driver refused the request
+        kError,   // the ioctl failed
+    };
+    Kind kind = Kind::kError;
+    int32_t status = 0;
+    std::vector<uint8_t> data;
+    std::vector<uint32_t> handles;  // of the remote objects in data; each acquired once
+
+    // The 32-bit word at byte `offset` of the data; 0 past its end.
+    int32_t word(size_t offset) const;
+};
+
+// One open binder driver. Not thread-safe. Every buffer is freed at once; acquired handles live as
+// long as the object.
+class RawBinder {
+  public:
+    RawBinder();
+    ~RawBinder();
+    RawBinder(const RawBinder&) = delete;
+    RawBinder& operator=(const RawBinder&) = delete;
+
+    bool isOpen() const { return fd_ >= 0; }
+
+    // Sends a two-way request and waits for the answer.
+    RawReply transact(uint32_t handle, uint32_t code, const std::vector<uint8_t>& data,
+                      const std::vector<uint64_t>& offsets = {});
+
+    // Asks the service manager for a service's handle.
+    std::optional<uint32_t> checkService(std::string_view name);
+
+  private:
+    int fd_ = -1;
+    void* map_ = nullptr;
+    std::vector<uint8_t> pending_;  // commands to send with the next request
+};
+
+}  // namespace qvx::test
