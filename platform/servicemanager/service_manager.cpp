@@ -1,0 +1,332 @@
+// SPDX-License-Identifier: Apache-2.0
+//
+// The binder side of the service manager: see service_manager.h.
+//
+// The stub is written by hand because it has to behave as the C++ backend's does, which the phone's
+// own service manager uses: a null where none is allowed is answered with the exception
+// EX_NULL_POINTER in an ordinary reply, where generated NDK code would fail the transaction.
+#include "service_manager.h"
+
+#include <cstdio>
+#include <optional>
+#include <utility>
+#include <vector>
+
+#include <android/binder_parcel_utils.h>
+#include <android/binder_status.h>
+#include <binder_context_manager.h>
+#include <fmt/format.h>
+
+namespace servicemanager {
+
+namespace {
+
+/// Bit of the dump priorities under which the service manager lists itself.
+constexpr int32_t kDumpPriorityDefault = 8;
+
+/// The one method of android.os.IServiceCallback.
+constexpr transaction_code_t kOnRegistration = FIRST_CALL_TRANSACTION;
+
+void log(const std::string& line) {
+    fmt::print(stderr, "servicemanager: {}\n", line);
+}
+
+/// A name as the log shows it. It comes from outside, so it may hold anything.
+std::string shown(const std::string& name) {
+    constexpr size_t kEnough = 200;
+    return fmt::format("{:?}", name.substr(0, kEnough));
+}
+
+Caller callerOfThisTransaction() {
+    return {AIBinder_getCallingPid(), AIBinder_getCallingUid()};
+}
+
+/// Takes over one strong reference.
+Object adopt(AIBinder* binder) {
+    return binder == nullptr ? nullptr : Object(binder, AIBinder_decStrong);
+}
+
+// Callbacks are called from here and never served here, so their class has no behaviour.
+const AIBinder_Class* registrationCallbackClass() {
+    static const AIBinder_Class* const clazz = AIBinder_Class_define(
+            "android.os.IServiceCallback", [](void*) -> void* { return nullptr; }, [](void*) {},
+            [](AIBinder*, transaction_code_t, const AParcel*, AParcel*) -> binder_status_t {
+                return STATUS_UNKNOWN_TRANSACTION;
+            });
+    return clazz;
+}
+
+binder_status_t read(const AParcel* in, std::string* value) {
+    return ndk::AParcel_readString(in, value);
+}
+
+binder_status_t read(const AParcel* in, bool* value) {
+    return AParcel_readBool(in, value);
+}
+
+binder_status_t read(const AParcel* in, int32_t* value) {
+    return AParcel_readInt32(in, value);
+}
+
+/// No binder argument of this interface may be null.
+binder_status_t read(const AParcel* in, Object* value) {
+    AIBinder* binder = nullptr;
+    const binder_status_t status = AParcel_readStrongBinder(in, &binder);
+    *value = adopt(binder);
+    return status == STATUS_OK && binder == nullptr ? STATUS_UNEXPECTED_NULL : status;
+}
+
+/// Reads the arguments in order, up to the first failure.
+template <typename... Value>
+binder_status_t readArguments(const AParcel* in, Value*... values) {
+    binder_status_t status = STATUS_OK;
+    static_cast<void>((((status = read(in, values)) == STATUS_OK) && ...));
+    return status;
+}
+
+binder_status_t write(AParcel* out, bool value) {
+    return AParcel_writeBool(out, value);
+}
+
+binder_status_t write(AParcel* out, const Object& value) {
+    return AParcel_writeStrongBinder(out, value.get());
+}
+
+binder_status_t write(AParcel* out, const std::vector<std::string>& value) {
+    return ndk::AParcel_writeVector(out, value);
+}
+
+binder_status_t write(AParcel* out, const std::optional<std::string>& value) {
+    return ndk::AParcel_writeString(out, value);
+}
+
+/// A parcelable array element: presence, size (counting itself), name, pid.
+binder_status_t write(AParcel* out, const ServiceDebugInfo& value) {
+    binder_status_t status = AParcel_writeInt32(out, 1);
+    const int32_t start = AParcel_getDataPosition(out);
+    if (status == STATUS_OK) status = AParcel_writeInt32(out, 0);
+    if (status == STATUS_OK) status = ndk::AParcel_writeString(out, value.name);
+    if (status == STATUS_OK) status = AParcel_writeInt32(out, value.pid);
+    if (status != STATUS_OK) return status;
+    const int32_t end = AParcel_getDataPosition(out);
+    status = AParcel_setDataPosition(out, start);
+    if (status == STATUS_OK) status = AParcel_writeInt32(out, end - start);
+    if (status == STATUS_OK) status = AParcel_setDataPosition(out, end);
+    return status;
+}
+
+binder_status_t write(AParcel* out, const std::vector<ServiceDebugInfo>& values) {
+    binder_status_t status = AParcel_writeInt32(out, static_cast<int32_t>(values.size()));
+    for (const ServiceDebugInfo& value : values) {
+        if (status == STATUS_OK) status = write(out, value);
+    }
+    return status;
+}
+
+binder_status_t writeException(AParcel* out, binder_exception_t exception) {
+    const ndk::ScopedAStatus header = ndk::ScopedAStatus::fromExceptionCode(exception);
+    return AParcel_writeStatusHeader(out, header.get());
+}
+
+/// An ok header and the result.
+template <typename Value>
+binder_status_t reply(AParcel* out, const Value& value) {
+    const binder_status_t status = writeException(out, EX_NONE);
+    return status == STATUS_OK ? write(out, value) : status;
+}
+
+/// The header alone. A refusal is logged here, with the reason that the caller is not told.
+binder_status_t replyVerdict(AParcel* out, const char* method, const std::string& name,
+                             const Verdict& verdict) {
+    if (!verdict.ok()) {
+        const Caller caller = callerOfThisTransaction();
+        log(fmt::format("{} {} refused to pid {}, uid {}: {}", method, shown(name), caller.pid,
+                        caller.uid, verdict.reason));
+    }
+    return writeException(out, verdict.exception);
+}
+
+}  // namespace
+
+// By transaction code, from FIRST_CALL_TRANSACTION. Starting a service on request is init's work,
+// and there is no init here: getService and checkService are the same.
+const ServiceManager::Serve ServiceManager::kMethods[12] = {
+        /*  1 getService                 */ &ServiceManager::find,
+        /*  2 checkService               */ &ServiceManager::find,
+        /*  3 addService                 */ &ServiceManager::addService,
+        /*  4 listServices               */ &ServiceManager::listServices,
+        /*  5 registerForNotifications   */ &ServiceManager::registerForNotifications,
+        /*  6 unregisterForNotifications */ &ServiceManager::unregisterForNotifications,
+        /*  7 isDeclared                 */ &ServiceManager::isDeclared,
+        /*  8 getDeclaredInstances       */ &ServiceManager::getDeclaredInstances,
+        /*  9 updatableViaApex           */ &ServiceManager::updatableViaApex,
+        /* 10 registerClientCallback     */ &ServiceManager::registerClientCallback,
+        /* 11 tryUnregisterService       */ &ServiceManager::tryUnregisterService,
+        /* 12 getServiceDebugInfo        */ &ServiceManager::getServiceDebugInfo,
+};
+
+ServiceManager::ServiceManager(const std::filesystem::path& manifestRoot)
+    : mManifests(manifestRoot, log),
+      mRegistry(*this, [this](const std::string& name) { return mManifests.isDeclared(name); }),
+      mDeathRecipient(AIBinder_DeathRecipient_new(onBinderDied)) {
+    const AIBinder_Class* clazz = AIBinder_Class_define(
+            "android.os.IServiceManager", [](void* self) { return self; }, [](void*) {},
+            onTransact);
+    mBinder = ndk::SpAIBinder(AIBinder_new(clazz, this));
+
+    AIBinder_incStrong(mBinder.get());
+    const Verdict verdict =
+            mRegistry.addService(callerOfThisTransaction(), {.name = "manager",
+                                                             .object = adopt(mBinder.get()),
+                                                             .dumpPriority = kDumpPriorityDefault});
+    if (!verdict.ok()) log(fmt::format("cannot register itself: {}", verdict.reason));
+}
+
+bool ServiceManager::isRemote(const Object& object) {
+    return AIBinder_isRemote(object.get());
+}
+
+bool ServiceManager::watch(const Object& object) {
+    Watch& watch = mWatches[object.get()];
+    watch = {this, object.get()};
+    if (AIBinder_linkToDeath(object.get(), mDeathRecipient.get(), &watch) == STATUS_OK) return true;
+    mWatches.erase(object.get());
+    return false;
+}
+
+void ServiceManager::unwatch(const Object& object) {
+    const auto watch = mWatches.find(object.get());
+    if (watch == mWatches.end()) return;
+    // Fails only for a link that has fired, and then there is nothing to undo.
+    AIBinder_unlinkToDeath(object.get(), mDeathRecipient.get(), &watch->second);
+    mWatches.erase(watch);
+}
+
+void ServiceManager::notifyRegistration(const Object& callback, const std::string& name,
+                                        const Object& service) {
+    AParcel* in = nullptr;
+    AParcel* out = nullptr;
+    binder_status_t status = AIBinder_prepareTransaction(callback.get(), &in);
+    if (status == STATUS_OK) status = ndk::AParcel_writeString(in, name);
+    if (status == STATUS_OK) status = write(in, service);
+    if (status == STATUS_OK) {
+        status = AIBinder_transact(callback.get(), kOnRegistration, &in, &out, FLAG_ONEWAY);
+    }
+    AParcel_delete(in);
+    AParcel_delete(out);
+    if (status != STATUS_OK) {
+        log(fmt::format("a callback for {} could not be told: status {}", shown(name), status));
+    }
+}
+
+binder_status_t ServiceManager::onTransact(AIBinder* binder, transaction_code_t code,
+                                           const AParcel* in, AParcel* out) {
+    const size_t index = code - FIRST_CALL_TRANSACTION;
+    if (index >= std::size(kMethods)) return STATUS_UNKNOWN_TRANSACTION;
+    auto* self = static_cast<ServiceManager*>(AIBinder_getUserData(binder));
+    const binder_status_t status = (self->*kMethods[index])(in, out);
+    if (status != STATUS_UNEXPECTED_NULL) return status;
+    AParcel_reset(out);
+    return writeException(out, EX_NULL_POINTER);
+}
+
+void ServiceManager::onBinderDied(void* cookie) {
+    const Watch watch = *static_cast<Watch*>(cookie);
+    watch.manager->mWatches.erase(watch.object);
+    for (const std::string& name : watch.manager->mRegistry.objectDied(watch.object)) {
+        log(fmt::format("{} is gone: its process has died", shown(name)));
+    }
+}
+
+binder_status_t ServiceManager::find(const AParcel* in, AParcel* out) {
+    std::string name;
+    const binder_status_t status = readArguments(in, &name);
+    if (status != STATUS_OK) return status;
+    return reply(out, mRegistry.find(callerOfThisTransaction(), name));
+}
+
+binder_status_t ServiceManager::addService(const AParcel* in, AParcel* out) {
+    Registration registration;
+    const binder_status_t status =
+            readArguments(in, &registration.name, &registration.object, &registration.allowIsolated,
+                          &registration.dumpPriority);
+    if (status != STATUS_OK) return status;
+    registration.requiresDeclaration = AIBinder_requiresVintfDeclaration(registration.object.get());
+    return replyVerdict(out, "addService", registration.name,
+                        mRegistry.addService(callerOfThisTransaction(), registration));
+}
+
+binder_status_t ServiceManager::listServices(const AParcel* in, AParcel* out) {
+    int32_t dumpPriority = 0;
+    const binder_status_t status = readArguments(in, &dumpPriority);
+    if (status != STATUS_OK) return status;
+    return reply(out, mRegistry.list(dumpPriority));
+}
+
+binder_status_t ServiceManager::registerForNotifications(const AParcel* in, AParcel* out) {
+    std::string name;
+    Object callback;
+    const binder_status_t status = readArguments(in, &name, &callback);
+    if (status != STATUS_OK) return status;
+    // An object of another interface is accepted like any other. Calls to it would be refused on
+    // the other side; here they fail already.
+    AIBinder_associateClass(callback.get(), registrationCallbackClass());
+    return replyVerdict(out, "registerForNotifications", name,
+                        mRegistry.registerForNotifications(name, callback));
+}
+
+binder_status_t ServiceManager::unregisterForNotifications(const AParcel* in, AParcel* out) {
+    std::string name;
+    Object callback;
+    const binder_status_t status = readArguments(in, &name, &callback);
+    if (status != STATUS_OK) return status;
+    return replyVerdict(out, "unregisterForNotifications", name,
+                        mRegistry.unregisterForNotifications(name, callback));
+}
+
+binder_status_t ServiceManager::isDeclared(const AParcel* in, AParcel* out) {
+    std::string name;
+    const binder_status_t status = readArguments(in, &name);
+    if (status != STATUS_OK) return status;
+    return reply(out, mManifests.isDeclared(name));
+}
+
+binder_status_t ServiceManager::getDeclaredInstances(const AParcel* in, AParcel* out) {
+    std::string interface;
+    const binder_status_t status = readArguments(in, &interface);
+    if (status != STATUS_OK) return status;
+    return reply(out, mManifests.instancesOf(interface));
+}
+
+binder_status_t ServiceManager::updatableViaApex(const AParcel* in, AParcel* out) {
+    std::string name;
+    const binder_status_t status = readArguments(in, &name);
+    if (status != STATUS_OK) return status;
+    return reply(out, mManifests.updatableViaApex(name));
+}
+
+binder_status_t ServiceManager::registerClientCallback(const AParcel* in, AParcel* out) {
+    std::string name;
+    Object service;
+    Object callback;
+    const binder_status_t status = readArguments(in, &name, &service, &callback);
+    if (status != STATUS_OK) return status;
+    return replyVerdict(
+            out, "registerClientCallback", name,
+            mRegistry.registerClientCallback(callerOfThisTransaction(), name, service, callback));
+}
+
+binder_status_t ServiceManager::tryUnregisterService(const AParcel* in, AParcel* out) {
+    std::string name;
+    Object service;
+    const binder_status_t status = readArguments(in, &name, &service);
+    if (status != STATUS_OK) return status;
+    return replyVerdict(out, "tryUnregisterService", name,
+                        mRegistry.tryUnregisterService(callerOfThisTransaction(), name, service));
+}
+
+binder_status_t ServiceManager::getServiceDebugInfo(const AParcel*, AParcel* out) {
+    return reply(out, mRegistry.debugInfo());
+}
+
+}  // namespace servicemanager
