@@ -1,0 +1,300 @@
+// SPDX-License-Identifier: Apache-2.0
+//
+// What the driver offers: features, perform method, amplitude control and intensity lists.
+#include <cerrno>
+#include <string>
+#include <vector>
+
+#include "service_test.h"
+
+namespace aidl::android::hardware::vibrator {
+namespace {
+
+using imitated::Access;
+using imitated::Operation;
+using ::testing::Contains;
+using ::testing::ElementsAre;
+using ::testing::IsEmpty;
+
+const std::string kFunctions = kInfo + "functions";
+
+class Capabilities : public ServiceTest {
+  protected:
+    Capabilities() { addLedsClass(); }
+};
+
+using HasFeature = Capabilities;
+
+TEST_F(HasFeature, WordWithinALongerWordCounts) {
+    kernel.addNode(kFunctions, "FIFO_HAPTIC_ENGINE\n", Access::kReadOnly);
+    const auto hwApi = makeHwApi();
+    EXPECT_EQ(hwApi->hasFeature(qvx_features::FIFO_HAPTIC_ENGINE), 1);
+    EXPECT_EQ(hwApi->hasFeature(qvx_features::HAPTIC_ENGINE), 1);
+    EXPECT_EQ(hwApi->hasFeature(qvx_features::HYBRID_HAPTIC_ENGINE), 0);
+}
+
+TEST_F(HasFeature, ForceTouchIntensityAnswersForIntensityToo) {
+    kernel.addNode(kFunctions, "FORCE_TOUCH_INTENSITY\n", Access::kReadOnly);
+    EXPECT_EQ(makeHwApi()->hasFeature(qvx_features::INTENSITY), 1);
+}
+
+TEST_F(HasFeature, EachFeatureAsksForItsOwnWord) {
+    static constexpr struct {
+        qvx_features feature;
+        const char* word;
+    } kFeatures[] = {
+            {qvx_features::INTENSITY, "INTENSITY"},
+            {qvx_features::FORCE_TOUCH_INTENSITY, "FORCE_TOUCH_INTENSITY"},
+            {qvx_features::MULTI_FREQUENCY, "MULTI_FREQUENCY"},
+            {qvx_features::HAPTIC_ENGINE, "HAPTIC_ENGINE"},
+            {qvx_features::INDEX_HAPTIC_PATTERN, "INDEX_HAPTIC_PATTERN"},
+            {qvx_features::KYPINDEX_HAPTIC_PATTERN, "KYPINDEX_HAPTIC_PATTERN"},
+            {qvx_features::ENHANCED_HAPTIC_ENGINE, "ENHANCED_HAPTIC_ENGINE"},
+            {qvx_features::FIFO_HAPTIC_ENGINE, "FIFO_HAPTIC_ENGINE"},
+            {qvx_features::HYBRID_HAPTIC_ENGINE, "HYBRID_HAPTIC_ENGINE"},
+            {qvx_features::ENHANCED_HYBRID_HAPTIC_ENGINE, "ENHANCED_HYBRID_HAPTIC_ENGINE"},
+            {qvx_features::CAPABILITY_EXTERNAL_CONTROL, "CAPABILITY_EXTERNAL_CONTROL"},
+            {qvx_features::COMMON_INPUTFF_INTERFACE, "COMMON_INPUTFF_INTERFACE"},
+            {qvx_features::PRIMITIVE_EFFECT_COMPOSE, "PRIMITIVE_EFFECT_COMPOSE"},
+    };
+    const auto hwApi = makeHwApi();
+    for (const auto& [feature, word] : kFeatures) {
+        const std::string text(word);
+        kernel.addNode(kFunctions, text);
+        EXPECT_EQ(hwApi->hasFeature(feature), 1) << word;
+        kernel.addNode(kFunctions, text.substr(0, text.size() - 1));
+        EXPECT_EQ(hwApi->hasFeature(feature), 0) << word;
+    }
+}
+
+TEST_F(HasFeature, EveryLineReadIsLoggedUpToTheMatch) {
+    kernel.addNode(kFunctions, "MULTI_FREQUENCY\nHAPTIC_ENGINE\nINTENSITY\n", Access::kReadOnly);
+    const auto hwApi = makeHwApi();
+    EXPECT_EQ(hwApi->hasFeature(qvx_features::HAPTIC_ENGINE), 1);
+    // The line's own line feed goes to the logger, which makes an empty record of what follows it.
+    EXPECT_THAT(log.lines(),
+                ElementsAre("I HW_API: [hasFeature] debug functions=MULTI_FREQUENCY", "I ",
+                            "I HW_API: [hasFeature] debug functions=HAPTIC_ENGINE", "I "));
+    EXPECT_EQ(kernel.calls().front(),
+              "open /sys/class/vib_info_class/vib_support_info/functions O_RDONLY");
+    EXPECT_EQ(kernel.calls().back(), "close /sys/class/vib_info_class/vib_support_info/functions");
+}
+
+TEST_F(HasFeature, WordsOfOneLineAreAllFound) {
+    kernel.addNode(kFunctions, "INTENSITY HAPTIC_ENGINE PRIMITIVE_EFFECT_COMPOSE",
+                   Access::kReadOnly);
+    const auto hwApi = makeHwApi();
+    EXPECT_EQ(hwApi->hasFeature(qvx_features::PRIMITIVE_EFFECT_COMPOSE), 1);
+    EXPECT_THAT(log.lines(), ElementsAre("I HW_API: [hasFeature] debug functions=INTENSITY "
+                                         "HAPTIC_ENGINE PRIMITIVE_EFFECT_COMPOSE"));
+}
+
+TEST_F(HasFeature, WordSplitByThe1023CharacterLimitIsNotFound) {
+    kernel.addNode(kFunctions, std::string(1020, 'x') + "INTENSITY\n", Access::kReadOnly);
+    EXPECT_EQ(makeHwApi()->hasFeature(qvx_features::INTENSITY), 0);
+}
+
+TEST_F(HasFeature, EmptyListIsNo) {
+    kernel.addNode(kFunctions, "", Access::kReadOnly);
+    EXPECT_EQ(makeHwApi()->hasFeature(qvx_features::INTENSITY), 0);
+}
+
+TEST_F(HasFeature, MissingListIsMinusOne) {
+    const auto hwApi = makeHwApi();
+    EXPECT_EQ(hwApi->hasFeature(qvx_features::INTENSITY), -1);
+    EXPECT_THAT(log.lines(), ElementsAre("I HW_API: [hasFeature]fopen error!!"));
+}
+
+TEST_F(HasFeature, ListThatCannotBeReadIsNo) {
+    kernel.addNode(kFunctions, "INTENSITY\n", Access::kReadOnly);
+    kernel.addFault({.path = kFunctions, .operation = Operation::kRead, .error = EIO});
+    EXPECT_EQ(makeHwApi()->hasFeature(qvx_features::INTENSITY), 0);
+}
+
+TEST_F(HasFeature, InterruptedReadIsRepeated) {
+    kernel.addNode(kFunctions, "INTENSITY\n", Access::kReadOnly);
+    kernel.addFault(
+            {.path = kFunctions, .operation = Operation::kRead, .error = EINTR, .times = 2});
+    EXPECT_EQ(makeHwApi()->hasFeature(qvx_features::INTENSITY), 1);
+}
+
+TEST_F(HasFeature, NumberThatIsNoFeatureIsNo) {
+    kernel.addNode(kFunctions, "INTENSITY\n", Access::kReadOnly);
+    const auto hwApi = makeHwApi();
+    EXPECT_EQ(hwApi->hasFeature(static_cast<qvx_features>(13)), 0);
+    EXPECT_EQ(hwApi->hasFeature(static_cast<qvx_features>(-1)), 0);
+}
+
+using PerformMethod = Capabilities;
+
+TEST_F(PerformMethod, PrebakedIndexComesFirst) {
+    kernel.addNode(kLeds + "cp_trigger_index");
+    kernel.addNode(kLeds + "haptic_engine");
+    kernel.addNode(kLeds + "intensity");
+    const auto hwApi = makeHwApi();
+    EXPECT_EQ(hwApi->getMotorPerformMethod(), 1);
+    EXPECT_THAT(log.lines(),
+                ElementsAre("I HW_API: isNodeExist node:/leds/vibrator/cp_trigger_index",
+                            "I HW_API: true", "I HW_API: getMotorPerformMethod type : 1"));
+}
+
+TEST_F(PerformMethod, HapticEngineComesSecond) {
+    kernel.addNode(kLeds + "haptic_engine");
+    kernel.addNode(kLeds + "intensity");
+    EXPECT_EQ(makeHwApi()->getMotorPerformMethod(), 2);
+}
+
+TEST_F(PerformMethod, IntensityComesThird) {
+    kernel.addNode(kLeds + "intensity");
+    EXPECT_EQ(makeHwApi()->getMotorPerformMethod(), 3);
+}
+
+TEST_F(PerformMethod, NothingIsNone) {
+    const auto hwApi = makeHwApi();
+    EXPECT_EQ(hwApi->getMotorPerformMethod(), 0);
+    EXPECT_EQ(log.lines().back(), "I HW_API: getMotorPerformMethod type : 0");
+}
+
+TEST_F(PerformMethod, ReadOnlyNodeDoesNotCount) {
+    kernel.addNode(kLeds + "cp_trigger_index", "0\n", Access::kReadOnly);
+    kernel.addNode(kLeds + "intensity");
+    EXPECT_EQ(makeHwApi()->getMotorPerformMethod(), 3);
+}
+
+TEST_F(PerformMethod, ForceFeedbackPlaysByIndex) {
+    const auto hwApi = makeHwApi();
+    useForceFeedback = true;
+    EXPECT_EQ(hwApi->getMotorPerformMethod(), 1);
+}
+
+using AmplitudeControl = Capabilities;
+
+TEST_F(AmplitudeControl, IsTheIntensityNode) {
+    const auto hwApi = makeHwApi();
+    EXPECT_FALSE(hwApi->isAmplitudeControlExist());
+    kernel.addNode(kLeds + "intensity");
+    EXPECT_TRUE(hwApi->isAmplitudeControlExist());
+}
+
+TEST_F(AmplitudeControl, ForceFeedbackHasItWithoutLookingAtANode) {
+    const auto hwApi = makeHwApi();
+    useForceFeedback = true;
+    EXPECT_TRUE(hwApi->isAmplitudeControlExist());
+    EXPECT_THAT(kernel.calls(), IsEmpty());
+    EXPECT_THAT(log.lines(), ElementsAre("I HW_API: [isAmplitudeControlExist]return true"));
+}
+
+using DynamicIntensityNode = Capabilities;
+
+TEST_F(DynamicIntensityNode, InformationClassIsPreferred) {
+    kernel.addNode(kInfo + "intensities", "1\n", Access::kReadOnly);
+    kernel.addNode(kInfo + "haptic_intensities", "1\n", Access::kReadOnly);
+    const auto hwApi = makeHwApi();
+    EXPECT_TRUE(hwApi->isDynamicIntensityNodeExist());
+    EXPECT_THAT(log.lines(), ElementsAre("I HW_API: [isDynamicIntensityNodeExist]new dynamic "
+                                         "intensity node exist"));
+    EXPECT_EQ(kernel.calls().size(), 4U);
+}
+
+TEST_F(DynamicIntensityNode, DeviceClassStandsIn) {
+    kernel.addNode(kInfo + "intensities", "1\n", Access::kReadOnly);
+    kernel.addNode(kLeds + "intensities", "1\n", Access::kReadOnly);
+    kernel.addNode(kLeds + "haptic_intensities", "1\n", Access::kReadOnly);
+    const auto hwApi = makeHwApi();
+    EXPECT_TRUE(hwApi->isDynamicIntensityNodeExist());
+    EXPECT_EQ(log.lines().back(),
+              "I HW_API: [isDynamicIntensityNodeExist]old dynamic intensity node exist");
+}
+
+TEST_F(DynamicIntensityNode, HalfAPairOnEachSideIsNone) {
+    kernel.addNode(kInfo + "intensities", "1\n", Access::kReadOnly);
+    kernel.addNode(kLeds + "haptic_intensities", "1\n", Access::kReadOnly);
+    const auto hwApi = makeHwApi();
+    EXPECT_FALSE(hwApi->isDynamicIntensityNodeExist());
+    EXPECT_EQ(log.lines().back(),
+              "I HW_API: [isDynamicIntensityNodeExist]dynamic intensity node Not exist");
+}
+
+class IntensityList : public Capabilities {
+  protected:
+    // The list that the node's text gives, or -1 alone for a failure.
+    std::vector<int> listOf(const std::string& text) {
+        kernel.addNode(kInfo + "intensities", text, Access::kReadOnly);
+        const auto hwApi = makeHwApi();
+        std::vector<int> list;
+        return hwApi->getDynamicIntensityList(true, list) ? list : std::vector<int>{-1};
+    }
+};
+
+TEST_F(IntensityList, NumbersStandBetweenCommas) {
+    EXPECT_THAT(listOf("100,200, 300\n"), ElementsAre(100, 200, 300));
+    EXPECT_THAT(log.lines(),
+                ElementsAre("I V_2_0: [getDynamicIntensityList]isDefaultType: 1",
+                            "I HW_API: >> readNodeAsString "
+                            "node:/vib_info_class/vib_support_info/intensities",
+                            "I HW_API: << readNodeAsString success - length: 12",
+                            "I V_2_0: [getDynamicIntensityList]raw value: 100,200, 300",
+                            "I V_2_0: [getDynamicIntensityList]list size: 3"));
+}
+
+TEST_F(IntensityList, TextAfterANumberIsIgnored) {
+    EXPECT_THAT(listOf("100mV,-5x, 7 8"), ElementsAre(100, -5, 7));
+}
+
+TEST_F(IntensityList, PieceWithoutDigitsIsSkippedAndTheOrderKept) {
+    EXPECT_THAT(listOf("1,,x2, ,3,"), ElementsAre(1, 3));
+}
+
+TEST_F(IntensityList, NumberBeyond32BitsIsSkipped) {
+    EXPECT_THAT(listOf("2147483648,5,-2147483649,2147483647,-2147483648,99999999999999999999999"),
+                ElementsAre(5, 2147483647, -2147483647 - 1));
+}
+
+TEST_F(IntensityList, ListWithoutANumberFails) {
+    EXPECT_THAT(listOf("none,at,all"), ElementsAre(-1));
+    EXPECT_EQ(log.lines().back(), "I V_2_0: [getDynamicIntensityList]Fail - empty list");
+}
+
+TEST_F(IntensityList, EmptyNodeFails) {
+    EXPECT_THAT(listOf(" \n"), ElementsAre(-1));
+    EXPECT_EQ(log.lines().back(), "I V_2_0: [getDynamicIntensityList]Fail - empty value");
+}
+
+TEST_F(IntensityList, ValuesAreAppendedToWhatTheListHeld) {
+    kernel.addNode(kInfo + "intensities", "x\n", Access::kReadOnly);
+    const auto hwApi = makeHwApi();
+    std::vector<int> list = {9};
+    EXPECT_TRUE(hwApi->getDynamicIntensityList(true, list));
+    EXPECT_EQ(log.lines().back(), "I V_2_0: [getDynamicIntensityList]list size: 1");
+    kernel.addNode(kInfo + "intensities", "1,2\n", Access::kReadOnly);
+    EXPECT_TRUE(hwApi->getDynamicIntensityList(true, list));
+    EXPECT_THAT(list, ElementsAre(9, 1, 2));
+}
+
+TEST_F(IntensityList, TypeChoosesTheNodeAndTheInformationClassComesFirst) {
+    kernel.addNode(kInfo + "intensities", "1\n", Access::kReadOnly);
+    kernel.addNode(kInfo + "haptic_intensities", "2\n", Access::kReadOnly);
+    kernel.addNode(kLeds + "intensities", "3\n", Access::kReadOnly);
+    kernel.addNode(kLeds + "haptic_intensities", "4\n", Access::kReadOnly);
+    const auto hwApi = makeHwApi();
+    std::vector<int> list;
+    EXPECT_TRUE(hwApi->getDynamicIntensityList(true, list));
+    EXPECT_TRUE(hwApi->getDynamicIntensityList(false, list));
+    kernel.removeNode(kInfo + "intensities");
+    kernel.removeNode(kInfo + "haptic_intensities");
+    EXPECT_TRUE(hwApi->getDynamicIntensityList(true, list));
+    EXPECT_TRUE(hwApi->getDynamicIntensityList(false, list));
+    EXPECT_THAT(list, ElementsAre(1, 2, 3, 4));
+    EXPECT_THAT(log.lines(), Contains("I V_2_0: [getDynamicIntensityList]isDefaultType: 0"));
+}
+
+TEST_F(IntensityList, WithoutANodeNothingIsRead) {
+    const auto hwApi = makeHwApi();
+    std::vector<int> list;
+    EXPECT_FALSE(hwApi->getDynamicIntensityList(true, list));
+    EXPECT_EQ(kernel.calls().back(), "open  O_RDONLY = ENOENT");
+    EXPECT_EQ(log.lines().back(), "I V_2_0: [getDynamicIntensityList]Fail - empty value");
+}
+
+}  // namespace
+}  // namespace aidl::android::hardware::vibrator
