@@ -1,0 +1,54 @@
+// SPDX-License-Identifier: Apache-2.0
+// The socket through which a running driver is asked for things: a line in, a line out.
+#pragma once
+
+#include <functional>
+#include <map>
+#include <memory>
+#include <string>
+#include <string_view>
+
+#include "driver/result.h"
+#include "driver/unique_fd.h"
+
+namespace handset {
+
+/// Serves any number of clients from one thread; a client that says nothing holds nobody up.
+class ControlSocket {
+  public:
+    /// Turns a request (a line without its end) into the line that answers it.
+    using Answer = std::function<std::string(std::string_view request)>;
+
+    /// Listens at `path`, which only root may open; a socket left there by a driver that died is
+    /// replaced. The path is removed with this object.
+    static Result<std::unique_ptr<ControlSocket>> listenAt(const std::string& path, Answer answer);
+
+    ~ControlSocket();
+    ControlSocket(const ControlSocket&) = delete;
+    ControlSocket& operator=(const ControlSocket&) = delete;
+
+    /// Becomes readable when serve() has something to do.
+    int descriptor() const { return events_.get(); }
+
+    /// Answers what has come in; never waits.
+    void serve();
+
+  private:
+    struct Client {
+        UniqueFd socket;
+        std::string received;
+    };
+
+    explicit ControlSocket(Answer answer) : answer_(std::move(answer)) {}
+
+    void accept();
+    bool serveClient(Client& client);
+
+    std::string path_;  ///< empty until the socket is there
+    Answer answer_;
+    UniqueFd listener_;
+    UniqueFd events_;
+    std::map<int, Client> clients_;
+};
+
+}  // namespace handset

@@ -1,0 +1,76 @@
+// SPDX-License-Identifier: Apache-2.0
+// /dev/input/eventN.
+#include "driver/event_node.h"
+
+#include <fmt/format.h>
+#include <sys/stat.h>
+#include <sys/sysmacros.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
+#include <fstream>
+
+namespace handset {
+namespace {
+
+constexpr unsigned kEventLimit = 1024;
+constexpr uid_t kSystemUser = 1000;
+constexpr gid_t kInputGroup = 1004;
+
+bool exists(const std::string& path) {
+    struct stat attributes {};
+    return lstat(path.c_str(), &attributes) == 0;
+}
+
+/// Makes the node by the number sysfs gives for the device: not every /dev is the kernel's own.
+Failure makeNode(unsigned event, const std::string& path) {
+    std::ifstream file(fmt::format("/sys/devices/virtual/cuse/input!event{}/dev", event));
+    unsigned major = 0;
+    unsigned minor = 0;
+    char colon = 0;
+    if (!(file >> major >> colon >> minor)) {
+        return Error{fmt::format("{}: the kernel did not make the device", path)};
+    }
+    if ((mkdir("/dev/input", 0755) != 0 && errno != EEXIST) ||
+        mknod(path.c_str(), S_IFCHR | 0600, makedev(major, minor)) != 0) {
+        return Error{fmt::format("{}: {}", path, strerror(errno))};
+    }
+    return std::nullopt;
+}
+
+}  // namespace
+
+std::string eventNodePath(unsigned event) {
+    return fmt::format("/dev/input/event{}", event);
+}
+
+Result<unsigned> chooseEvent(const MotorSpec& motor) {
+    if (motor.event) {
+        if (!exists(eventNodePath(*motor.event))) return *motor.event;
+        return Error{fmt::format("motor.event: {} exists already", eventNodePath(*motor.event))};
+    }
+    for (unsigned event = 1; event < kEventLimit; ++event) {
+        if (!exists(eventNodePath(event))) return event;
+    }
+    return Error{"no free number below /dev/input"};
+}
+
+EventNode::~EventNode() {
+    if (!made_.empty()) unlink(made_.c_str());
+}
+
+Failure EventNode::handOver(unsigned event) {
+    const std::string path = eventNodePath(event);
+    if (!exists(path)) {
+        if (auto failure = makeNode(event, path)) return failure;
+        made_ = path;
+    }
+    if (chown(path.c_str(), kSystemUser, kInputGroup) != 0 || chmod(path.c_str(), 0660) != 0) {
+        return Error{fmt::format("{}: {}", path, strerror(errno))};
+    }
+    return std::nullopt;
+}
+
+}  // namespace handset

@@ -1,0 +1,36 @@
+// SPDX-License-Identifier: Apache-2.0
+// Who may open a node. The driver decides by itself, instead of leaving it to the kernel, so that
+// a refused open is in the journal too.
+#pragma once
+
+#include <sys/types.h>
+
+#include <vector>
+
+namespace handset {
+
+/// A node's owner and permission bits (no file type).
+struct Attributes {
+    mode_t mode = 0;
+    uid_t uid = 0;
+    gid_t gid = 0;
+};
+
+/// A caller's credentials as far as permission bits ask for them.
+struct Credentials {
+    uid_t uid = 0;
+    gid_t gid = 0;
+    std::vector<gid_t> groups;  ///< supplementary
+};
+
+/// Permission bits, as access(2) has them.
+inline constexpr unsigned kMayRead = 4;
+inline constexpr unsigned kMayWrite = 2;
+
+/// What an open with these flags asks for.
+unsigned wantedBy(int openFlags);
+
+/// True when owner, group and mode grant `wanted`. Root is granted everything.
+bool grants(const Attributes& attributes, const Credentials& credentials, unsigned wanted);
+
+}  // namespace handset

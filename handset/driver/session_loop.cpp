@@ -1,0 +1,97 @@
+// SPDX-License-Identifier: Apache-2.0
+// The threads that serve one FUSE or CUSE session.
+#include "driver/session_loop.h"
+
+#include <linux/fuse.h>
+#include <poll.h>
+#include <sys/eventfd.h>
+
+#include <cerrno>
+#include <cstdint>
+#include <cstdlib>
+#include <cstring>
+#include <utility>
+
+namespace handset {
+namespace {
+
+// As many calls can be kept waiting at once before the driver stops listening, to interruptions
+// among others.
+constexpr size_t kMostWorkers = 64;
+
+bool isRelease(const fuse_buf& buffer) {
+    fuse_in_header header;
+    if (buffer.size < sizeof header) return false;
+    memcpy(&header, buffer.mem, sizeof header);
+    return header.opcode == FUSE_RELEASE;
+}
+
+void signalEvent(int event) {
+    eventfd_write(event, 1);
+}
+
+}  // namespace
+
+SessionLoop::SessionLoop(fuse_session* session, int device, int ended)
+    : session_(session), device_(device), ended_(ended), stop_(eventfd(0, EFD_CLOEXEC)) {
+    addWorker();
+}
+
+SessionLoop::~SessionLoop() {
+    finished_ = true;
+    fuse_session_exit(session_);
+    signalEvent(stop_.get());
+    while (true) {
+        std::vector<std::thread> workers;
+        {
+            const std::lock_guard lock(workersMutex_);
+            workers.swap(workers_);
+        }
+        if (workers.empty()) return;
+        for (std::thread& worker : workers) worker.join();
+    }
+}
+
+void SessionLoop::addWorker() {
+    const std::lock_guard lock(workersMutex_);
+    if (workers_.size() == kMostWorkers) return;
+    ++idle_;
+    workers_.emplace_back([this] { work(); });
+}
+
+void SessionLoop::work() {
+    fuse_buf buffer{};
+    while (takeRequest(buffer)) {
+        fuse_session_process_buf(session_, &buffer);
+        ++idle_;
+    }
+    free(buffer.mem);
+}
+
+// Takes the next request that may be served beside others. False when the session is over.
+bool SessionLoop::takeRequest(fuse_buf& buffer) {
+    const std::lock_guard lock(taking_);
+    while (waitForRequest()) {
+        const int size = fuse_session_receive_buf(session_, &buffer);
+        if (size == -EAGAIN || size == -EINTR) continue;
+        if (size <= 0) break;
+        if (isRelease(buffer)) {
+            fuse_session_process_buf(session_, &buffer);
+            continue;
+        }
+        if (--idle_ == 0) addWorker();
+        return true;
+    }
+    if (!finished_.exchange(true)) signalEvent(ended_);
+    return false;
+}
+
+bool SessionLoop::waitForRequest() const {
+    pollfd polled[] = {{device_, POLLIN, 0}, {stop_.get(), POLLIN, 0}};
+    while (poll(polled, std::size(polled), -1) < 0) {
+        if (errno != EINTR) return false;
+    }
+    return polled[1].revents == 0 && !fuse_session_exited(session_);
+}
+
+}  // namespace handset

@@ -1,0 +1,52 @@
+// SPDX-License-Identifier: Apache-2.0
+// The threads that serve one FUSE or CUSE session.
+//
+// The library's own loop lets any thread take any request, and the kernel does not wait for the
+// release of a file: a close could reach the journal after the open that followed it. This loop
+// takes one request at a time from the kernel and serves a release before it takes the next.
+#pragma once
+
+#include <fuse_lowlevel.h>
+
+#include <atomic>
+#include <mutex>
+#include <thread>
+#include <vector>
+
+#include "driver/unique_fd.h"
+
+namespace handset {
+
+/// Serves a session until it is stopped or its mount is gone.
+class SessionLoop {
+  public:
+    /// Starts serving. `session` is attached to `device` (non-blocking) and outlives the loop.
+    /// `ended` is an event descriptor that becomes readable when the loop ends by itself.
+    SessionLoop(fuse_session* session, int device, int ended);
+
+    SessionLoop(const SessionLoop&) = delete;
+    SessionLoop& operator=(const SessionLoop&) = delete;
+
+    /// Stops serving and waits for the threads; what they are busy with is finished first.
+    ~SessionLoop();
+
+  private:
+    void addWorker();
+    void work();
+    bool takeRequest(fuse_buf& buffer);
+    bool waitForRequest() const;
+
+    fuse_session* session_;
+    int device_;
+    int ended_;
+    UniqueFd stop_;
+
+    std::mutex taking_;  ///< held by the one thread that talks to the kernel
+    std::atomic<int> idle_{0};
+    std::atomic<bool> finished_{false};
+
+    std::mutex workersMutex_;
+    std::vector<std::thread> workers_;
+};
+
+}  // namespace handset

@@ -1,0 +1,378 @@
+// SPDX-License-Identifier: Apache-2.0
+// The driver's nodes as files: the request handlers and the mount.
+#include "driver/sysfs_server.h"
+
+#include <fcntl.h>
+#include <fmt/format.h>
+#include <fuse_lowlevel.h>
+#include <sys/mount.h>
+#include <sys/stat.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <cstring>
+#include <ctime>
+#include <mutex>
+#include <optional>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "driver/caller.h"
+#include "driver/handle_table.h"
+#include "driver/open_flags.h"
+#include "driver/request_delay.h"
+
+namespace handset {
+namespace {
+
+// Names and attributes change only through this driver, so the kernel may keep them.
+constexpr double kForever = 86400.0;
+
+// What sysfs reports for every attribute, whatever its text.
+constexpr off_t kNodeSize = 4096;
+
+constexpr mode_t kFolderMode = 0755;
+
+struct OpenNode {
+    OpenNode(Node& opened, Opener by) : node(opened), opener(by) {}
+
+    Node& node;
+    const Opener opener;
+    std::mutex mutex;
+    std::string showing;  ///< the text as the last read at offset 0 found it
+};
+
+}  // namespace
+
+struct SysfsServer::State {
+    const NodeTree& tree;
+    FaultBook& faults;
+    Journal& journal;
+    std::atomic<bool> stopping{false};
+    HandleTable<OpenNode> files{};
+    time_t started = time(nullptr);
+};
+
+namespace {
+
+using State = SysfsServer::State;
+
+State& stateOf(fuse_req_t request) {
+    return *static_cast<State*>(fuse_req_userdata(request));
+}
+
+Credentials credentialsOf(fuse_req_t request) {
+    const fuse_ctx* context = fuse_req_ctx(request);
+    Credentials credentials{context->uid, context->gid, std::vector<gid_t>(64)};
+    const int count = fuse_req_getgroups(request, static_cast<int>(credentials.groups.size()),
+                                         credentials.groups.data());
+    credentials.groups.resize(std::clamp<size_t>(count < 0 ? 0 : count, 0, 64));
+    return credentials;
+}
+
+bool callerIsGranted(fuse_req_t request, const Node& node, unsigned wanted) {
+    const Attributes attributes = node.attributes();
+    const fuse_ctx* context = fuse_req_ctx(request);
+    // The groups cost a look into /proc; owner and root do not need them.
+    if (context->uid == 0 || context->uid == attributes.uid) {
+        return grants(attributes, {context->uid, context->gid, {}}, wanted);
+    }
+    return grants(attributes, credentialsOf(request), wanted);
+}
+
+/// As sysfs has it, even root needs the method and at least one permission bit for it.
+bool isOpenable(const Node& node, unsigned wanted) {
+    const mode_t mode = node.attributes().mode;
+    const bool readable = node.isReadable() && (mode & 0444) != 0;
+    const bool writable = node.isWritable() && (mode & 0222) != 0;
+    return ((wanted & kMayRead) == 0 || readable) && ((wanted & kMayWrite) == 0 || writable);
+}
+
+struct stat statOf(const State& state, const TreeEntry& entry) {
+    struct stat attributes {};
+    attributes.st_ino = entry.inode;
+    attributes.st_atime = attributes.st_mtime = attributes.st_ctime = state.started;
+    if (!entry.node) {
+        attributes.st_mode = S_IFDIR | kFolderMode;
+        attributes.st_nlink = 2;
+        return attributes;
+    }
+    const Attributes own = entry.node->attributes();
+    attributes.st_mode = S_IFREG | own.mode;
+    attributes.st_nlink = 1;
+    attributes.st_uid = own.uid;
+    attributes.st_gid = own.gid;
+    attributes.st_size = kNodeSize;
+    return attributes;
+}
+
+void onInit(void*, fuse_conn_info* connection) {
+    connection->want |= FUSE_CAP_ATOMIC_O_TRUNC;
+    // Requests are wanted in memory, where the loop can look at them.
+    connection->want &= ~static_cast<unsigned>(FUSE_CAP_SPLICE_READ);
+}
+
+void onLookup(fuse_req_t request, fuse_ino_t parent, const char* name) {
+    const State& state = stateOf(request);
+    const TreeEntry* entry = state.tree.child(parent, name);
+    if (entry == nullptr) {
+        fuse_reply_err(request, ENOENT);
+        return;
+    }
+    fuse_entry_param reply{};
+    reply.ino = entry->inode;
+    reply.attr = statOf(state, *entry);
+    reply.attr_timeout = reply.entry_timeout = kForever;
+    fuse_reply_entry(request, &reply);
+}
+
+void onGetattr(fuse_req_t request, fuse_ino_t inode, fuse_file_info*) {
+    const State& state = stateOf(request);
+    const TreeEntry* entry = state.tree.find(inode);
+    if (entry == nullptr) {
+        fuse_reply_err(request, ENOENT);
+        return;
+    }
+    const struct stat attributes = statOf(state, *entry);
+    fuse_reply_attr(request, &attributes, kForever);
+}
+
+/// The error a change of attributes meets, or 0. A new size changes nothing and is let pass.
+int setattrError(fuse_req_t request, const Node& node, int toSet, bool open) {
+    const uid_t uid = fuse_req_ctx(request)->uid;
+    if ((toSet & (FUSE_SET_ATTR_UID | FUSE_SET_ATTR_GID)) != 0 && uid != 0) return EPERM;
+    if ((toSet & FUSE_SET_ATTR_MODE) != 0 && uid != 0 && uid != node.attributes().uid) {
+        return EPERM;
+    }
+    if ((toSet & FUSE_SET_ATTR_SIZE) != 0 && !open && !callerIsGranted(request, node, kMayWrite)) {
+        return EACCES;
+    }
+    return 0;
+}
+
+void onSetattr(fuse_req_t request, fuse_ino_t inode, struct stat* wanted, int toSet,
+               fuse_file_info* file) {
+    const State& state = stateOf(request);
+    const TreeEntry* entry = state.tree.find(inode);
+    const int error = entry == nullptr ? ENOENT
+                      : !entry->node   ? EPERM
+                                     : setattrError(request, *entry->node, toSet, file != nullptr);
+    if (error != 0) {
+        fuse_reply_err(request, error);
+        return;
+    }
+    Attributes attributes = entry->node->attributes();
+    if ((toSet & FUSE_SET_ATTR_MODE) != 0) attributes.mode = wanted->st_mode & 0777;
+    if ((toSet & FUSE_SET_ATTR_UID) != 0) attributes.uid = wanted->st_uid;
+    if ((toSet & FUSE_SET_ATTR_GID) != 0) attributes.gid = wanted->st_gid;
+    entry->node->setAttributes(attributes);
+    const struct stat reply = statOf(state, *entry);
+    fuse_reply_attr(request, &reply, kForever);
+}
+
+void onAccess(fuse_req_t request, fuse_ino_t inode, int mask) {
+    const TreeEntry* entry = stateOf(request).tree.find(inode);
+    const bool granted = entry != nullptr &&
+                         (entry->node ? (mask & X_OK) == 0 && callerIsGranted(request, *entry->node,
+                                                                              mask & (R_OK | W_OK))
+                                      : (mask & W_OK) == 0 || fuse_req_ctx(request)->uid == 0);
+    fuse_reply_err(request, granted ? 0 : EACCES);
+}
+
+void onReaddir(fuse_req_t request, fuse_ino_t inode, size_t size, off_t offset, fuse_file_info*) {
+    const TreeEntry* folder = stateOf(request).tree.find(inode);
+    if (folder == nullptr) {
+        fuse_reply_err(request, ENOENT);
+        return;
+    }
+    std::vector<std::pair<std::string_view, uint64_t>> names{{".", folder->inode},
+                                                             {"..", folder->parent}};
+    names.insert(names.end(), folder->children.begin(), folder->children.end());
+    std::vector<char> listing(size);
+    size_t used = 0;
+    for (size_t i = static_cast<size_t>(offset); i < names.size(); ++i) {
+        const TreeEntry* entry = stateOf(request).tree.find(names[i].second);
+        const struct stat attributes = statOf(stateOf(request), *entry);
+        const size_t needed = fuse_add_direntry(request, listing.data() + used, size - used,
+                                                std::string(names[i].first).c_str(), &attributes,
+                                                static_cast<off_t>(i) + 1);
+        if (needed > size - used) break;
+        used += needed;
+    }
+    fuse_reply_buf(request, listing.data(), used);
+}
+
+void recordOpen(State& state, const Caller& caller, const std::string& path, int flags, int error) {
+    state.journal.record(caller, JournalLine("open")
+                                         .text("node", path)
+                                         .text("flags", openFlagsText(flags))
+                                         .result("error", -error));
+}
+
+void onOpen(fuse_req_t request, fuse_ino_t inode, fuse_file_info* info) {
+    State& state = stateOf(request);
+    const TreeEntry* entry = state.tree.find(inode);
+    if (entry == nullptr || !entry->node) {
+        fuse_reply_err(request, entry == nullptr ? ENOENT : EISDIR);
+        return;
+    }
+    Node& node = *entry->node;
+    const Opener opener(request);
+    const unsigned wanted = wantedBy(info->flags);
+    int error = 0;
+    if (!isOpenable(node, wanted) || !callerIsGranted(request, node, wanted)) {
+        error = EACCES;
+    } else {
+        const FaultAction fault = state.faults.next(node.path(), FaultOp::kOpen);
+        error = delayRequest(request, fault.delay, state.stopping) ? fault.error : EINTR;
+    }
+    recordOpen(state, opener.caller(), node.path(), info->flags, error);
+    if (error != 0) {
+        fuse_reply_err(request, error);
+        return;
+    }
+    info->fh = state.files.add(std::make_unique<OpenNode>(node, opener));
+    info->direct_io = 1;
+    // A caller killed while it waited never releases what it did not get.
+    if (fuse_reply_open(request, info) == -ENOENT) state.files.remove(info->fh);
+}
+
+void onRead(fuse_req_t request, fuse_ino_t, size_t size, off_t offset, fuse_file_info* info) {
+    State& state = stateOf(request);
+    OpenNode& file = state.files.get(info->fh);
+    const FaultAction fault = state.faults.next(file.node.path(), FaultOp::kRead);
+    const int error = delayRequest(request, fault.delay, state.stopping) ? fault.error : EINTR;
+
+    std::string part;
+    if (error == 0) {
+        const std::lock_guard lock(file.mutex);
+        if (offset == 0) file.showing = file.node.text();
+        const size_t start = std::min(static_cast<size_t>(offset), file.showing.size());
+        part = file.showing.substr(start, std::min(size, fault.shortCount.value_or(size)));
+    }
+    state.journal.record(
+            file.opener.callerOf(request),
+            JournalLine("read")
+                    .text("node", file.node.path())
+                    .number("size", static_cast<int64_t>(size))
+                    .result("result", error != 0 ? -error : static_cast<int64_t>(part.size())));
+    if (error != 0) {
+        fuse_reply_err(request, error);
+    } else {
+        fuse_reply_buf(request, part.data(), part.size());
+    }
+}
+
+void onWrite(fuse_req_t request, fuse_ino_t, const char* data, size_t size, off_t,
+             fuse_file_info* info) {
+    State& state = stateOf(request);
+    OpenNode& file = state.files.get(info->fh);
+    const FaultAction fault = state.faults.next(file.node.path(), FaultOp::kWrite);
+    const int error = delayRequest(request, fault.delay, state.stopping) ? fault.error : EINTR;
+    const std::string_view bytes(data, size);
+    const std::string_view taken = bytes.substr(0, fault.shortCount.value_or(size));
+
+    if (error == 0) file.node.store(taken);
+    state.journal.record(
+            file.opener.callerOf(request),
+            JournalLine("write")
+                    .text("node", file.node.path())
+                    .bytes("data", "hex", bytes)
+                    .result("result", error != 0 ? -error : static_cast<int64_t>(taken.size())));
+    if (error != 0) {
+        fuse_reply_err(request, error);
+    } else {
+        fuse_reply_write(request, taken.size());
+    }
+}
+
+void onRelease(fuse_req_t request, fuse_ino_t, fuse_file_info* info) {
+    State& state = stateOf(request);
+    if (const std::unique_ptr<OpenNode> file = state.files.remove(info->fh)) {
+        state.journal.record(file->opener.caller(),
+                             JournalLine("close").text("node", file->node.path()));
+    }
+    fuse_reply_err(request, 0);
+}
+
+/// An open with O_CREAT of a name that does not exist.
+void onCreate(fuse_req_t request, fuse_ino_t parent, const char* name, mode_t,
+              fuse_file_info* info) {
+    State& state = stateOf(request);
+    recordOpen(state, Opener(request).caller(), state.tree.pathOf(parent, name),
+               info->flags | O_CREAT, EACCES);
+    fuse_reply_err(request, EACCES);
+}
+
+/// Folders and nodes come and go with the device, not by a user's hand.
+void refuseChange(fuse_req_t request) {
+    fuse_reply_err(request, fuse_req_ctx(request)->uid == 0 ? EPERM : EACCES);
+}
+
+fuse_lowlevel_ops operations() {
+    fuse_lowlevel_ops ops{};
+    ops.init = onInit;
+    ops.lookup = onLookup;
+    ops.getattr = onGetattr;
+    ops.setattr = onSetattr;
+    ops.access = onAccess;
+    ops.readdir = onReaddir;
+    ops.open = onOpen;
+    ops.read = onRead;
+    ops.write = onWrite;
+    ops.release = onRelease;
+    ops.create = onCreate;
+    ops.mknod = [](auto request, auto...) { refuseChange(request); };
+    ops.mkdir = [](auto request, auto...) { refuseChange(request); };
+    ops.unlink = [](auto request, auto...) { refuseChange(request); };
+    ops.rmdir = [](auto request, auto...) { refuseChange(request); };
+    ops.rename = [](auto request, auto...) { refuseChange(request); };
+    ops.link = [](auto request, auto...) { refuseChange(request); };
+    ops.symlink = [](auto request, auto...) { refuseChange(request); };
+    return ops;
+}
+
+Error systemError(std::string_view what) {
+    return Error{fmt::format("{}: {}", what, strerror(errno))};
+}
+
+}  // namespace
+
+Result<std::unique_ptr<SysfsServer>> SysfsServer::start(const NodeTree& tree, FaultBook& faults,
+                                                        Journal& journal, int ended) {
+    UniqueFd device(open("/dev/fuse", O_RDWR | O_CLOEXEC | O_NONBLOCK));
+    if (!device) return systemError("/dev/fuse");
+
+    std::unique_ptr<SysfsServer> server(new SysfsServer);
+    server->state_ = std::unique_ptr<State>(new State{tree, faults, journal});
+    char name[] = "handset-driver";
+    char* arguments[] = {name, nullptr};
+    fuse_args args = FUSE_ARGS_INIT(1, arguments);
+    const fuse_lowlevel_ops ops = operations();
+    server->session_ = fuse_session_new(&args, &ops, sizeof ops, server->state_.get());
+    fuse_opt_free_args(&args);
+    if (server->session_ == nullptr) return Error{"no FUSE session"};
+
+    const std::string root(kSysfsRoot);
+    const std::string options =
+            fmt::format("fd={},rootmode=40000,user_id=0,group_id=0,allow_other", device.get());
+    if (mount("handset", root.c_str(), "fuse", MS_NOSUID | MS_NODEV | MS_NOEXEC, options.c_str()) !=
+        0) {
+        return systemError("mount on " + root);
+    }
+    server->mounted_ = true;
+    const int fd = device.release();  // the session closes it
+    fuse_session_mount(server->session_, fmt::format("/dev/fd/{}", fd).c_str());
+    server->loop_ = std::make_unique<SessionLoop>(server->session_, fd, ended);
+    return server;
+}
+
+SysfsServer::~SysfsServer() {
+    if (state_) state_->stopping = true;
+    if (mounted_) umount2(std::string(kSysfsRoot).c_str(), MNT_DETACH);
+    loop_.reset();
+    if (session_ != nullptr) fuse_session_destroy(session_);
+}
+
+}  // namespace handset

@@ -1,0 +1,54 @@
+// SPDX-License-Identifier: Apache-2.0
+// The driver's nodes as files: a FUSE file system that stands in for /sys/class and behaves as
+// sysfs does.
+//
+// - A write is one store: the offset is ignored and the text replaced whole.
+// - A read at offset 0 shows the text as it is then; reads further on go through the same showing.
+// - A node without a read or write method refuses root too; nothing can be created or removed.
+#pragma once
+
+#include <atomic>
+#include <memory>
+#include <string_view>
+
+#include "driver/fault_book.h"
+#include "driver/journal.h"
+#include "driver/node_tree.h"
+#include "driver/result.h"
+#include "driver/session_loop.h"
+#include "driver/unique_fd.h"
+
+struct fuse_session;
+
+namespace handset {
+
+/// Where the nodes are mounted.
+inline constexpr std::string_view kSysfsRoot = "/sys/class";
+
+class SysfsServer {
+  public:
+    /// Mounts the nodes in the process's mount namespace and serves them on threads of its own.
+    /// The references outlive the server; `ended` as in SessionLoop.
+    static Result<std::unique_ptr<SysfsServer>> start(const NodeTree& tree, FaultBook& faults,
+                                                      Journal& journal, int ended);
+
+    /// Unmounts the nodes and stops; callers that are kept waiting get EINTR, files still open
+    /// fail with ENOTCONN from then on.
+    ~SysfsServer();
+
+    SysfsServer(const SysfsServer&) = delete;
+    SysfsServer& operator=(const SysfsServer&) = delete;
+
+    /// What the request handlers work on.
+    struct State;
+
+  private:
+    SysfsServer() = default;
+
+    std::unique_ptr<State> state_;
+    fuse_session* session_ = nullptr;
+    std::unique_ptr<SessionLoop> loop_;
+    bool mounted_ = false;
+};
+
+}  // namespace handset

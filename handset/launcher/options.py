@@ -1,0 +1,165 @@
+# SPDX-License-Identifier: Apache-2.0
+"""The options of handset/run and handset/shell, checked before anything starts."""
+
+import argparse
+import os
+
+from failure import Failure
+from guest_image import ARCHITECTURES, PROJECT
+from machine import find_emulator
+
+_PRESETS = {"amd64": "release", "arm64": "arm64"}
+_ELF_MACHINES = {"amd64": 62, "arm64": 183}  # e_machine of <elf.h>
+_ELF_MACHINE_OFFSET = 18
+
+_MEMORY_MIB = 512
+_SANITIZED_MEMORY_MIB = 2048  # shadow memory
+
+# The guest has file systems of its own there, so a folder below is not seen as it is outside.
+_HIDDEN = ("/dev", "/proc", "/run", "/sys")
+
+
+class _Parser(argparse.ArgumentParser):
+    def error(self, message):
+        raise Failure(message)
+
+
+def _positive(kind, what):
+    def convert(text):
+        try:
+            value = kind(text)
+        except ValueError:
+            value = 0
+        if not 0 < value < 1e9:
+            raise argparse.ArgumentTypeError(f"'{text}' is not {what} above 0")
+        return value
+    return convert
+
+
+def parse(program, description, words, takes_command):
+    """The options in `words`, all checked, as an object with the fields that the parser below
+    names (`profile` is None for "off") and with
+        command    the words after "--"
+        agent      the path of handset-agent
+        directory  the working directory, here and in the guest
+        host_tmp   whether the guest has to see the host's /tmp
+    """
+    parser = _Parser(prog=program, description=description, allow_abbrev=False)
+    parser.add_argument("--arch", default="amd64", metavar="ARCH", help="amd64 (default) or arm64")
+    parser.add_argument("--profile", default="leds", metavar="NAME|FILE",
+                        help="what phone this is (default leds); 'off' starts no phone")
+    parser.add_argument("--out", metavar="DIR",
+                        help="leave journal.jsonl, service.log, kernel.log and what is written "
+                             "to $OUT there")
+    parser.add_argument("--timeout", metavar="SECONDS", type=_positive(float, "a number"),
+                        default=300 if takes_command else None,
+                        help="end the guest this long after its boot, with status 124 (default "
+                             f"{'300' if takes_command else 'never'})")
+    parser.add_argument("--build", metavar="DIR",
+                        help="build folder with the programs (default build/release, for arm64 "
+                             "build/arm64)")
+    parser.add_argument("--memory", metavar="MIB", type=_positive(int, "a whole number"),
+                        help="the guest's memory (default 512, for a sanitized build 2048)")
+    parser.add_argument("--smp", metavar="N", type=_positive(int, "a whole number"), default=1,
+                        help="processors (default 1)")
+    parser.add_argument("--timing", metavar="FILE",
+                        help="write the seconds each phase took, as JSON")
+    parser.add_argument("--verbose", action="store_true", help="tell of each phase")
+    command = []
+    if takes_command:
+        parser.usage = f"{program} [options] -- COMMAND..."
+        if "--" in words:
+            words, command = words[:words.index("--")], words[words.index("--") + 1:]
+        if not command and not {"-h", "--help"} & set(words):
+            raise Failure("no command given; put it after '--'")
+    options = parser.parse_args(words)
+    options.command = command
+    _check_architecture(options)
+    _check_profile(options)
+    _check_build(options)
+    _check_folders(options)
+    _check_results(options)
+    if options.memory is None:
+        options.memory = _SANITIZED_MEMORY_MIB if _is_sanitized(options.build) else _MEMORY_MIB
+    return options
+
+
+def _check_architecture(options):
+    if options.arch not in ARCHITECTURES:
+        raise Failure(f"unknown architecture '{options.arch}': use {' or '.join(ARCHITECTURES)}")
+    find_emulator(options.arch)  # before anything is downloaded for it
+
+
+def _check_folders(options):
+    """What the guest has to see must not lie where it has file systems of its own."""
+    try:
+        options.directory = os.getcwd()
+    except FileNotFoundError:
+        raise Failure("the working directory does not exist any more") from None
+    paths = [options.directory, options.build, options.profile or "/"]
+    paths += [os.path.realpath(path) for path in paths if path.startswith("/")]
+    for path in paths:
+        if _is_below(path, _HIDDEN):
+            raise Failure(f"the guest cannot see {path}: "
+                          f"it has its own {', '.join(_HIDDEN[:-1])} and {_HIDDEN[-1]}")
+    options.host_tmp = any(_is_below(path, ("/tmp",)) for path in paths)
+
+
+def _is_below(path, folders):
+    return any(path == folder or path.startswith(folder + "/") for folder in folders)
+
+
+def _check_build(options):
+    preset = _PRESETS[options.arch]
+    if options.build is None:
+        options.build = os.path.join(PROJECT, "build", preset)
+    elif os.path.dirname(os.path.realpath(options.build)) == os.path.join(PROJECT, "build"):
+        preset = os.path.basename(os.path.realpath(options.build))
+    options.build = os.path.abspath(options.build)
+    options.how_to_build = f"build it with: cmake --preset {preset} && cmake --build --preset {preset}"
+    options.agent = os.path.join(options.build, "bin", "handset-agent")
+    try:
+        with open(options.agent, "rb") as file:
+            header = file.read(_ELF_MACHINE_OFFSET + 2)
+    except OSError:
+        raise Failure(f"no handset-agent in {options.build}/bin; "
+                      f"{options.how_to_build}") from None
+    if int.from_bytes(header[_ELF_MACHINE_OFFSET:], "little") != _ELF_MACHINES[options.arch]:
+        raise Failure(f"{options.build} is not built for {options.arch}")
+    phone = os.path.join(options.build, "bin", "phone")
+    if options.profile is not None and not os.path.exists(phone):
+        raise Failure(f"no phone in {options.build}/bin; {options.how_to_build}")
+
+
+def _check_profile(options):
+    if options.profile == "off":
+        options.profile = None
+        return
+    folder = os.path.join(PROJECT, "handset", "profiles")
+    built_in = sorted(name[:-len(".json")] for name in os.listdir(folder)
+                      if name.endswith(".json")) if os.path.isdir(folder) else []
+    if options.profile in built_in:
+        return
+    if not os.path.isfile(options.profile):
+        raise Failure(f"no profile '{options.profile}': use {', '.join(built_in)}, off, or a file")
+    options.profile = os.path.abspath(options.profile)
+
+
+def _check_results(options):
+    if options.out is not None:
+        options.out = os.path.abspath(options.out)
+        try:
+            os.makedirs(options.out, exist_ok=True)
+        except OSError as error:
+            raise Failure(f"--out {options.out}: {error.strerror}") from None
+    if options.timing is not None and not os.path.isdir(os.path.dirname(options.timing) or "."):
+        raise Failure(f"--timing {options.timing}: its folder does not exist")
+
+
+def _is_sanitized(build):
+    try:
+        with open(os.path.join(build, "CMakeCache.txt"), encoding="utf-8") as cache:
+            return any(line.startswith("QVX_SANITIZE:") and line.rstrip()[-1] != "="
+                       for line in cache)
+    except OSError:
+        return False

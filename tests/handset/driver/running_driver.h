@@ -1,0 +1,70 @@
+// SPDX-License-Identifier: Apache-2.0
+// A handset-driver that runs for one test, and processes that live in its mount namespace.
+#pragma once
+
+#include <sys/types.h>
+
+#include <functional>
+#include <string>
+#include <vector>
+
+#include "temporary_folder.h"
+
+namespace handset {
+
+class RunningDriver {
+  public:
+    /// Starts the driver with a profile's text and waits until it is ready or has ended.
+    explicit RunningDriver(const std::string& profile);
+
+    /// Stops it, if it runs still.
+    ~RunningDriver();
+    RunningDriver(const RunningDriver&) = delete;
+    RunningDriver& operator=(const RunningDriver&) = delete;
+
+    bool isReady() const { return ready_; }
+    pid_t pid() const { return pid_; }
+    const std::string& folder() const { return folder_.path(); }
+
+    /// Sends the signal and waits for the end: the exit status, or 128 and the signal's number.
+    int end(int signal);
+
+    /// What the driver printed on standard error.
+    std::string errors() const { return contentOf(folder_.file("errors")); }
+
+    /// Asks through the control socket: "ok ..." or "error ...".
+    std::string ask(const std::string& request) const;
+
+    /// The journal, with each line's n, us and pid left out.
+    std::vector<std::string> journal() const;
+
+    /// The journal as it stands.
+    std::string rawJournal() const { return contentOf(folder_.file("journal")); }
+
+    /// Runs `work` in a process of its own that sees the driver's mounts, as that user with no
+    /// further groups, and returns what it returned.
+    std::string inside(uid_t user, const std::function<std::string()>& work) const;
+
+    /// The same as root.
+    std::string inside(const std::function<std::string()>& work) const { return inside(0, work); }
+
+  private:
+    TemporaryFolder folder_;
+    pid_t pid_ = -1;
+    bool ready_ = false;
+};
+
+/// Opens, writes once and closes: "4" for four bytes, or the error's name, after "open " where the
+/// open failed.
+std::string writeNode(const std::string& path, const std::string& text, int flags);
+
+/// Opens, reads once and closes: the text, or the error's name as above.
+std::string readNode(const std::string& path);
+
+/// Opens and closes: "ok" or the error's name.
+std::string openNode(const std::string& path, int flags);
+
+/// The number of bytes a call returned, or the name of the error it set.
+std::string outcome(ssize_t returned);
+
+}  // namespace handset
