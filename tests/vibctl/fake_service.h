@@ -1,0 +1,22 @@
+// SPDX-License-Identifier: Apache-2.0
+//
+// A service that stands in for the vibrator's, to show what the client makes of answers that the
+// real one seldom gives.
+#pragma once
+
+namespace fake {
+
+/// Registers the standard interface with the extension attached, in this process. What it does is
+/// told by the argument it is called with:
+///
+///     on(N)                    N = 1: an exception with a message; 2: service-specific error 7;
+///                              3: the process dies before it answers; else ok
+///     perform(effect, ...)     calls back at once; the result is the caller's uid
+///     compose(effects)         calls back after the first entry's delay; never when that is 0
+///     setAmplitude(amplitude)  ok for nan only, else EX_ILLEGAL_ARGUMENT
+///
+/// of the extension: setAmplitude(amplitude) is ok for -1 only, else EX_ILLEGAL_ARGUMENT;
+/// hasFeature(name) is true for "--json" only. Everything else is STATUS_UNKNOWN_TRANSACTION.
+void registerServices();
+
+}  // namespace fake

@@ -1,0 +1,117 @@
+// SPDX-License-Identifier: Apache-2.0
+//
+// The program itself: what it prints where, and its exit status, on a machine without a service.
+#include <sys/wait.h>
+
+#include <array>
+#include <cstdio>
+#include <string>
+
+#include <unistd.h>
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+namespace {
+
+using ::testing::HasSubstr;
+using ::testing::StartsWith;
+
+struct Execution {
+    int status;
+    std::string out;
+    std::string err;
+};
+
+std::string readAll(const std::string& command, int& status) {
+    std::string text;
+    FILE* pipe = popen(command.c_str(), "r");
+    std::array<char, 4096> buffer{};
+    for (size_t count = 0; (count = fread(buffer.data(), 1, buffer.size(), pipe)) > 0;) {
+        text.append(buffer.data(), count);
+    }
+    status = pclose(pipe);
+    return text;
+}
+
+/// Runs the program twice, once for each of its outputs.
+Execution run(const std::string& arguments) {
+    const std::string command = std::string(VIBCTL_COMMAND) + " " + arguments;
+    Execution result{};
+    int status = 0;
+    result.out = readAll(command + " 2>/dev/null", status);
+    result.err = readAll(command + " 2>&1 >/dev/null", status);
+    result.status = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+    return result;
+}
+
+TEST(Program, HelpGoesToStandardOutputAndSucceeds) {
+    for (const char* arguments : {"help", "--help", "-h"}) {
+        const Execution result = run(arguments);
+        EXPECT_EQ(result.status, 0) << arguments;
+        EXPECT_THAT(result.out, StartsWith("usage: vibctl ")) << arguments;
+        EXPECT_EQ(result.err, "") << arguments;
+    }
+    EXPECT_THAT(run("std help").out, HasSubstr("\n  compose DELAY_MS,PRIMITIVE,SCALE..."));
+    EXPECT_THAT(run("ext --help").out, HasSubstr("\n  hasFeature FEATURE_NAME\n"));
+    EXPECT_EQ(run("std on --help").out,
+              "vibctl std on TIMEOUT_MS [--callback]\n  TIMEOUT_MS: an integer\n");
+    EXPECT_EQ(run("std perform --help").status, 0);
+}
+
+TEST(Program, VersionIsPrinted) {
+    const Execution result = run("--version");
+    EXPECT_EQ(result.status, 0);
+    EXPECT_THAT(result.out, StartsWith("vibctl "));
+}
+
+struct WrongUsage {
+    const char* name;
+    const char* arguments;
+    const char* line;
+};
+
+class WrongUsageOf : public ::testing::TestWithParam<WrongUsage> {};
+
+TEST_P(WrongUsageOf, GetsOneLineAndStatus2) {
+    const Execution result = run(GetParam().arguments);
+    EXPECT_EQ(result.status, 2);
+    EXPECT_EQ(result.out, "");
+    EXPECT_EQ(result.err, GetParam().line);
+}
+
+constexpr WrongUsage kWrongUsages[] = {
+        {"NoCommand", "", "vibctl: no command given; there are std, ext, list and help\n"},
+        {"Command", "foo", "vibctl: unknown command \"foo\"; there are std, ext, list and help\n"},
+        {"Option", "--jsno list",
+         "vibctl: unknown option \"--jsno\"; there are --json, --wait SECONDS, --callback, --help, "
+         "--version\n"},
+        {"Wait", "--wait never std off",
+         "vibctl: --wait \"never\" is not a number of seconds from 0 to 86400\n"},
+        {"Method", "std preform CLICK STRONG",
+         "vibctl: std: unknown method \"preform\"; did you mean perform\n"},
+        {"Number", "--json std on 1.5",
+         "vibctl: std on: TIMEOUT_MS \"1.5\" is not an integer from -2147483648 to 2147483647; "
+         "usage: vibctl std on TIMEOUT_MS [--callback]\n"},
+        {"ArgumentCount", "ext setAmplitude",
+         "vibctl: ext setAmplitude: takes 1 argument, got 0; usage: vibctl ext setAmplitude "
+         "AMPLITUDE\n"},
+        {"ArgumentOfList", "list all",
+         "vibctl: list takes no arguments; usage: vibctl [--json] list\n"},
+};
+
+INSTANTIATE_TEST_SUITE_P(Program, WrongUsageOf, ::testing::ValuesIn(kWrongUsages),
+                         [](const auto& usage) { return usage.param.name; });
+
+TEST(Program, WithoutABinderDeviceSaysSoWithStatus3) {
+    if (access("/dev/binder", F_OK) == 0) GTEST_SKIP() << "this machine has a binder device";
+    for (const char* arguments : {"list", "std on -1", "ext setAmplitude -1", "--json std off"}) {
+        const Execution result = run(arguments);
+        EXPECT_EQ(result.status, 3) << arguments;
+        EXPECT_EQ(result.out, "") << arguments;
+        EXPECT_EQ(result.err, "vibctl: cannot open /dev/binder: No such file or directory\n")
+                << arguments;
+    }
+}
+
+}  // namespace

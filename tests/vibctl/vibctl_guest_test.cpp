@@ -1,0 +1,160 @@
+// SPDX-License-Identifier: Apache-2.0
+//
+// The client over a real binder: exit statuses, callbacks, and every way in which there may be no
+// service.
+#include <sys/wait.h>
+
+#include <array>
+#include <chrono>
+#include <cstdio>
+#include <memory>
+#include <string>
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <nlohmann/json.hpp>
+
+#include "fake_service.h"
+#include "kernel_log.h"
+#include "processes.h"
+
+namespace {
+
+using processes::Manager;
+using processes::Server;
+using ::testing::HasSubstr;
+
+constexpr const char* kManifest =
+        "<manifest version=\"1.0\" type=\"device\"><hal format=\"aidl\">"
+        "<name>android.hardware.vibrator</name><version>2</version>"
+        "<fqname>IVibrator/default</fqname></hal></manifest>";
+
+struct Execution {
+    int status;
+    std::string output;  ///< of both streams
+};
+
+Execution run(const std::string& arguments) {
+    const std::string command = std::string(VIBCTL_PROGRAM) + " " + arguments + " 2>&1";
+    Execution result{};
+    FILE* pipe = popen(command.c_str(), "r");
+    std::array<char, 4096> buffer{};
+    for (size_t count = 0; (count = fread(buffer.data(), 1, buffer.size(), pipe)) > 0;) {
+        result.output.append(buffer.data(), count);
+    }
+    const int status = pclose(pipe);
+    result.status = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+    return result;
+}
+
+class VibctlTest : public ::testing::Test {
+  protected:
+    VibctlTest() { mFolder.put("vendor/etc/vintf/manifest.xml", kManifest); }
+
+    processes::TemporaryFolder mFolder;
+};
+
+class VibctlWithService : public VibctlTest {
+  protected:
+    static void expect(const std::string& arguments, int status, const std::string& output) {
+        const Execution result = run(arguments);
+        EXPECT_EQ(result.status, status) << arguments;
+        EXPECT_EQ(result.output, output) << arguments;
+    }
+
+    static nlohmann::json callbackOf(const std::string& arguments) {
+        const Execution result = run("--json " + arguments);
+        EXPECT_EQ(result.status, 0) << result.output;
+        return nlohmann::json::parse(result.output).at("callback");
+    }
+
+    Manager mManager{mFolder.path()};
+    Server mService{1000, fake::registerServices};
+};
+
+TEST_F(VibctlTest, WithoutAServiceManagerEndsInSecondsWithOneLine) {
+    const qvx::test::ExpectBinderComplaints expected;
+    const auto before = std::chrono::steady_clock::now();
+    for (const char* arguments : {"list", "std off", "ext setAmplitude -1"}) {
+        const Execution result = run(arguments);
+        EXPECT_EQ(result.status, 3) << arguments;
+        EXPECT_EQ(result.output, "vibctl: no service manager has answered for 2 seconds\n");
+    }
+    EXPECT_LT(std::chrono::steady_clock::now() - before, std::chrono::seconds(20));
+}
+
+TEST_F(VibctlTest, WithoutTheServiceNamesIt) {
+    const Manager manager(mFolder.path());
+    for (const char* arguments : {"std off", "ext setAmplitude -1"}) {
+        const Execution result = run(arguments);
+        EXPECT_EQ(result.status, 3);
+        EXPECT_EQ(result.output,
+                  "vibctl: android.hardware.vibrator.IVibrator/default is not registered\n");
+    }
+    EXPECT_EQ(run("list").output, "manager\n");
+}
+
+TEST_F(VibctlWithService, ListsServicesButNotTheExtension) {
+    expect("list", 0, "android.hardware.vibrator.IVibrator/default\nmanager\n");
+    const nlohmann::json line = nlohmann::json::parse(run("--json list").output);
+    EXPECT_EQ(line.at("result"),
+              (nlohmann::json{"android.hardware.vibrator.IVibrator/default", "manager"}));
+}
+
+TEST_F(VibctlWithService, ReportsSuccess) {
+    expect("std on 500", 0, "on: ok\n");
+    expect("std setAmplitude nan", 0, "setAmplitude: ok\n");
+    expect("std perform CLICK LIGHT", 0, "perform: ok, 0 ms\n");
+    expect("std getInterfaceVersion", 0, "getInterfaceVersion: ok, 2\n");
+    expect("std getInterfaceHash", 0,
+           "getInterfaceHash: ok, ea8742d6993e1a82917da38b9938e537aa7fcb54\n");
+}
+
+TEST_F(VibctlWithService, ReportsExceptionsWithStatus1) {
+    expect("std setAmplitude 1", 1, "setAmplitude: EX_ILLEGAL_ARGUMENT\n");
+    expect("std on 1", 1, "on: EX_ILLEGAL_STATE: no \"motor\"\n");
+    expect("std on 2", 1, "on: EX_SERVICE_SPECIFIC 7\n");
+    EXPECT_THAT(run("--json std on 1").output,
+                HasSubstr(R"("exception":-5,"status":0,"message":"no \"motor\"","result":null,)"));
+}
+
+TEST_F(VibctlWithService, ReportsTransportFailuresWithStatus3) {
+    expect("std off", 3, "off: EX_TRANSACTION_FAILED STATUS_UNKNOWN_TRANSACTION\n");
+    EXPECT_THAT(run("--json std off").output, HasSubstr(R"("exception":-129,"status":-74,)"));
+    const qvx::test::ExpectBinderComplaints expected;
+    expect("std on 3", 3, "on: EX_TRANSACTION_FAILED STATUS_DEAD_OBJECT\n");
+}
+
+TEST_F(VibctlWithService, ReachesTheExtension) {
+    expect("ext setAmplitude -1", 0, "setAmplitude: ok\n");
+    expect("ext setAmplitude 1", 1, "setAmplitude: EX_ILLEGAL_ARGUMENT\n");
+    expect("ext hasFeature x", 0, "hasFeature: ok, false\n");
+    expect("ext hasFeature -- --json", 0, "hasFeature: ok, true\n");
+    expect("ext getInterfaceVersion", 0, "getInterfaceVersion: ok, 4\n");
+}
+
+TEST_F(VibctlWithService, ReportsWhenACompositionCompletes) {
+    const nlohmann::json callback = callbackOf("std compose 300,CLICK,1 --callback");
+    ASSERT_TRUE(callback.is_number());
+    EXPECT_GE(callback.get<int>(), 300);
+    EXPECT_LT(callback.get<int>(), 2000);
+    EXPECT_THAT(run("std compose 20,CLICK,1 --callback").output,
+                HasSubstr("compose: ok, completed after "));
+}
+
+TEST_F(VibctlWithService, WaitsForACompletionNoLongerThanToldTo) {
+    EXPECT_EQ(callbackOf("--wait 0.2 std compose 0,CLICK,1 --callback"), "timeout");
+    EXPECT_EQ(callbackOf("--wait 0 std compose 0,CLICK,1 --callback"), "timeout");
+    expect("--wait 0.2 std compose 0,CLICK,1 --callback", 0,
+           "compose: ok, not completed within 200 ms\n");
+}
+
+TEST_F(VibctlWithService, PassesACallbackToPerformWithoutWaitingForIt) {
+    EXPECT_EQ(callbackOf("std perform CLICK LIGHT --callback"), nullptr);
+}
+
+TEST_F(VibctlWithService, DoesNotWaitWhenTheCallWasRefused) {
+    expect("--wait 60 std compose --callback", 1, "compose: EX_NULL_POINTER\n");
+}
+
+}  // namespace
