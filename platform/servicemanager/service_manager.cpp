@@ -268,9 +268,9 @@ binder_status_t ServiceManager::registerForNotifications(const AParcel* in, APar
     Object callback;
     const binder_status_t status = readArguments(in, &name, &callback);
     if (status != STATUS_OK) return status;
-    // An object of another interface is accepted like any other. Calls to it would be refused on
-    // the other side; here they fail already.
-    AIBinder_associateClass(callback.get(), registrationCallbackClass());
+    // An object of another interface is accepted like any other; it refuses the calls itself. It
+    // is not asked which it is: the answer would be the client's to withhold.
+    AIBinder_assumeClass(callback.get(), registrationCallbackClass());
     return replyVerdict(out, "registerForNotifications", name,
                         mRegistry.registerForNotifications(name, callback));
 }

@@ -22,7 +22,7 @@
 #include <gtest/gtest.h>
 
 #include "kernel_log.h"
-#include "raw_client.h"
+#include "raw_binder.h"
 
 namespace processes {
 
@@ -103,7 +103,7 @@ Manager::~Manager() {
 }
 
 bool Manager::answers() const {
-    return raw::Binder().pingManager();
+    return qvx::test::RawBinder().pingServiceManager();
 }
 
 std::string Manager::log() const {

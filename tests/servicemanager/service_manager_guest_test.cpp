@@ -258,7 +258,11 @@ TEST_F(Notifications, AnObjectOfAnotherInterfaceIsAcceptedAndHarmless) {
     as(kSystem, [] {
         const ndk::SpAIBinder object = makeObject();
         EXPECT_EQ(notify(kRegisterForNotifications, "test.service", object), EX_NONE);
+        // Told after the other, so that nothing is left unread when it has been told.
+        RegistrationCallback witness;
+        EXPECT_EQ(notify(kRegisterForNotifications, "test.service", witness.binder), EX_NONE);
         EXPECT_EQ(add("test.service", object), EX_NONE);
+        EXPECT_TRUE(eventually([&] { return witness.calls == 1; }));
         EXPECT_EQ(notify(kUnregisterForNotifications, "test.service", object), EX_NONE);
     });
     EXPECT_TRUE(mManager.answers());

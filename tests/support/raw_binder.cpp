@@ -16,6 +16,7 @@ namespace {
 
 constexpr size_t kMapSize = 256 * 1024;
 constexpr uint32_t kCheckService = 2;  // android.os.IServiceManager
+constexpr uint32_t kPing = 0x5f504e47;
 
 template <typename T>
 void append(std::vector<uint8_t>* bytes, const T& value) {
@@ -37,12 +38,21 @@ RequestBytes& RequestBytes::int32(int32_t value) {
     return *this;
 }
 
+RequestBytes& RequestBytes::word(uint32_t value) {
+    append(&data_, value);
+    return *this;
+}
+
 RequestBytes& RequestBytes::string16(std::string_view ascii) {
     int32(static_cast<int32_t>(ascii.size()));
     for (const char unit : ascii) append(&data_, static_cast<uint16_t>(unit));
     append(&data_, uint16_t{0});
     while (data_.size() % 4 != 0) data_.push_back(0);
     return *this;
+}
+
+RequestBytes& RequestBytes::nullString16() {
+    return int32(-1);
 }
 
 RequestBytes& RequestBytes::token(std::string_view descriptor) {
@@ -61,6 +71,17 @@ RequestBytes& RequestBytes::nullBinder() {
     return *this;
 }
 
+RequestBytes& RequestBytes::binder(uint64_t key, uint32_t stability) {
+    offsets_.push_back(data_.size());
+    flat_binder_object object{};
+    object.hdr.type = BINDER_TYPE_BINDER;
+    object.flags = 0x113;
+    object.binder = key;
+    object.cookie = key;
+    append(&data_, object);
+    return word(stability);
+}
+
 RequestBytes& RequestBytes::bytes(size_t count, uint8_t value) {
     data_.insert(data_.end(), count, value);
     return *this;
@@ -68,6 +89,12 @@ RequestBytes& RequestBytes::bytes(size_t count, uint8_t value) {
 
 int32_t RawReply::word(size_t offset) const {
     return offset + 4 <= data.size() ? load<int32_t>(data.data() + offset) : 0;
+}
+
+std::vector<uint32_t> RawReply::words() const {
+    std::vector<uint32_t> words(data.size() / sizeof(uint32_t));
+    memcpy(words.data(), data.data(), words.size() * sizeof(uint32_t));
+    return words;
 }
 
 RawBinder::RawBinder() : fd_(open("/dev/binder", O_RDWR | O_CLOEXEC)) {
@@ -119,31 +146,61 @@ RawReply RawBinder::transact(uint32_t handle, uint32_t code, const std::vector<u
             const auto command = load<uint32_t>(in.data() + at);
             const uint8_t* payload = in.data() + at + 4;
             at += 4 + _IOC_SIZE(command);
-            if (command == BR_DEAD_REPLY) return {RawReply::Kind::kDead, 0, {}, {}};
-            if (command == BR_FAILED_REPLY) return {RawReply::Kind::kFailed, 0, {}, {}};
-            if (command != BR_REPLY) continue;
-
-            const auto answer = load<binder_transaction_data>(payload);
-            const auto* bytes = reinterpret_cast<const uint8_t*>(answer.data.ptr.buffer);
-            RawReply reply;
-            reply.kind = (answer.flags & TF_STATUS_CODE) != 0 ? RawReply::Kind::kStatus
-                                                              : RawReply::Kind::kData;
-            reply.data.assign(bytes, bytes + answer.data_size);
-            if (reply.kind == RawReply::Kind::kStatus) reply.status = reply.word(0);
-            const auto* listed = reinterpret_cast<const binder_size_t*>(answer.data.ptr.offsets);
-            for (size_t i = 0; i < answer.offsets_size / sizeof(binder_size_t); ++i) {
-                const auto object = load<flat_binder_object>(bytes + listed[i]);
-                if (object.hdr.type != BINDER_TYPE_HANDLE) continue;
-                // Acquired before the buffer is freed: the buffer's own reference goes with it.
-                append(&pending_, uint32_t{BC_ACQUIRE});
-                append(&pending_, object.handle);
-                reply.handles.push_back(object.handle);
-            }
-            append(&pending_, uint32_t{BC_FREE_BUFFER});
-            append(&pending_, answer.data.ptr.buffer);
-            return reply;
+            if (std::optional<RawReply> reply = answered(command, payload)) return *reply;
+        }
+        if (sent == out.size() && !pending_.empty()) {
+            out = std::move(pending_);
+            pending_.clear();
+            sent = 0;
         }
     }
+}
+
+RawReply RawBinder::transact(uint32_t handle, uint32_t code, const RequestBytes& request) {
+    return transact(handle, code, request.data(), request.offsets());
+}
+
+// The reply, when the command is one; what the driver wants to hear back is left pending.
+std::optional<RawReply> RawBinder::answered(uint32_t command, const uint8_t* payload) {
+    switch (command) {
+        case BR_DEAD_REPLY:
+            return RawReply{RawReply::Kind::kDead, 0, {}, {}};
+        case BR_FAILED_REPLY:
+            return RawReply{RawReply::Kind::kFailed, 0, {}, {}};
+        case BR_INCREFS:
+        case BR_ACQUIRE:
+            append(&pending_, uint32_t{command == BR_INCREFS ? BC_INCREFS_DONE : BC_ACQUIRE_DONE});
+            append(&pending_, load<binder_ptr_cookie>(payload));
+            return std::nullopt;
+        case BR_REPLY:
+            break;
+        default:
+            return std::nullopt;
+    }
+
+    const auto answer = load<binder_transaction_data>(payload);
+    const auto* bytes = reinterpret_cast<const uint8_t*>(answer.data.ptr.buffer);
+    RawReply reply;
+    reply.kind =
+            (answer.flags & TF_STATUS_CODE) != 0 ? RawReply::Kind::kStatus : RawReply::Kind::kData;
+    reply.data.assign(bytes, bytes + answer.data_size);
+    if (reply.kind == RawReply::Kind::kStatus) reply.status = reply.word(0);
+    const auto* listed = reinterpret_cast<const binder_size_t*>(answer.data.ptr.offsets);
+    for (size_t i = 0; i < answer.offsets_size / sizeof(binder_size_t); ++i) {
+        const auto object = load<flat_binder_object>(bytes + listed[i]);
+        if (object.hdr.type != BINDER_TYPE_HANDLE) continue;
+        // Acquired before the buffer is freed: the buffer's own reference goes with it.
+        append(&pending_, uint32_t{BC_ACQUIRE});
+        append(&pending_, object.handle);
+        reply.handles.push_back(object.handle);
+    }
+    append(&pending_, uint32_t{BC_FREE_BUFFER});
+    append(&pending_, answer.data.ptr.buffer);
+    return reply;
+}
+
+bool RawBinder::pingServiceManager() {
+    return transact(0, kPing, RequestBytes()).kind == RawReply::Kind::kData;
 }
 
 std::optional<uint32_t> RawBinder::checkService(std::string_view name) {

@@ -16,17 +16,24 @@ namespace qvx::test {
 class RequestBytes {
   public:
     RequestBytes& int32(int32_t value);
+    RequestBytes& word(uint32_t value);
     RequestBytes& string16(std::string_view ascii);
+    RequestBytes& nullString16();
     // Strict-mode word, work-source word, header word 'SYST', descriptor.
     RequestBytes& token(std::string_view descriptor);
     // A null binder object with its stability word.
     RequestBytes& nullBinder();
+    // An object of the sender's own, known to it as `key`, with its stability word.
+    RequestBytes& binder(uint64_t key, uint32_t stability);
     RequestBytes& bytes(size_t count, uint8_t value);
 
     const std::vector<uint8_t>& data() const { return data_; }
+    // Where in the data the sender's own objects stand.
+    const std::vector<uint64_t>& offsets() const { return offsets_; }
 
   private:
     std::vector<uint8_t> data_;
+    std::vector<uint64_t> offsets_;
 };
 
 struct RawReply {
@@ -44,10 +51,12 @@ struct RawReply {
 
     // The 32-bit word at byte `offset` of the data; 0 past its end.
     int32_t word(size_t offset) const;
+    // The data as 32-bit words.
+    std::vector<uint32_t> words() const;
 };
 
 // One open binder driver. Not thread-safe. Every buffer is freed at once; acquired handles live as
-// long as the object.
+// long as the object. Its own objects can be given away and are never served.
 class RawBinder {
   public:
     RawBinder();
@@ -60,11 +69,17 @@ class RawBinder {
     // Sends a two-way request and waits for the answer.
     RawReply transact(uint32_t handle, uint32_t code, const std::vector<uint8_t>& data,
                       const std::vector<uint64_t>& offsets = {});
+    RawReply transact(uint32_t handle, uint32_t code, const RequestBytes& request);
+
+    // True when the service manager answers a ping.
+    bool pingServiceManager();
 
     // Asks the service manager for a service's handle.
     std::optional<uint32_t> checkService(std::string_view name);
 
   private:
+    std::optional<RawReply> answered(uint32_t command, const uint8_t* payload);
+
     int fd_ = -1;
     void* map_ = nullptr;
     std::vector<uint8_t> pending_;  // commands to send with the next request

@@ -72,7 +72,7 @@ void appendWord(std::vector<uint8_t>* data, uint32_t word) {
 
 TEST(Malformed, TokenMissingShortOrWrongIsBadType) {
     withRawConnection([](RawBinder& driver, uint32_t handle) {
-        expectStatus(STATUS_BAD_TYPE, driver.transact(handle, kEcho, {}));
+        expectStatus(STATUS_BAD_TYPE, driver.transact(handle, kEcho, RequestBytes()));
         expectStatus(STATUS_BAD_TYPE, driver.transact(handle, kEcho, {1, 2, 3}));
         expectStatus(STATUS_BAD_TYPE,
                      driver.transact(handle, kEcho, RequestBytes().int32(0).int32(-1).data()));
@@ -143,22 +143,22 @@ TEST(Malformed, UnknownCodesAreUnknownTransactions) {
 
 TEST(Malformed, ReservedCodesNeedNoToken) {
     withRawConnection([](RawBinder& driver, uint32_t handle) {
-        const auto ping = driver.transact(handle, 0x5f504e47, {});
+        const auto ping = driver.transact(handle, 0x5f504e47, RequestBytes());
         EXPECT_EQ(RawReply::Kind::kData, ping.kind);
         EXPECT_EQ(0U, ping.data.size());
 
-        const auto properties = driver.transact(handle, 0x5f535052, {});
+        const auto properties = driver.transact(handle, 0x5f535052, RequestBytes());
         EXPECT_EQ(RawReply::Kind::kData, properties.kind);
         EXPECT_EQ(0U, properties.data.size());
 
-        const auto descriptor = driver.transact(handle, 0x5f4e5446, {});
+        const auto descriptor = driver.transact(handle, 0x5f4e5446, RequestBytes());
         EXPECT_EQ(RequestBytes().string16("test.IService").data(), descriptor.data);
 
-        const auto pid = driver.transact(handle, 0x5f504944, {});
+        const auto pid = driver.transact(handle, 0x5f504944, RequestBytes());
         EXPECT_EQ(4U, pid.data.size());
         EXPECT_GT(pid.word(0), 1);
 
-        const auto extension = driver.transact(handle, 0x5f455854, {});
+        const auto extension = driver.transact(handle, 0x5f455854, RequestBytes());
         EXPECT_EQ(28U, extension.data.size());
         EXPECT_EQ(0x73682a85, extension.word(0));
         EXPECT_EQ(0x0c000001, extension.word(24));
@@ -265,7 +265,7 @@ TEST(Malformed, DumpWithoutArgumentsOrWithTooFewEnds) {
     withRawConnection([](RawBinder& driver, uint32_t handle) {
         constexpr uint32_t kDump = 0x5f444d50;
         // No descriptor to write to: the object's own failure.
-        expectStatus(STATUS_BAD_VALUE, driver.transact(handle, kDump, {}));
+        expectStatus(STATUS_BAD_VALUE, driver.transact(handle, kDump, RequestBytes()));
         auto request = std::vector<uint8_t>();
         appendObject(&request, BINDER_TYPE_FD, 1, 0);
         appendWord(&request, 0x7fffffff);
@@ -277,7 +277,7 @@ TEST(Malformed, DumpWithoutArgumentsOrWithTooFewEnds) {
 
 TEST(Malformed, ShellCommandWithoutAFunctionIsAccepted) {
     withRawConnection([](RawBinder& driver, uint32_t handle) {
-        const auto reply = driver.transact(handle, 0x5f434d44, {});
+        const auto reply = driver.transact(handle, 0x5f434d44, RequestBytes());
         EXPECT_EQ(RawReply::Kind::kData, reply.kind);
         EXPECT_EQ(0U, reply.data.size());
     });
