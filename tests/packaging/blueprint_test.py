@@ -47,7 +47,8 @@ class Blueprint(unittest.TestCase):
 
 class InitScript(unittest.TestCase):
     def test_sections_have_options(self):
-        (service,) = init_script.parse("# a comment\nservice a /b\n    class hal # why\n\n  task x y\n")
+        (service,) = init_script.parse(
+            "# a comment\nservice a /b\n    class hal # why\n\n  task x y\n")
         self.assertEqual(service.words, ["service", "a", "/b"])
         self.assertEqual(service.options, [["class", "hal"], ["task", "x", "y"]])
 
