@@ -44,7 +44,7 @@ step_progress() {
     fi
 }
 
-# Configures a preset unless its build folder is there already; ninja re-runs cmake when needed.
+# Configures a preset, every time: what a preset says may have changed since the last run.
 configure_preset() {
-    [ -f "build/$1/build.ninja" ] || cmake --preset "$1"
+    cmake --preset "$1"
 }
