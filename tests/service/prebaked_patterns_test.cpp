@@ -5,12 +5,15 @@
 #include <string>
 #include <vector>
 
+#include "force_feedback_phone.h"
 #include "service_test.h"
 
 namespace aidl::android::hardware::vibrator {
 namespace {
 
+using imitated::Access;
 using imitated::Operation;
+using ::testing::Contains;
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 
@@ -42,6 +45,77 @@ TEST_F(PrebakedPattern, AmplitudeOutOfRangeIsRefusedAndNothingWritten) {
                             "I HW_API: performPrebakedHapticPattern amplitude is abnormal 10001"));
 }
 
+TEST_F(PrebakedPattern, LargestAndSmallestAmplitudesAreRefused) {
+    const auto hwApi = makeHwApi();
+    for (const int amplitude : {-1, 2147483647, -2147483647 - 1}) {
+        EXPECT_FALSE(hwApi->performPrebakedHapticPattern(5, amplitude, false));
+        EXPECT_FALSE(hwApi->performPrebakedHapticPattern(5, amplitude, true));
+        EXPECT_EQ(log.lines().back(),
+                  "I HW_API: performPrebakedHapticPattern amplitude is abnormal " +
+                          std::to_string(amplitude));
+    }
+    EXPECT_THAT(kernel.calls(), IsEmpty());
+}
+
+TEST_F(PrebakedPattern, AmplitudesAtTheEndsOfTheRangeArePlayed) {
+    const auto hwApi = makeHwApi();
+    EXPECT_TRUE(hwApi->performPrebakedHapticPattern(5, 1, false));
+    EXPECT_EQ(kernel.text(kLegacy + "intensity"), "1\n");
+    EXPECT_TRUE(hwApi->performPrebakedHapticPattern(5, 10000, false));
+    EXPECT_EQ(kernel.text(kLegacy + "intensity"), "10000\n");
+    EXPECT_TRUE(hwApi->performPrebakedHapticPattern(5, 1, true));
+    EXPECT_EQ(kernel.text(kLegacy + "cp_trigger_queue"), std::string("5.0, 10, 0~\0", 12));
+}
+
+// The same on the LED class.
+class PatternOnLeds : public ServiceTest {
+  protected:
+    PatternOnLeds() {
+        addLedsClass();
+        for (const char* leaf : {"intensity", "cp_trigger_index", "cp_trigger_queue"}) {
+            kernel.addNode(kLeds + leaf);
+        }
+    }
+};
+
+TEST_F(PatternOnLeds, OnceWritesIntensityIndexAndStarts) {
+    const auto hwApi = makeHwApi();
+    EXPECT_TRUE(hwApi->performPrebakedHapticPattern(23, 6700, false));
+    EXPECT_THAT(kernel.writes(), ElementsAre("/sys/class/leds/vibrator/intensity \"6700\\n\"",
+                                             "/sys/class/leds/vibrator/cp_trigger_index \"23\\n\"",
+                                             "/sys/class/leds/vibrator/state \"1\\n\"",
+                                             "/sys/class/leds/vibrator/duration \"1000\\n\"",
+                                             "/sys/class/leds/vibrator/activate \"1\\n\""));
+}
+
+TEST_F(PatternOnLeds, OnceWithIndexZeroIsChosenButNotStarted) {
+    const auto hwApi = makeHwApi();
+    EXPECT_TRUE(hwApi->performPrebakedHapticPattern(0, 10000, false));
+    EXPECT_THAT(kernel.writes(), ElementsAre("/sys/class/leds/vibrator/intensity \"10000\\n\"",
+                                             "/sys/class/leds/vibrator/cp_trigger_index \"0\\n\""));
+}
+
+TEST_F(PatternOnLeds, RepeatedQueuesTheTextWithItsZeroByteAndLeavesTheIntensity) {
+    const auto hwApi = makeHwApi();
+    EXPECT_TRUE(hwApi->performPrebakedHapticPattern(12, 6700, true));
+    EXPECT_THAT(kernel.writes(),
+                ElementsAre("/sys/class/leds/vibrator/cp_trigger_index \"65534\\n\"",
+                            "/sys/class/leds/vibrator/cp_trigger_queue \"12.67, 10, 0~\\0\"",
+                            "/sys/class/leds/vibrator/state \"1\\n\"",
+                            "/sys/class/leds/vibrator/duration \"1000\\n\"",
+                            "/sys/class/leds/vibrator/activate \"1\\n\""));
+}
+
+TEST_F(PatternOnLeds, FailedStartOfEitherFails) {
+    const auto hwApi = makeHwApi();
+    kernel.addFault(
+            {.path = kLeds + "duration", .operation = Operation::kWrite, .error = EIO, .times = 2});
+    EXPECT_FALSE(hwApi->performPrebakedHapticPattern(12, 6700, false));
+    EXPECT_EQ(log.lines().back(), "I HW_API: performPrebakedHapticPattern on fail");
+    EXPECT_FALSE(hwApi->performPrebakedHapticPattern(12, 6700, true));
+    EXPECT_EQ(log.lines().back(), "I HW_API: performPrebakedHapticPattern on Trigger fail");
+}
+
 using PatternOnce = PrebakedPattern;
 
 TEST_F(PatternOnce, WritesIntensityIndexAndStarts) {
@@ -71,6 +145,22 @@ TEST_F(PatternOnce, IndexZeroIsChosenButNotStarted) {
     EXPECT_THAT(kernel.writes(),
                 ElementsAre("/sys/class/timed_output/vibrator/intensity \"10000\\n\"",
                             "/sys/class/timed_output/vibrator/cp_trigger_index \"0\\n\""));
+}
+
+TEST_F(PatternOnce, AnyIndexIsLeftToTheDriver) {
+    const auto hwApi = makeHwApi();
+    for (const int index : {-1, 65534, 2147483647, -2147483647 - 1}) {
+        EXPECT_TRUE(hwApi->performPrebakedHapticPattern(index, 10000, false));
+        EXPECT_EQ(kernel.text(kLegacy + "cp_trigger_index"), std::to_string(index) + "\n");
+    }
+}
+
+TEST_F(PatternOnce, MissingIntensityEndsIt) {
+    kernel.removeNode(kLegacy + "intensity");
+    const auto hwApi = makeHwApi();
+    EXPECT_FALSE(hwApi->performPrebakedHapticPattern(23, 6700, false));
+    EXPECT_THAT(kernel.writes(), IsEmpty());
+    EXPECT_EQ(log.lines().back(), "I HW_API: performPrebakedHapticPattern intensity write fail");
 }
 
 TEST_F(PatternOnce, FailedIntensityEndsIt) {
@@ -154,6 +244,23 @@ TEST_F(PatternRepeated, MissingQueueFails) {
     const auto hwApi = makeHwApi();
     EXPECT_FALSE(hwApi->performPrebakedHapticPattern(12, 6700, true));
     EXPECT_EQ(log.lines().back(), "I HW_API: performPrebakedHapticPattern is fail: 2");
+}
+
+TEST_F(PatternRepeated, QueueMustOpenForReadingAndWriting) {
+    kernel.addNode(kLegacy + "cp_trigger_queue", "\n", Access::kWriteOnly);
+    const auto hwApi = makeHwApi();
+    EXPECT_FALSE(hwApi->performPrebakedHapticPattern(12, 6700, true));
+    EXPECT_EQ(log.lines().back(), "I HW_API: performPrebakedHapticPattern is fail: 13");
+    EXPECT_THAT(kernel.writes(),
+                ElementsAre("/sys/class/timed_output/vibrator/cp_trigger_index \"65534\\n\""));
+}
+
+TEST_F(PatternRepeated, IndexZeroIsQueued) {
+    const auto hwApi = makeHwApi();
+    EXPECT_TRUE(hwApi->performPrebakedHapticPattern(0, 6700, true));
+    EXPECT_THAT(kernel.writes(),
+                Contains("/sys/class/timed_output/vibrator/cp_trigger_queue \"0.67, 10, 0~\\0\""));
+    EXPECT_EQ(kernel.text(kLegacy + "enable"), "1000\n");
 }
 
 TEST_F(PatternRepeated, ShortAndFailedQueueWritesStartNothing) {
@@ -267,6 +374,61 @@ TEST_F(PatternOnForceFeedback, RepeatWithRefusedGainEndsItWithoutALine) {
 TEST_F(PatternOnForceFeedback, RepeatThatCannotBeUploadedIsLogged) {
     EXPECT_FALSE(hwApi.performPrebakedHapticPattern(23, 6700, true));
     EXPECT_EQ(log.lines().back(), "I V_2_0: performPrebakedHapticPattern setAndTriggerOwt fail");
+}
+
+using PatternOnMotor = ForceFeedbackPhone;
+
+TEST_F(PatternOnMotor, OnceUploadsTheIndexAndPlaysIt) {
+    const auto hwApi = makeHwApi();
+    EXPECT_TRUE(hwApi->performPrebakedHapticPattern(23, 6700, false));
+    EXPECT_THAT(
+            kernel.calls(),
+            ElementsAre(
+                    "open /dev/input/event7 O_RDWR", "event type=21 code=96 value=6700",
+                    R"(upload id=-1 type=0x51 waveform=0x5d length=0 delay=0 custom="00 00 17 00")",
+                    "event type=21 code=0 value=1"));
+}
+
+TEST_F(PatternOnMotor, OnceWithIndexZeroUploadsAndPlaysNothing) {
+    const auto hwApi = makeHwApi();
+    EXPECT_TRUE(hwApi->performPrebakedHapticPattern(0, 6700, false));
+    EXPECT_THAT(
+            kernel.calls(),
+            ElementsAre(
+                    "open /dev/input/event7 O_RDWR", "event type=21 code=96 value=6700",
+                    R"(upload id=-1 type=0x51 waveform=0x5d length=0 delay=0 custom="00 00 00 00")"));
+}
+
+TEST_F(PatternOnMotor, RepeatedUploadsALoopAndPlaysIt) {
+    const auto hwApi = makeHwApi();
+    EXPECT_TRUE(hwApi->performPrebakedHapticPattern(5, 6700, true));
+    EXPECT_THAT(kernel.calls(),
+                ElementsAre("open /dev/input/event7 O_RDWR", "event type=21 code=96 value=6700",
+                            R"(upload id=-1 type=0x51 waveform=0x5d length=0 delay=0 )"
+                            R"(custom="00 00 01 ff 00 64 05 00 00 00 00 0a")",
+                            "event type=21 code=0 value=1"));
+    EXPECT_EQ(log.lines().back(), "I V_2_0: performPrebakedHapticPattern end");
+}
+
+TEST_F(PatternOnMotor, SecondPatternReplacesTheFirst) {
+    const auto hwApi = makeHwApi();
+    EXPECT_TRUE(hwApi->performPrebakedHapticPattern(5, 6700, true));
+    kernel.clear();
+    EXPECT_TRUE(hwApi->performPrebakedHapticPattern(23, 10000, false));
+    EXPECT_THAT(
+            kernel.calls(),
+            ElementsAre(
+                    "event type=21 code=96 value=10000", "erase id=0",
+                    R"(upload id=-1 type=0x51 waveform=0x5d length=0 delay=0 custom="00 00 17 00")",
+                    "event type=21 code=0 value=1"));
+}
+
+TEST_F(PatternOnMotor, RepeatThatCannotBeUploadedIsNotPlayed) {
+    const auto hwApi = makeHwApi();
+    kernel.addFault({.path = kMotor, .operation = Operation::kIoctl, .error = ENOSPC});
+    EXPECT_FALSE(hwApi->performPrebakedHapticPattern(5, 6700, true));
+    EXPECT_EQ(log.lines().back(), "I V_2_0: performPrebakedHapticPattern setAndTriggerOwt fail");
+    EXPECT_EQ(kernel.calls().size(), 3U);
 }
 
 }  // namespace
