@@ -2,7 +2,8 @@
 // Prints what a predefined effect costs on each kind of phone: the system calls of one perform()
 // and the user-space instructions that it takes, beside a bare loop that makes the same calls on
 // the same nodes. Both are counted, not timed, so a busy machine prints the same figures as an idle
-// one. Instructions are counted by Valgrind, in a second run of this program ("--play").
+// one (but for a few calls of the double click's thread, which share the C library's memory pools
+// with the log). Instructions are counted by Valgrind, in a second run of this program ("--play").
 #include <fcntl.h>
 #include <linux/input.h>
 #include <spawn.h>
