@@ -169,6 +169,22 @@ TEST_P(EffectCell, WritesItsNodesInOrderAndReportsItsLength) {
     EXPECT_EQ(log.lines().at(1), std::string("I HW_API: [preparePerform]") + GetParam().effectName);
 }
 
+TEST_P(EffectCell, OpensWritesAndClosesEachNodeAndAsksTheDriverNothingElse) {
+    EXPECT_TRUE(play(6700));
+    std::vector<std::string> expected;
+    for (const std::string& write : GetParam().writes) {
+        const std::string path = folder + write.substr(0, write.find(' '));
+        expected.push_back("open " + path + " O_RDWR");
+        expected.push_back("write " + folder + write);
+        expected.push_back("close " + path);
+    }
+    if (GetParam().way == Way::kDoubleClick) {
+        const int secondPulse = folder == kLeds ? 9 : 3;  // calls
+        expected.insert(expected.end() - secondPulse, "sleep 70 ms");
+    }
+    EXPECT_THAT(kernel.calls(), ElementsAreArray(expected));
+}
+
 TEST_P(EffectCell, WhoseFirstNodeFailsIsRefusedWithItsLengthSet) {
     failWrites(GetParam().way == Way::kPacket ? "haptic_engine" : "intensity");
     EXPECT_FALSE(play(6700));
