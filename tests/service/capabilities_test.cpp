@@ -1,10 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 //
-// What the driver offers: features, perform method, amplitude control and intensity lists.
+// What the driver offers: features, perform method, amplitude control.
 #include <cerrno>
+#include <ostream>
 #include <string>
+#include <tuple>
 #include <vector>
 
+#include "force_feedback_phone.h"
 #include "service_test.h"
 
 namespace aidl::android::hardware::vibrator {
@@ -12,9 +15,12 @@ namespace {
 
 using imitated::Access;
 using imitated::Operation;
+using ::testing::Combine;
 using ::testing::Contains;
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
+using ::testing::Values;
+using ::testing::ValuesIn;
 
 const std::string kFunctions = kInfo + "functions";
 
@@ -111,8 +117,27 @@ TEST_F(HasFeature, ListThatCannotBeReadIsNo) {
     EXPECT_EQ(makeHwApi()->hasFeature(qvx_features::INTENSITY), 0);
 }
 
-TEST_F(HasFeature, InterruptedReadIsRepeated) {
+TEST_F(HasFeature, WordAfterAZeroByteOfItsLineIsNotFound) {
+    kernel.addNode(kFunctions, std::string("X\0INTENSITY\nHAPTIC_ENGINE\n", 26), Access::kReadOnly);
+    const auto hwApi = makeHwApi();
+    EXPECT_EQ(hwApi->hasFeature(qvx_features::INTENSITY), 0);
+    EXPECT_EQ(hwApi->hasFeature(qvx_features::HAPTIC_ENGINE), 1);
+}
+
+TEST_F(HasFeature, LowerCaseIsAnotherWord) {
+    kernel.addNode(kFunctions, "intensity\n", Access::kReadOnly);
+    EXPECT_EQ(makeHwApi()->hasFeature(qvx_features::INTENSITY), 0);
+}
+
+TEST_F(HasFeature, ListThatMayNotBeReadIsMinusOne) {
+    kernel.addNode(kFunctions, "INTENSITY\n", Access::kWriteOnly);
+    EXPECT_EQ(makeHwApi()->hasFeature(qvx_features::INTENSITY), -1);
+}
+
+TEST_F(HasFeature, InterruptedOpenAndReadAreRepeated) {
     kernel.addNode(kFunctions, "INTENSITY\n", Access::kReadOnly);
+    kernel.addFault(
+            {.path = kFunctions, .operation = Operation::kOpen, .error = EINTR, .times = 2});
     kernel.addFault(
             {.path = kFunctions, .operation = Operation::kRead, .error = EINTR, .times = 2});
     EXPECT_EQ(makeHwApi()->hasFeature(qvx_features::INTENSITY), 1);
@@ -138,21 +163,16 @@ TEST_F(PerformMethod, PrebakedIndexComesFirst) {
                             "I HW_API: true", "I HW_API: getMotorPerformMethod type : 1"));
 }
 
-TEST_F(PerformMethod, HapticEngineComesSecond) {
-    kernel.addNode(kLeds + "haptic_engine");
-    kernel.addNode(kLeds + "intensity");
-    EXPECT_EQ(makeHwApi()->getMotorPerformMethod(), 2);
-}
-
-TEST_F(PerformMethod, IntensityComesThird) {
-    kernel.addNode(kLeds + "intensity");
-    EXPECT_EQ(makeHwApi()->getMotorPerformMethod(), 3);
-}
-
-TEST_F(PerformMethod, NothingIsNone) {
+TEST_F(PerformMethod, NothingIsNoneAfterEachNodeWasAskedFor) {
     const auto hwApi = makeHwApi();
     EXPECT_EQ(hwApi->getMotorPerformMethod(), 0);
-    EXPECT_EQ(log.lines().back(), "I HW_API: getMotorPerformMethod type : 0");
+    EXPECT_THAT(
+            log.lines(),
+            ElementsAre("I HW_API: isNodeExist node:/leds/vibrator/cp_trigger_index",
+                        "I HW_API: false",
+                        "I HW_API: isNodeExist node:/leds/vibrator/haptic_engine",
+                        "I HW_API: false", "I HW_API: isNodeExist node:/leds/vibrator/intensity",
+                        "I HW_API: false", "I HW_API: getMotorPerformMethod type : 0"));
 }
 
 TEST_F(PerformMethod, ReadOnlyNodeDoesNotCount) {
@@ -161,10 +181,59 @@ TEST_F(PerformMethod, ReadOnlyNodeDoesNotCount) {
     EXPECT_EQ(makeHwApi()->getMotorPerformMethod(), 3);
 }
 
-TEST_F(PerformMethod, ForceFeedbackPlaysByIndex) {
+struct Nodes {
+    const char* name;
+    std::vector<const char*> leaves;
+    int method;
+};
+
+void PrintTo(const Nodes& nodes, std::ostream* out) {
+    *out << nodes.name;
+}
+
+const Nodes kNodes[] = {
+        {"None", {}, 0},
+        {"Intensity", {"intensity"}, 3},
+        {"HapticEngine", {"haptic_engine"}, 2},
+        {"HapticEngineAndIntensity", {"haptic_engine", "intensity"}, 2},
+        {"Index", {"cp_trigger_index"}, 1},
+        {"IndexAndIntensity", {"cp_trigger_index", "intensity"}, 1},
+        {"IndexAndHapticEngine", {"cp_trigger_index", "haptic_engine"}, 1},
+        {"All", {"cp_trigger_index", "haptic_engine", "intensity"}, 1},
+};
+
+// The method on both classes: true stands for the LED class.
+class PerformMethodOfClass : public ServiceTest,
+                             public ::testing::WithParamInterface<std::tuple<bool, Nodes>> {};
+
+TEST_P(PerformMethodOfClass, FollowsFromTheNodesAndIsKeptFromTheStart) {
+    const auto& [isLeds, nodes] = GetParam();
+    isLeds ? addLedsClass() : addLegacyClass();
+    for (const char* leaf : nodes.leaves) kernel.addNode((isLeds ? kLeds : kLegacy) + leaf);
     const auto hwApi = makeHwApi();
-    useForceFeedback = true;
+    EXPECT_EQ(motorPerformMethod, nodes.method);
+    EXPECT_EQ(hwApi->getMotorPerformMethod(), nodes.method);
+    EXPECT_EQ(log.lines().back(),
+              "I HW_API: getMotorPerformMethod type : " + std::to_string(nodes.method));
+}
+
+INSTANTIATE_TEST_SUITE_P(PerformMethods, PerformMethodOfClass,
+                         Combine(Values(false, true), ValuesIn(kNodes)), [](const auto& row) {
+                             return std::string(std::get<0>(row.param) ? "Leds" : "Legacy") +
+                                    std::get<1>(row.param).name;
+                         });
+
+TEST_F(ForceFeedbackPhone, PlaysEffectsByIndex) {
+    const auto hwApi = makeHwApi();
+    EXPECT_EQ(motorPerformMethod, 1);
     EXPECT_EQ(hwApi->getMotorPerformMethod(), 1);
+    EXPECT_EQ(log.lines().back(), "I HW_API: getMotorPerformMethod type : 1");
+}
+
+TEST_F(ServiceTest, WithoutADeviceThereIsNoPerformMethod) {
+    const auto hwApi = makeHwApi();
+    EXPECT_EQ(motorPerformMethod, 0);
+    EXPECT_FALSE(hwApi->isAmplitudeControlExist());
 }
 
 using AmplitudeControl = Capabilities;
@@ -176,9 +245,8 @@ TEST_F(AmplitudeControl, IsTheIntensityNode) {
     EXPECT_TRUE(hwApi->isAmplitudeControlExist());
 }
 
-TEST_F(AmplitudeControl, ForceFeedbackHasItWithoutLookingAtANode) {
+TEST_F(ForceFeedbackPhone, HasAmplitudeControlWithoutLookingAtANode) {
     const auto hwApi = makeHwApi();
-    useForceFeedback = true;
     EXPECT_TRUE(hwApi->isAmplitudeControlExist());
     EXPECT_THAT(kernel.calls(), IsEmpty());
     EXPECT_THAT(log.lines(), ElementsAre("I HW_API: [isAmplitudeControlExist]return true"));
@@ -213,87 +281,6 @@ TEST_F(DynamicIntensityNode, HalfAPairOnEachSideIsNone) {
     EXPECT_FALSE(hwApi->isDynamicIntensityNodeExist());
     EXPECT_EQ(log.lines().back(),
               "I HW_API: [isDynamicIntensityNodeExist]dynamic intensity node Not exist");
-}
-
-class IntensityList : public Capabilities {
-  protected:
-    // The list that the node's text gives, or -1 alone for a failure.
-    std::vector<int> listOf(const std::string& text) {
-        kernel.addNode(kInfo + "intensities", text, Access::kReadOnly);
-        const auto hwApi = makeHwApi();
-        std::vector<int> list;
-        return hwApi->getDynamicIntensityList(true, list) ? list : std::vector<int>{-1};
-    }
-};
-
-TEST_F(IntensityList, NumbersStandBetweenCommas) {
-    EXPECT_THAT(listOf("100,200, 300\n"), ElementsAre(100, 200, 300));
-    EXPECT_THAT(log.lines(),
-                ElementsAre("I V_2_0: [getDynamicIntensityList]isDefaultType: 1",
-                            "I HW_API: >> readNodeAsString "
-                            "node:/vib_info_class/vib_support_info/intensities",
-                            "I HW_API: << readNodeAsString success - length: 12",
-                            "I V_2_0: [getDynamicIntensityList]raw value: 100,200, 300",
-                            "I V_2_0: [getDynamicIntensityList]list size: 3"));
-}
-
-TEST_F(IntensityList, TextAfterANumberIsIgnored) {
-    EXPECT_THAT(listOf("100mV,-5x, 7 8"), ElementsAre(100, -5, 7));
-}
-
-TEST_F(IntensityList, PieceWithoutDigitsIsSkippedAndTheOrderKept) {
-    EXPECT_THAT(listOf("1,,x2, ,3,"), ElementsAre(1, 3));
-}
-
-TEST_F(IntensityList, NumberBeyond32BitsIsSkipped) {
-    EXPECT_THAT(listOf("2147483648,5,-2147483649,2147483647,-2147483648,99999999999999999999999"),
-                ElementsAre(5, 2147483647, -2147483647 - 1));
-}
-
-TEST_F(IntensityList, ListWithoutANumberFails) {
-    EXPECT_THAT(listOf("none,at,all"), ElementsAre(-1));
-    EXPECT_EQ(log.lines().back(), "I V_2_0: [getDynamicIntensityList]Fail - empty list");
-}
-
-TEST_F(IntensityList, EmptyNodeFails) {
-    EXPECT_THAT(listOf(" \n"), ElementsAre(-1));
-    EXPECT_EQ(log.lines().back(), "I V_2_0: [getDynamicIntensityList]Fail - empty value");
-}
-
-TEST_F(IntensityList, ValuesAreAppendedToWhatTheListHeld) {
-    kernel.addNode(kInfo + "intensities", "x\n", Access::kReadOnly);
-    const auto hwApi = makeHwApi();
-    std::vector<int> list = {9};
-    EXPECT_TRUE(hwApi->getDynamicIntensityList(true, list));
-    EXPECT_EQ(log.lines().back(), "I V_2_0: [getDynamicIntensityList]list size: 1");
-    kernel.addNode(kInfo + "intensities", "1,2\n", Access::kReadOnly);
-    EXPECT_TRUE(hwApi->getDynamicIntensityList(true, list));
-    EXPECT_THAT(list, ElementsAre(9, 1, 2));
-}
-
-TEST_F(IntensityList, TypeChoosesTheNodeAndTheInformationClassComesFirst) {
-    kernel.addNode(kInfo + "intensities", "1\n", Access::kReadOnly);
-    kernel.addNode(kInfo + "haptic_intensities", "2\n", Access::kReadOnly);
-    kernel.addNode(kLeds + "intensities", "3\n", Access::kReadOnly);
-    kernel.addNode(kLeds + "haptic_intensities", "4\n", Access::kReadOnly);
-    const auto hwApi = makeHwApi();
-    std::vector<int> list;
-    EXPECT_TRUE(hwApi->getDynamicIntensityList(true, list));
-    EXPECT_TRUE(hwApi->getDynamicIntensityList(false, list));
-    kernel.removeNode(kInfo + "intensities");
-    kernel.removeNode(kInfo + "haptic_intensities");
-    EXPECT_TRUE(hwApi->getDynamicIntensityList(true, list));
-    EXPECT_TRUE(hwApi->getDynamicIntensityList(false, list));
-    EXPECT_THAT(list, ElementsAre(1, 2, 3, 4));
-    EXPECT_THAT(log.lines(), Contains("I V_2_0: [getDynamicIntensityList]isDefaultType: 0"));
-}
-
-TEST_F(IntensityList, WithoutANodeNothingIsRead) {
-    const auto hwApi = makeHwApi();
-    std::vector<int> list;
-    EXPECT_FALSE(hwApi->getDynamicIntensityList(true, list));
-    EXPECT_EQ(kernel.calls().back(), "open  O_RDONLY = ENOENT");
-    EXPECT_EQ(log.lines().back(), "I V_2_0: [getDynamicIntensityList]Fail - empty value");
 }
 
 }  // namespace

@@ -5,11 +5,13 @@
 #include <string>
 #include <vector>
 
+#include "force_feedback_phone.h"
 #include "service_test.h"
 
 namespace aidl::android::hardware::vibrator {
 namespace {
 
+using imitated::Access;
 using imitated::Operation;
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
@@ -62,6 +64,23 @@ TEST_F(HapticEngine, OnePacketIsWrittenInOneCallAndTheMotorStarted) {
                         "I HW_API: << writeNode node OK : 2", "I HW_API: performHapticEngine OK"));
 }
 
+TEST_F(ServiceTest, PacketsOfTheLegacyClassGoToItsOwnNode) {
+    addLegacyClass();
+    kernel.addNode(kLegacy + "haptic_engine");
+    const auto hwApi = makeHwApi();
+    EXPECT_TRUE(hwApi->performHapticEngine({{7, 10000, 2000, 1}}, 3400));
+    EXPECT_THAT(kernel.writes(), ElementsAre("/sys/class/timed_output/vibrator/haptic_engine "
+                                             "\"4 7 3400 2000 1\\n\"",
+                                             "/sys/class/timed_output/vibrator/enable \"1\\n\""));
+}
+
+TEST_F(ForceFeedbackPhone, HasNoNodeForPackets) {
+    const auto hwApi = makeHwApi();
+    EXPECT_FALSE(hwApi->performHapticEngine({{7, 10000, 2050, 0}}, 10000));
+    EXPECT_THAT(kernel.calls(), ElementsAre("open  O_RDWR = ENOENT"));
+    EXPECT_EQ(log.lines().back(), "I HW_API: performHapticEngine is fail: 2");
+}
+
 TEST_F(HapticEngine, PacketsFollowEachOther) {
     const auto hwApi = makeHwApi();
     EXPECT_TRUE(hwApi->performHapticEngine({{1, 2000, 3, 4}, {5, 6000, 7, 8}}, 5000));
@@ -88,6 +107,9 @@ TEST_F(HapticEngine, ProductKeepsItsLow32Bits) {
     EXPECT_EQ(textOf({0, 2147483647, 0, 0}, 10000), "4 0 -1 0 0\n");
     EXPECT_EQ(textOf({0, -2147483647 - 1, 0, 0}, 10000), "4 0 0 0 0\n");
     EXPECT_EQ(textOf({0, -2147483647 - 1, 0, 0}, 9999), "4 0 -214748 0 0\n");
+    EXPECT_EQ(textOf({0, -2147483647 - 1, 0, 0}, 1), "4 0 -214748 0 0\n");
+    EXPECT_EQ(textOf({0, 2147483647, 0, 0}, 1), "4 0 214748 0 0\n");
+    EXPECT_EQ(textOf({0, 2147483647, 0, 0}, 9999), "4 0 214747 0 0\n");
 }
 
 TEST_F(HapticEngine, NumberOfEightDigitsKeepsItsBlank) {
@@ -98,16 +120,42 @@ TEST_F(HapticEngine, LongerNumberIsCutToNineCharactersAndLosesItsBlank) {
     EXPECT_EQ(textOf({123456789, 0, 1234567890, 0}, 1), "4 1234567890 1234567890\n");
 }
 
+TEST_F(HapticEngine, LargestAndSmallestNumbersAreCutAndRunTogether) {
+    EXPECT_EQ(textOf({2147483647, 0, -2147483647 - 1, 0}, 1), "4 2147483640 -214748360\n");
+}
+
+TEST_F(HapticEngine, NumberOfExactlyNineCharactersStandsWithoutABlank) {
+    EXPECT_EQ(textOf({-12345678, 0, 1, 0}, 1), "4 -123456780 1 0\n");
+    EXPECT_EQ(textOf({1, 0, 1, 12345678}, 1), "4 1 0 1 12345678\n");
+}
+
 TEST_F(HapticEngine, LastNumberThatWasCutLosesACharacterToTheLineFeed) {
     EXPECT_EQ(textOf({1, 0, 2, 123456789}, 1), "4 1 0 2 12345678\n");
     EXPECT_EQ(textOf({1, 0, 2, -2147483647 - 1}, 1), "4 1 0 2 -2147483\n");
 }
 
-TEST_F(HapticEngine, SequenceOf339PacketsPasses) {
+TEST_F(HapticEngine, SequenceOf339PacketsIsWrittenWholeAndInOneCall) {
     const auto hwApi = makeHwApi();
     EXPECT_TRUE(hwApi->performHapticEngine(
-            std::vector<HapticEnginePacket>(339, {-99999999, 0, -99999999, -99999999}), 1));
-    EXPECT_EQ(kernel.text(kHapticEngine).substr(0, 16), "1356 -999999990 ");
+            std::vector<HapticEnginePacket>(339, {123, 10000, -456, 1}), 10000));
+    std::string text = "1356 ";
+    for (int i = 0; i < 339; ++i) text += "123 10000 -456 1 ";
+    text.back() = '\n';
+    EXPECT_EQ(kernel.text(kHapticEngine), text);
+    EXPECT_EQ(kernel.writes().size(), 1U + 3U);
+    EXPECT_EQ(log.lines().at(3), "I HW_API: performHapticEngine total_size : 1356");
+}
+
+TEST_F(HapticEngine, SequenceOf339PacketsOfTheLongestNumbersIsWrittenWhole) {
+    const auto hwApi = makeHwApi();
+    EXPECT_TRUE(hwApi->performHapticEngine(
+            std::vector<HapticEnginePacket>(
+                    339, {-2147483647 - 1, -2147483647 - 1, -2147483647 - 1, 2147483647}),
+            1));
+    std::string text = "1356 ";
+    for (int i = 0; i < 339; ++i) text += "-21474836-214748 -21474836214748364";
+    text.back() = '\n';
+    EXPECT_EQ(kernel.text(kHapticEngine), text);
 }
 
 TEST_F(HapticEngine, SequenceOf340PacketsIsTooLong) {
@@ -127,7 +175,11 @@ TEST_F(HapticEngine, AmplitudeOutOfRangeIsRefusedAndNothingWritten) {
     EXPECT_EQ(log.lines().back(), "I HW_API: performHapticEngine amplitude is abnormal 0");
     EXPECT_FALSE(hwApi->performHapticEngine({{7, 10000, 2050, 0}}, 10001));
     EXPECT_EQ(log.lines().back(), "I HW_API: performHapticEngine amplitude is abnormal 10001");
-    EXPECT_FALSE(hwApi->performHapticEngine({}, -2147483647 - 1));
+    for (const int amplitude : {-1, 2147483647, -2147483647 - 1}) {
+        EXPECT_FALSE(hwApi->performHapticEngine({{7, 10000, 2050, 0}}, amplitude));
+        EXPECT_EQ(log.lines().back(), "I HW_API: performHapticEngine amplitude is abnormal " +
+                                              std::to_string(amplitude));
+    }
     EXPECT_THAT(kernel.calls(), IsEmpty());
 }
 
@@ -138,6 +190,12 @@ TEST_F(HapticEngine, MissingNodeFails) {
     EXPECT_EQ(log.lines().back(), "I HW_API: performHapticEngine is fail: 2");
     EXPECT_THAT(kernel.calls(),
                 ElementsAre("open /sys/class/leds/vibrator/haptic_engine O_RDWR = ENOENT"));
+}
+
+TEST_F(HapticEngine, NodeMustOpenForReadingAndWriting) {
+    kernel.addNode(kHapticEngine, "\n", Access::kWriteOnly);
+    EXPECT_FALSE(makeHwApi()->performHapticEngine({}, 1));
+    EXPECT_EQ(log.lines().back(), "I HW_API: performHapticEngine is fail: 13");
 }
 
 TEST_F(HapticEngine, ShortAndFailedWritesStartNothing) {

@@ -1,16 +1,17 @@
 // SPDX-License-Identifier: Apache-2.0
 //
-// Prebaked patterns, once and repeating, on nodes and on force feedback.
+// Prebaked patterns, once and repeating, on the nodes of both classes.
 #include <cerrno>
 #include <string>
-#include <vector>
 
 #include "service_test.h"
 
 namespace aidl::android::hardware::vibrator {
 namespace {
 
+using imitated::Access;
 using imitated::Operation;
+using ::testing::Contains;
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 
@@ -42,6 +43,77 @@ TEST_F(PrebakedPattern, AmplitudeOutOfRangeIsRefusedAndNothingWritten) {
                             "I HW_API: performPrebakedHapticPattern amplitude is abnormal 10001"));
 }
 
+TEST_F(PrebakedPattern, LargestAndSmallestAmplitudesAreRefused) {
+    const auto hwApi = makeHwApi();
+    for (const int amplitude : {-1, 2147483647, -2147483647 - 1}) {
+        EXPECT_FALSE(hwApi->performPrebakedHapticPattern(5, amplitude, false));
+        EXPECT_FALSE(hwApi->performPrebakedHapticPattern(5, amplitude, true));
+        EXPECT_EQ(log.lines().back(),
+                  "I HW_API: performPrebakedHapticPattern amplitude is abnormal " +
+                          std::to_string(amplitude));
+    }
+    EXPECT_THAT(kernel.calls(), IsEmpty());
+}
+
+TEST_F(PrebakedPattern, AmplitudesAtTheEndsOfTheRangeArePlayed) {
+    const auto hwApi = makeHwApi();
+    EXPECT_TRUE(hwApi->performPrebakedHapticPattern(5, 1, false));
+    EXPECT_EQ(kernel.text(kLegacy + "intensity"), "1\n");
+    EXPECT_TRUE(hwApi->performPrebakedHapticPattern(5, 10000, false));
+    EXPECT_EQ(kernel.text(kLegacy + "intensity"), "10000\n");
+    EXPECT_TRUE(hwApi->performPrebakedHapticPattern(5, 1, true));
+    EXPECT_EQ(kernel.text(kLegacy + "cp_trigger_queue"), std::string("5.0, 10, 0~\0", 12));
+}
+
+// The same on the LED class.
+class PatternOnLeds : public ServiceTest {
+  protected:
+    PatternOnLeds() {
+        addLedsClass();
+        for (const char* leaf : {"intensity", "cp_trigger_index", "cp_trigger_queue"}) {
+            kernel.addNode(kLeds + leaf);
+        }
+    }
+};
+
+TEST_F(PatternOnLeds, OnceWritesIntensityIndexAndStarts) {
+    const auto hwApi = makeHwApi();
+    EXPECT_TRUE(hwApi->performPrebakedHapticPattern(23, 6700, false));
+    EXPECT_THAT(kernel.writes(), ElementsAre("/sys/class/leds/vibrator/intensity \"6700\\n\"",
+                                             "/sys/class/leds/vibrator/cp_trigger_index \"23\\n\"",
+                                             "/sys/class/leds/vibrator/state \"1\\n\"",
+                                             "/sys/class/leds/vibrator/duration \"1000\\n\"",
+                                             "/sys/class/leds/vibrator/activate \"1\\n\""));
+}
+
+TEST_F(PatternOnLeds, OnceWithIndexZeroIsChosenButNotStarted) {
+    const auto hwApi = makeHwApi();
+    EXPECT_TRUE(hwApi->performPrebakedHapticPattern(0, 10000, false));
+    EXPECT_THAT(kernel.writes(), ElementsAre("/sys/class/leds/vibrator/intensity \"10000\\n\"",
+                                             "/sys/class/leds/vibrator/cp_trigger_index \"0\\n\""));
+}
+
+TEST_F(PatternOnLeds, RepeatedQueuesTheTextWithItsZeroByteAndLeavesTheIntensity) {
+    const auto hwApi = makeHwApi();
+    EXPECT_TRUE(hwApi->performPrebakedHapticPattern(12, 6700, true));
+    EXPECT_THAT(kernel.writes(),
+                ElementsAre("/sys/class/leds/vibrator/cp_trigger_index \"65534\\n\"",
+                            "/sys/class/leds/vibrator/cp_trigger_queue \"12.67, 10, 0~\\0\"",
+                            "/sys/class/leds/vibrator/state \"1\\n\"",
+                            "/sys/class/leds/vibrator/duration \"1000\\n\"",
+                            "/sys/class/leds/vibrator/activate \"1\\n\""));
+}
+
+TEST_F(PatternOnLeds, FailedStartOfEitherFails) {
+    const auto hwApi = makeHwApi();
+    kernel.addFault(
+            {.path = kLeds + "duration", .operation = Operation::kWrite, .error = EIO, .times = 2});
+    EXPECT_FALSE(hwApi->performPrebakedHapticPattern(12, 6700, false));
+    EXPECT_EQ(log.lines().back(), "I HW_API: performPrebakedHapticPattern on fail");
+    EXPECT_FALSE(hwApi->performPrebakedHapticPattern(12, 6700, true));
+    EXPECT_EQ(log.lines().back(), "I HW_API: performPrebakedHapticPattern on Trigger fail");
+}
+
 using PatternOnce = PrebakedPattern;
 
 TEST_F(PatternOnce, WritesIntensityIndexAndStarts) {
@@ -71,6 +143,22 @@ TEST_F(PatternOnce, IndexZeroIsChosenButNotStarted) {
     EXPECT_THAT(kernel.writes(),
                 ElementsAre("/sys/class/timed_output/vibrator/intensity \"10000\\n\"",
                             "/sys/class/timed_output/vibrator/cp_trigger_index \"0\\n\""));
+}
+
+TEST_F(PatternOnce, AnyIndexIsLeftToTheDriver) {
+    const auto hwApi = makeHwApi();
+    for (const int index : {-1, 65534, 2147483647, -2147483647 - 1}) {
+        EXPECT_TRUE(hwApi->performPrebakedHapticPattern(index, 10000, false));
+        EXPECT_EQ(kernel.text(kLegacy + "cp_trigger_index"), std::to_string(index) + "\n");
+    }
+}
+
+TEST_F(PatternOnce, MissingIntensityEndsIt) {
+    kernel.removeNode(kLegacy + "intensity");
+    const auto hwApi = makeHwApi();
+    EXPECT_FALSE(hwApi->performPrebakedHapticPattern(23, 6700, false));
+    EXPECT_THAT(kernel.writes(), IsEmpty());
+    EXPECT_EQ(log.lines().back(), "I HW_API: performPrebakedHapticPattern intensity write fail");
 }
 
 TEST_F(PatternOnce, FailedIntensityEndsIt) {
@@ -156,6 +244,23 @@ TEST_F(PatternRepeated, MissingQueueFails) {
     EXPECT_EQ(log.lines().back(), "I HW_API: performPrebakedHapticPattern is fail: 2");
 }
 
+TEST_F(PatternRepeated, QueueMustOpenForReadingAndWriting) {
+    kernel.addNode(kLegacy + "cp_trigger_queue", "\n", Access::kWriteOnly);
+    const auto hwApi = makeHwApi();
+    EXPECT_FALSE(hwApi->performPrebakedHapticPattern(12, 6700, true));
+    EXPECT_EQ(log.lines().back(), "I HW_API: performPrebakedHapticPattern is fail: 13");
+    EXPECT_THAT(kernel.writes(),
+                ElementsAre("/sys/class/timed_output/vibrator/cp_trigger_index \"65534\\n\""));
+}
+
+TEST_F(PatternRepeated, IndexZeroIsQueued) {
+    const auto hwApi = makeHwApi();
+    EXPECT_TRUE(hwApi->performPrebakedHapticPattern(0, 6700, true));
+    EXPECT_THAT(kernel.writes(),
+                Contains("/sys/class/timed_output/vibrator/cp_trigger_queue \"0.67, 10, 0~\\0\""));
+    EXPECT_EQ(kernel.text(kLegacy + "enable"), "1000\n");
+}
+
 TEST_F(PatternRepeated, ShortAndFailedQueueWritesStartNothing) {
     const auto hwApi = makeHwApi();
     kernel.addFault(
@@ -189,84 +294,6 @@ TEST_F(PatternRepeated, FailedStartFails) {
     kernel.addFault({.path = kLegacy + "enable", .operation = Operation::kWrite, .error = EIO});
     EXPECT_FALSE(hwApi->performPrebakedHapticPattern(12, 6700, true));
     EXPECT_EQ(log.lines().back(), "I HW_API: performPrebakedHapticPattern on Trigger fail");
-}
-
-// The force-feedback operations that patterns call, one of which may fail.
-class ImitatedForceFeedback : public HwApi {
-  public:
-    bool setForceFeedbackAmplitude(int gain) override {
-        return answer("gain " + std::to_string(gain));
-    }
-    bool setForceFeedbackIndex(int index) override {
-        return answer("index " + std::to_string(index));
-    }
-    bool setForceFeedbackDuration(int durationMs) override {
-        return answer("duration " + std::to_string(durationMs));
-    }
-    bool triggerForceFeedbackVibration(bool on) override { return answer(on ? "start" : "stop"); }
-
-    std::string refused;
-    std::vector<std::string> requests;
-
-  private:
-    bool answer(const std::string& request) {
-        requests.push_back(request);
-        return request != refused;
-    }
-};
-
-class PatternOnForceFeedback : public ServiceTest {
-  protected:
-    PatternOnForceFeedback() {
-        useForceFeedback = true;
-        kernel.clear();
-        log.clear();
-    }
-
-    ImitatedForceFeedback hwApi;
-};
-
-TEST_F(PatternOnForceFeedback, OnceSetsGainAndIndexAndStarts) {
-    EXPECT_TRUE(hwApi.performPrebakedHapticPattern(23, 6700, false));
-    EXPECT_THAT(hwApi.requests, ElementsAre("gain 6700", "index 23", "duration 1000", "start"));
-    EXPECT_THAT(kernel.calls(), IsEmpty());
-    EXPECT_EQ(log.lines().back(), "I HW_API: performPrebakedHapticPattern one shoot end");
-}
-
-TEST_F(PatternOnForceFeedback, OnceWithIndexZeroIsNotStarted) {
-    EXPECT_TRUE(hwApi.performPrebakedHapticPattern(0, 6700, false));
-    EXPECT_THAT(hwApi.requests, ElementsAre("gain 6700", "index 0"));
-}
-
-TEST_F(PatternOnForceFeedback, RefusedGainOrIndexEndsItWithoutALine) {
-    hwApi.refused = "gain 6700";
-    EXPECT_FALSE(hwApi.performPrebakedHapticPattern(23, 6700, false));
-    EXPECT_THAT(hwApi.requests, ElementsAre("gain 6700"));
-    EXPECT_EQ(log.lines().back(), "I HW_API: performPrebakedHapticPattern one shoot starts");
-    hwApi.refused = "index 23";
-    EXPECT_FALSE(hwApi.performPrebakedHapticPattern(23, 6700, false));
-    EXPECT_EQ(log.lines().back(), "I HW_API: performPrebakedHapticPattern one shoot starts");
-}
-
-TEST_F(PatternOnForceFeedback, RepeatWithIndexZeroIsRefused) {
-    EXPECT_FALSE(hwApi.performPrebakedHapticPattern(0, 6700, true));
-    EXPECT_THAT(hwApi.requests, IsEmpty());
-    EXPECT_THAT(log.lines(),
-                ElementsAre("I HW_API: performPrebakedHapticPattern 0 : 6700 : 1",
-                            "I HW_API: performPrebakedHapticPattern repeat starts",
-                            "I V_2_0: performPrebakedHapticPattern Cannot use patternIndex 0 with "
-                            "repeat"));
-}
-
-TEST_F(PatternOnForceFeedback, RepeatWithRefusedGainEndsItWithoutALine) {
-    hwApi.refused = "gain 6700";
-    EXPECT_FALSE(hwApi.performPrebakedHapticPattern(23, 6700, true));
-    EXPECT_EQ(log.lines().back(), "I HW_API: performPrebakedHapticPattern repeat starts");
-}
-
-TEST_F(PatternOnForceFeedback, RepeatThatCannotBeUploadedIsLogged) {
-    EXPECT_FALSE(hwApi.performPrebakedHapticPattern(23, 6700, true));
-    EXPECT_EQ(log.lines().back(), "I V_2_0: performPrebakedHapticPattern setAndTriggerOwt fail");
 }
 
 }  // namespace

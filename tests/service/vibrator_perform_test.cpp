@@ -5,6 +5,8 @@
 #include <memory>
 #include <vector>
 
+#include "force_feedback_phone.h"
+#include "refused_threads.h"
 #include "vibrator_test.h"
 
 namespace aidl::android::hardware::vibrator {
@@ -28,6 +30,57 @@ TEST_F(Perform, EffectIsPlayedAndItsLengthReturned) {
     EXPECT_EQ(kernel.text(kLeds + "haptic_engine"), "4 7 10000 2050 0\n");
     EXPECT_EQ(log.lines().front(), "E V_2_0: Vibrator perform Effect : 2 EffectStrength : 2");
     EXPECT_EQ(log.lines().back(), "E V_2_0: Vibrator perform timeMS return: 17");
+}
+
+TEST_F(Perform, LogsItsOwnLinesAsErrorsAndTheHardwareLayersAsInformation) {
+    kernel.addNode(kLeds + "intensity");
+    const auto vibrator = makeVibrator();
+    int32_t durationMs = 0;
+    EXPECT_TRUE(
+            vibrator->perform(Effect::CLICK, EffectStrength::MEDIUM, nullptr, &durationMs).isOk());
+    EXPECT_THAT(
+            log.lines(),
+            ElementsAre("E V_2_0: Vibrator perform Effect : 0 EffectStrength : 1",
+                        "I HW_API: setPerformAmplitude : 6700",
+                        "I HW_API: [preparePerform]amplitude: 6700",
+                        "I HW_API: [preparePerform]CLICK",
+                        "I HW_API: setAmplitude : INTENSITY 6700",
+                        "I HW_API: >> writeNode node:/leds/vibrator/intensity val:6700",
+                        "I HW_API: << writeNode node OK : 5", "I HW_API: do_on for timeoutMs: 7",
+                        "I HW_API: >> writeNode node:/leds/vibrator/state val:1",
+                        "I HW_API: << writeNode node OK : 2",
+                        "I HW_API: >> writeNode node:/leds/vibrator/duration val:7",
+                        "I HW_API: << writeNode node OK : 2",
+                        "I HW_API: >> writeNode node:/leds/vibrator/activate val:1",
+                        "I HW_API: << writeNode node OK : 2",
+                        "E V_2_0: Vibrator perform timeMS return: 17"));
+    EXPECT_THAT(log.tags(), ElementsAre("QvxVibrator-HAL-AIDL-CORE"));
+}
+
+TEST_F(Perform, DoubleClickReports95MillisecondsAndGoesOnByItself) {
+    kernel.addNode(kLeds + "intensity");
+    const auto vibrator = makeVibrator();
+    int32_t durationMs = 0;
+    EXPECT_TRUE(vibrator->perform(Effect::DOUBLE_CLICK, EffectStrength::LIGHT, nullptr, &durationMs)
+                        .isOk());
+    EXPECT_EQ(durationMs, 95);
+    ASSERT_TRUE(
+            log.waitFor("I HW_API: End perform on another thread - performEffect_DOUBLE_CLICK"));
+    EXPECT_EQ(kernel.text(kLeds + "duration"), "15\n");
+}
+
+TEST_F(Perform, DoubleClickWithoutAThreadIsAnIllegalStateAndNothingIsThrown) {
+    kernel.addNode(kLeds + "intensity");
+    const auto vibrator = makeVibrator();
+    const imitated::RefusedThreads threads;
+    int32_t durationMs = 77;
+    EXPECT_NO_THROW(
+            EXPECT_EQ(exceptionOf(vibrator->perform(Effect::DOUBLE_CLICK, EffectStrength::LIGHT,
+                                                    nullptr, &durationMs)),
+                      EX_ILLEGAL_STATE));
+    EXPECT_EQ(durationMs, 77);
+    EXPECT_EQ(threads.count(), 1U);
+    EXPECT_THAT(kernel.writes(), ElementsAre("/sys/class/leds/vibrator/intensity \"3400\\n\""));
 }
 
 TEST_F(Perform, EveryStrengthHasItsAmplitude) {
@@ -124,6 +177,53 @@ TEST_F(Perform, FailingDriverIsAnIllegalStateWithoutALine) {
     EXPECT_EQ(log.lines().back(), "I HW_API: setAmplitude : INTENSITY error");
 }
 
+// The service on a phone with a force-feedback motor, which it closes at its end.
+class PerformOnForceFeedback : public ForceFeedbackPhone {
+  protected:
+    std::shared_ptr<Vibrator> makeVibrator() {
+        auto vibrator = ndk::SharedRefBase::make<Vibrator>(makeHwApi());
+        log.clear();
+        return vibrator;
+    }
+    // The number of the closed device is kept; nobody is to close it twice.
+    ~PerformOnForceFeedback() override { inputFD = -1; }
+};
+
+TEST_F(PerformOnForceFeedback, EveryStrengthIsAGain) {
+    const auto vibrator = makeVibrator();
+    int32_t durationMs = 0;
+    EXPECT_TRUE(
+            vibrator->perform(Effect::TICK, EffectStrength::LIGHT, nullptr, &durationMs).isOk());
+    EXPECT_EQ(durationMs, 60);
+    EXPECT_THAT(kernel.calls(), Contains("event type=21 code=96 value=3400"));
+    EXPECT_TRUE(
+            vibrator->perform(Effect::TICK, EffectStrength::MEDIUM, nullptr, &durationMs).isOk());
+    EXPECT_THAT(kernel.calls(), Contains("event type=21 code=96 value=6700"));
+    EXPECT_TRUE(
+            vibrator->perform(Effect::TICK, EffectStrength::STRONG, nullptr, &durationMs).isOk());
+    EXPECT_THAT(kernel.calls(), Contains("event type=21 code=96 value=10000"));
+}
+
+TEST_F(PerformOnForceFeedback, UnpluggedMotorIsAnIllegalState) {
+    const auto vibrator = makeVibrator();
+    kernel.addFault({.path = kMotor, .operation = Operation::kWrite, .error = ENODEV, .times = 0});
+    int32_t durationMs = 77;
+    EXPECT_EQ(exceptionOf(vibrator->perform(Effect::CLICK, EffectStrength::LIGHT, nullptr,
+                                            &durationMs)),
+              EX_ILLEGAL_STATE);
+    EXPECT_EQ(durationMs, 77);
+}
+
+TEST_F(PerformOnForceFeedback, FourEffectsAreSupported) {
+    const auto vibrator = makeVibrator();
+    std::vector<Effect> effects;
+    EXPECT_TRUE(vibrator->getSupportedEffects(&effects).isOk());
+    EXPECT_THAT(effects, ElementsAre(Effect::CLICK, Effect::DOUBLE_CLICK, Effect::TICK,
+                                     Effect::HEAVY_CLICK));
+    EXPECT_THAT(log.lines(), ElementsAre("E V_2_0: getSupportedEffects",
+                                         "I HW_API: [isAmplitudeControlExist]return true"));
+}
+
 using SupportedEffects = VibratorTest;
 
 TEST_F(SupportedEffects, AreFourWithAmplitudeControl) {
@@ -152,6 +252,28 @@ TEST_F(SupportedEffects, AlwaysOnOnesAreTheSameAndLogBothLines) {
                                      Effect::HEAVY_CLICK));
     EXPECT_EQ(log.lines()[0], "E V_2_0: Vibrator getSupportedAlwaysOnEffects ");
     EXPECT_EQ(log.lines()[1], "E V_2_0: getSupportedEffects");
+}
+
+TEST_F(SupportedEffects, AreFourOnTheLegacyClassToo) {
+    for (const char* leaf : {"activate", "duration", "state"}) kernel.removeNode(kLeds + leaf);
+    addLegacyClass();
+    kernel.addNode(kLegacy + "intensity");
+    const auto vibrator = makeVibrator();
+    std::vector<Effect> effects;
+    EXPECT_TRUE(vibrator->getSupportedEffects(&effects).isOk());
+    EXPECT_EQ(effects.size(), 4U);
+}
+
+TEST_F(SupportedEffects, AreNoneOnAPhoneThatPlaysThemWithoutAmplitudeControl) {
+    kernel.addNode(kLeds + "haptic_engine");
+    const auto vibrator = makeVibrator();
+    std::vector<Effect> effects;
+    EXPECT_TRUE(vibrator->getSupportedEffects(&effects).isOk());
+    EXPECT_THAT(effects, IsEmpty());
+    int32_t durationMs = 0;
+    EXPECT_TRUE(
+            vibrator->perform(Effect::TICK, EffectStrength::STRONG, nullptr, &durationMs).isOk());
+    EXPECT_EQ(durationMs, 17);
 }
 
 // A service whose list is its own, to see through which table the always-on query asks.

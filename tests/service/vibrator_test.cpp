@@ -87,6 +87,32 @@ TEST_F(GetCapabilities, AllTogetherIs60) {
     EXPECT_EQ(capabilities, 60);
 }
 
+TEST_F(GetCapabilities, EveryQuestionIsLogged) {
+    kernel.addNode(kLeds + "intensity");
+    kernel.addNode(kFunctions, "CAPABILITY_EXTERNAL_CONTROL\nPRIMITIVE_EFFECT_COMPOSE\n",
+                   Access::kReadOnly);
+    const auto vibrator = makeVibrator();
+    int32_t capabilities = 0;
+    EXPECT_TRUE(vibrator->getCapabilities(&capabilities).isOk());
+    EXPECT_THAT(
+            log.lines(),
+            ElementsAre("E V_2_0: Vibrator reporting capabilities",
+                        "I HW_API: isNodeExist node:/leds/vibrator/intensity", "I HW_API: true",
+                        "I HW_API: [hasFeature] debug functions=CAPABILITY_EXTERNAL_CONTROL", "I ",
+                        "I HW_API: [hasFeature] debug functions=PRIMITIVE_EFFECT_COMPOSE", "I ",
+                        "I HW_API: [hasFeature] debug functions=CAPABILITY_EXTERNAL_CONTROL",
+                        "I "));
+}
+
+TEST_F(GetCapabilities, ListThatCannotBeOpenedIsNoYes) {
+    kernel.addNode(kLeds + "intensity");
+    const auto vibrator = makeVibrator();
+    int32_t capabilities = 0;
+    EXPECT_TRUE(vibrator->getCapabilities(&capabilities).isOk());
+    EXPECT_EQ(capabilities, 4);
+    EXPECT_THAT(log.lines(), Contains("I HW_API: [hasFeature]fopen error!!").Times(2));
+}
+
 using OnOff = VibratorTest;
 
 TEST_F(OnOff, OnStartsTheMotor) {

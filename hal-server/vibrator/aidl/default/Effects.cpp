@@ -150,14 +150,20 @@ void HwApi::performEffect_DOUBLE_CLICK() {
     // Empty only where no shared pointer owns this object, and then its owner must outlive the
     // click.
     const std::shared_ptr<HwApi> keepAlive = weak_from_this().lock();
-    std::thread([this, keepAlive] {
+    const auto click = [this, keepAlive] {
         LOG(INFO) << "HW_API: Start perform on another thread - performEffect_DOUBLE_CLICK";
         do_off();
         do_on(10);
         std::this_thread::sleep_for(milliseconds(70));
         do_on(15);
         LOG(INFO) << "HW_API: End perform on another thread - performEffect_DOUBLE_CLICK";
-    }).detach();
+    };
+    try {
+        std::thread(click).detach();
+    } catch (const std::system_error& error) {
+        // In the words of the phone's C++ library, whichever library this is built with.
+        throw std::system_error(error.code(), "thread constructor failed");
+    }
 }
 
 }  // namespace aidl::android::hardware::vibrator
