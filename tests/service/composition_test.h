@@ -1,9 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 //
-// What the tests of compositions share: short ways to write one down, a client's callback that can
-// be waited for, and a phone whose motor is a force-feedback device.
+// What the tests of compositions share: short ways to write one down and to look at the log, a
+// client's callback that can be waited for, and a phone whose motor is a force-feedback device.
 #pragma once
 
+#include <algorithm>
 #include <chrono>
 #include <condition_variable>
 #include <functional>
@@ -26,6 +27,14 @@ inline CompositeEffect after(int32_t delayMs, CompositePrimitive primitive, floa
     effect.primitive = primitive;
     effect.scale = scale;
     return effect;
+}
+
+using Lines = std::vector<std::string>;
+
+// The records that follow a record.
+inline Lines linesAfter(const Lines& lines, const std::string& line) {
+    const auto found = std::find(lines.begin(), lines.end(), line);
+    return found == lines.end() ? Lines{line + " is missing"} : Lines(found + 1, lines.end());
 }
 
 // Counts its calls. `action` runs in each of them, on the thread that calls; `answer` is the
