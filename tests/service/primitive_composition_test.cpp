@@ -61,7 +61,8 @@ class Composing : public VibratorTest {
     std::string textOf(const Composite& composite, bool onForceFeedback) {
         const ndk::ScopedAStatus status = compose(composite, onForceFeedback);
         if (!status.isOk()) return "exception " + std::to_string(status.getExceptionCode());
-        return onForceFeedback ? hwApi->taken.back() : kernel.text(kLeds + "cp_trigger_queue");
+        if (!onForceFeedback) return kernel.text(kLeds + "cp_trigger_queue");
+        return hwApi->taken.empty() ? "no text" : hwApi->taken.back();
     }
 
     std::shared_ptr<WaveformTaker> hwApi;
