@@ -31,6 +31,15 @@ Status okIf(bool condition) {
     return condition ? Status::ok() : Status::fromExceptionCode(EX_ILLEGAL_ARGUMENT);
 }
 
+/// From a thread of its own; never when there is nothing to wait for.
+void callBackAfter(int32_t delayMs, const Callback& callback) {
+    if (delayMs == 0) return;
+    std::thread([delayMs, callback] {
+        std::this_thread::sleep_for(std::chrono::milliseconds(delayMs));
+        callback->onComplete();
+    }).detach();
+}
+
 class Standard final : public BnVibrator {
     Status on(int32_t timeoutMs, const Callback&) override {
         if (timeoutMs == 1) {
@@ -52,12 +61,16 @@ class Standard final : public BnVibrator {
         if (callback == nullptr || composite.empty()) {
             return Status::fromExceptionCode(EX_NULL_POINTER);
         }
-        const std::chrono::milliseconds delay(composite[0].delayMs);
-        if (delay.count() == 0) return Status::ok();
-        std::thread([delay, callback] {
-            std::this_thread::sleep_for(delay);
-            callback->onComplete();
-        }).detach();
+        callBackAfter(composite[0].delayMs, callback);
+        return Status::ok();
+    }
+
+    Status composePwle(const std::vector<PrimitivePwle>& composite,
+                       const Callback& callback) override {
+        if (callback == nullptr || composite.empty()) {
+            return Status::fromExceptionCode(EX_NULL_POINTER);
+        }
+        callBackAfter(composite[0].get<PrimitivePwle::braking>().duration, callback);
         return Status::ok();
     }
 
@@ -82,9 +95,6 @@ class Standard final : public BnVibrator {
     Status getPwlePrimitiveDurationMax(int32_t*) override { return unknown(); }
     Status getPwleCompositionSizeMax(int32_t*) override { return unknown(); }
     Status getSupportedBraking(std::vector<Braking>*) override { return unknown(); }
-    Status composePwle(const std::vector<PrimitivePwle>&, const Callback&) override {
-        return unknown();
-    }
 };
 
 class Extension final : public BnZelVibrator {

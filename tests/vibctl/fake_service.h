@@ -13,6 +13,7 @@ namespace fake {
 ///                              3: the process dies before it answers; else ok
 ///     perform(effect, ...)     calls back at once; the result is the caller's uid
 ///     compose(effects)         calls back after the first entry's delay; never when that is 0
+///     composePwle(segments)    likewise after the first segment, which is a brake
 ///     setAmplitude(amplitude)  ok for nan only, else EX_ILLEGAL_ARGUMENT
 ///
 /// of the extension: setAmplitude(amplitude) is ok for -1 only, else EX_ILLEGAL_ARGUMENT;

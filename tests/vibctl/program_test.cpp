@@ -96,6 +96,34 @@ constexpr WrongUsage kWrongUsages[] = {
         {"ArgumentCount", "ext setAmplitude",
          "vibctl: ext setAmplitude: takes 1 argument, got 0; usage: vibctl ext setAmplitude "
          "AMPLITUDE\n"},
+        {"CompositionField", "std compose 50,CLICK,1.0 50,CLICK",
+         "vibctl: std compose: packet \"50,CLICK\": 2 fields where 3 are wanted: "
+         "DELAY_MS,PRIMITIVE,SCALE; usage: vibctl std compose DELAY_MS,PRIMITIVE,SCALE... "
+         "[--callback]\n"},
+        {"CompositionDelay", "std compose 2147483648,CLICK,1 --callback",
+         "vibctl: std compose: packet \"2147483648,CLICK,1\": DELAY_MS \"2147483648\" is not an "
+         "integer from -2147483648 to 2147483647; usage: vibctl std compose "
+         "DELAY_MS,PRIMITIVE,SCALE... [--callback]\n"},
+        {"CompositionPrimitive", "std compose 0,BUZZ,1 --callback",
+         "vibctl: std compose: packet \"0,BUZZ,1\": PRIMITIVE \"BUZZ\" is neither a number from "
+         "-2147483648 to 2147483647 nor one of NOOP, CLICK, THUD, SPIN, QUICK_RISE, SLOW_RISE, "
+         "QUICK_FALL, LIGHT_TICK, LOW_TICK; usage: vibctl std compose DELAY_MS,PRIMITIVE,SCALE... "
+         "[--callback]\n"},
+        {"CompositionScale", "std compose 0,CLICK, --callback",
+         "vibctl: std compose: packet \"0,CLICK,\": SCALE \"\" is not a number a float can hold "
+         "(nor nan, inf, -inf); usage: vibctl std compose DELAY_MS,PRIMITIVE,SCALE... "
+         "[--callback]\n"},
+        {"PwleKind", "std composePwle pause,100 --callback",
+         "vibctl: std composePwle: packet \"pause,100\": begins with neither active nor brake; "
+         "usage: vibctl std composePwle SEGMENT... [--callback]\n"},
+        {"PwleField", "std composePwle brake,CLAB",
+         "vibctl: std composePwle: packet \"brake,CLAB\": 1 field where 2 are wanted: "
+         "BRAKING,DURATION_MS; usage: vibctl std composePwle SEGMENT... [--callback]\n"},
+        {"CallbackOfAQuery", "std getPrimitiveDuration CLICK --callback",
+         "vibctl: std getPrimitiveDuration: takes no --callback, unlike on, perform, compose, "
+         "composePwle; usage: vibctl std getPrimitiveDuration PRIMITIVE\n"},
+        {"WaitWithoutSeconds", "std compose 0,CLICK,1 --callback --wait",
+         "vibctl: --wait needs a number of seconds\n"},
         {"ArgumentOfList", "list all",
          "vibctl: list takes no arguments; usage: vibctl [--json] list\n"},
 };

@@ -142,6 +142,20 @@ TEST_F(VibctlWithService, ReportsWhenACompositionCompletes) {
                 HasSubstr("compose: ok, completed after "));
 }
 
+TEST_F(VibctlWithService, ReportsWhenAPiecewiseLinearCompositionCompletes) {
+    const nlohmann::json callback = callbackOf("std composePwle brake,CLAB,300 --callback");
+    ASSERT_TRUE(callback.is_number());
+    EXPECT_GE(callback.get<int>(), 300);
+    EXPECT_LT(callback.get<int>(), 2000);
+    EXPECT_EQ(callbackOf("--wait 0.2 std composePwle brake,CLAB,0 --callback"), "timeout");
+    expect("std composePwle --callback", 1, "composePwle: EX_NULL_POINTER\n");
+}
+
+TEST_F(VibctlWithService, PassesNoCallbackUnlessAskedTo) {
+    expect("std compose 300,CLICK,1", 1, "compose: EX_NULL_POINTER\n");
+    expect("std composePwle brake,CLAB,300", 1, "composePwle: EX_NULL_POINTER\n");
+}
+
 TEST_F(VibctlWithService, WaitsForACompletionNoLongerThanToldTo) {
     EXPECT_EQ(callbackOf("--wait 0.2 std compose 0,CLICK,1 --callback"), "timeout");
     EXPECT_EQ(callbackOf("--wait 0 std compose 0,CLICK,1 --callback"), "timeout");
