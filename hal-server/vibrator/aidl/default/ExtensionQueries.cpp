@@ -10,6 +10,7 @@
 #include <string_view>
 
 #include <android-base/logging.h>
+#include <log/log.h>
 
 #include "Constants.h"
 #include "ServiceStatus.h"
@@ -94,7 +95,12 @@ bool hasLetter(const LetterQuery& query) {
         return false;
     }
     descriptor.reset();
-    buffer[count - 1] = '\0';  // the driver's line feed; a text without one loses a character
+    if (count >= static_cast<ssize_t>(sizeof(buffer))) {
+        ALOGE("Read MAX limit. Always end of string is null");
+        buffer[sizeof(buffer) - 1] = '\0';
+    } else {
+        buffer[count - 1] = '\0';  // the driver's line feed; a text without one loses a character
+    }
 
     const std::string_view text = buffer;
     LOG(INFO) << "V_4_0: " << query.name << " string : " << text << " len : " << text.size();

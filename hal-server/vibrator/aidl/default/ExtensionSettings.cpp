@@ -6,7 +6,7 @@
 
 #include <cerrno>
 #include <optional>
-#include <string>
+#include <string_view>
 
 #include <android-base/logging.h>
 
@@ -90,7 +90,7 @@ ndk::ScopedAStatus Vibrator::setFolderTentModeStatus(ZelFolderTentModeStatus sta
                                                           : core::FOLDER_TENT_CLOSE);
 }
 
-ndk::ScopedAStatus Vibrator::sendPosture(const char* operation, const std::string& command) const {
+ndk::ScopedAStatus Vibrator::sendPosture(const char* operation, std::string_view command) const {
     LOG(INFO) << "V_4_0: " << command << " length : " << command.size();
     const std::optional<ssize_t> written =
             core::kernel::writeOnce(core::THE_DEVICE_EVENT_CMD, command.data(), command.size());

@@ -7,6 +7,7 @@
 #include <cstdint>
 #include <memory>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include <aidl/vendor/quorvan/hardware/vibrator/BnZelVibrator.h>
@@ -112,7 +113,7 @@ class Vibrator : public BnZelVibrator {
     ndk::ScopedAStatus answer(const LetterQuery& query, bool* result) const;
 
     // Sends the event_cmd node one of the posture commands.
-    ndk::ScopedAStatus sendPosture(const char* operation, const std::string& command) const;
+    ndk::ScopedAStatus sendPosture(const char* operation, std::string_view command) const;
 
     const std::shared_ptr<core::HwApi> mHwApi;
 };
