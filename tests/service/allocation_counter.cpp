@@ -35,7 +35,10 @@ ptrdiff_t AllocationCounter::held() const {
 
 #ifdef QVX_SANITIZER_HEAP
 
-#include <sanitizer/allocator_interface.h>
+// The sanitizers' own interface; GCC brings the function without its header.
+extern "C" int __sanitizer_install_malloc_and_free_hooks(
+        void (*onTaken)(const volatile void* block, size_t size),
+        void (*onGivenBack)(const volatile void* block));
 
 namespace {
 
