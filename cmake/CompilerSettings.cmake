@@ -5,7 +5,8 @@ set(QVX_SANITIZE "" CACHE STRING "Sanitizers, as for -fsanitize= (address,undefi
 add_compile_options(
     -Wall -Wextra -Werror
     -Wcast-align -Wconversion -Wno-sign-conversion -Wformat=2 -Wimplicit-fallthrough -Wshadow
-    -Wno-maybe-uninitialized  # GCC cannot follow std::variant and std::optional
+    # GCC cannot follow std::variant and std::optional; Clang has no such warning.
+    $<$<CXX_COMPILER_ID:GNU>:-Wno-maybe-uninitialized>
     $<$<COMPILE_LANGUAGE:CXX>:-Wnon-virtual-dtor>
     $<$<COMPILE_LANGUAGE:CXX>:-Wold-style-cast>
     $<$<COMPILE_LANGUAGE:CXX>:-Woverloaded-virtual>)

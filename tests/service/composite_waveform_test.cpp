@@ -5,16 +5,23 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cstdint>
 #include <string>
 #include <vector>
+
+#include "allocation_counter.h"
+#include "log_capture.h"
 
 namespace aidl::android::hardware::vibrator {
 namespace {
 
 using testing::ElementsAre;
 using testing::ElementsAreArray;
+using testing::IsEmpty;
+using testing::internal::CaptureStderr;
 using testing::internal::CaptureStdout;
+using testing::internal::GetCapturedStderr;
 using testing::internal::GetCapturedStdout;
 
 using Bytes = std::vector<uint8_t>;
@@ -32,10 +39,16 @@ struct Outcome {
 Outcome compile(std::string text) {
     Bytes buffer(1152, 0);
     buffer.insert(buffer.end(), 64, kGuard);
+    const LogCapture log;
     CaptureStdout();
+    CaptureStderr();
     Outcome outcome;
+    const AllocationCounter allocations;
     outcome.result = wt_type10_comp_str_to_bin(text.data(), buffer.data());
+    EXPECT_EQ(allocations.taken(), 0U) << text;
     outcome.printed = GetCapturedStdout();
+    EXPECT_EQ(GetCapturedStderr(), "");
+    EXPECT_THAT(log.lines(), IsEmpty());
     EXPECT_EQ(Bytes(buffer.begin() + 1152, buffer.end()), Bytes(64, kGuard));
     if (outcome.result > 0) outcome.bytes.assign(buffer.begin(), buffer.begin() + outcome.result);
     return outcome;
@@ -118,6 +131,11 @@ TEST(CompositeWaveform, CommasSpacesAndLineFeedsSeparate) {
     expectBytes("1.10\n20 2.30", {0, 0, 2, 0, 0, 10, 1, 0, 0, 0, 0, 20, 0, 30, 2, 0, 0, 0, 0, 0});
 }
 
+TEST(CompositeWaveform, SeparatorsInAnyNumberAreOne) {
+    expectBytes(repeated(", \n", 100000) + "1.10" + repeated("\n ,", 100000),
+                {0, 0, 1, 0, 0, 10, 1, 0, 0, 0, 0, 0});
+}
+
 TEST(CompositeWaveform, TrailingCommaIsNoToken) {
     expectBytes("50,1.100,", {0, 0, 2, 0, 0, 0, 0, 0, 0, 0, 0, 50, 0, 100, 1, 0, 0, 0, 0, 0});
 }
@@ -194,6 +212,55 @@ TEST(CompositeWaveform, PauseIsOneToTenThousand) {
     expectBytes("10000", {0, 0, 1, 0, 0, 0, 0, 0, 0, 0, 0x27, 0x10});
 }
 
+TEST(CompositeWaveform, NumbersAreReadAsTheCLibraryReadsThem) {
+    // White space and a sign may precede the digits, and what follows them is not looked at.
+    expectBytes("\t7x", {0, 0, 1, 0, 0, 0, 0, 0, 0, 0, 0, 7});
+    expectBytes("+7", {0, 0, 1, 0, 0, 0, 0, 0, 0, 0, 0, 7});
+    expectBytes("0007", {0, 0, 1, 0, 0, 0, 0, 0, 0, 0, 0, 7});
+    expectBytes("1.+50x.20", {0, 0, 1, 0, 0, 50, 1, 0, 0, 0, 0, 0});
+    // A negative number wraps: -18446744073709551609 is 7.
+    expectBytes("-18446744073709551609", {0, 0, 1, 0, 0, 0, 0, 0, 0, 0, 0, 7});
+    expectRefusal("18446744073709551615", "Delay 18446744073709551615 too long\n");
+    expectRefusal("18446744073709551616", "Delay 18446744073709551615 too long\n");
+    expectRefusal("-18446744073709551617", "Delay 18446744073709551615 too long\n");
+    expectRefusal("--7", "Failed to get inner loop repeat value\n");
+    expectRefusal("0x10", "Failed to get inner loop repeat value\n");
+}
+
+TEST(CompositeWaveform, BytesThatAreNoCharactersArePartOfATokenOnly) {
+    expectRefusal("\x80\xff", "Failed to get inner loop repeat value\n");
+    expectBytes("1.10\xff", {0, 0, 1, 0, 0, 10, 1, 0, 0, 0, 0, 0});
+    expectRefusal("\xff!", "Failed to get outer loop specifier\n");
+}
+
+TEST(CompositeWaveform, TildeWithCompanyIsNoLoopForEver) {
+    expectRefusal("~~", "Failed to get inner loop repeat value\n");
+    expectRefusal("0~", "Failed to get inner loop repeat value\n");
+    expectRefusal("~!", "Failed to get outer loop specifier\n");
+    expectRefusal("~.5", "Failed to parse waveform\n");
+}
+
+TEST(CompositeWaveform, OuterLoopOf256IsNoneAndMayBeGivenAgain) {
+    expectBytes("256!,1.10,~", {0, 0, 1, 0xff, 0, 10, 1, 0, 0, 0, 0, 0});
+}
+
+TEST(CompositeWaveform, OuterLoopMayStandAnywhere) {
+    expectBytes("1.10,~,2.20", {0, 0, 2, 0xff, 0, 10, 1, 0, 0, 0, 0, 0, 0, 20, 2, 0, 0, 0, 0, 0});
+}
+
+TEST(CompositeWaveform, EmptyInnerLoopIsASectionOfItsOwn) {
+    expectBytes("!!,2!!", {0, 0, 1, 0, 0, 0, 0, 2, 0, 0, 0, 0});
+}
+
+TEST(CompositeWaveform, InnerLoopsMayFollowEachOther) {
+    expectBytes("!!,1.10,2!!,!!,2.20,3!!",
+                {0, 0, 2, 0, 0, 10, 1, 2, 0, 0, 0, 0, 0, 20, 2, 3, 0, 0, 0, 0});
+}
+
+TEST(CompositeWaveform, FailedInnerLoopCountIsTheOnlyMessage) {
+    expectRefusal("!!,x!!", "Failed to get inner loop repeat value\n");
+}
+
 TEST(CompositeWaveform, NegativePauseIsRefused) {
     expectRefusal("-5", "Delay 18446744073709551611 too long\n");
 }
@@ -216,6 +283,23 @@ TEST(CompositeWaveform, HundredFortyThreeSectionsFillTheBufferButForAWord) {
     const Outcome outcome = compile(repeated("1.10,", 143));
     EXPECT_EQ(outcome.result, 4 + 143 * 8);
     EXPECT_EQ(outcome.bytes[2], 143);
+}
+
+TEST(CompositeWaveform, BufferHolds287WordsHoweverLongTheText) {
+    for (const int sections : {144, 145, 200, 255}) {
+        const Outcome outcome = compile(repeated("1.10.5,20,", sections));
+        EXPECT_EQ(outcome.result, 4 + 287 * 4) << sections;
+        EXPECT_EQ(outcome.bytes[2], sections);
+        EXPECT_EQ(outcome.printed, "");
+    }
+}
+
+TEST(CompositeWaveform, TwoHundredEightySevenWordsAreWholeSectionsAndTwoThirdsOfOne) {
+    // 95 sections of three words are 285; of the 96th the first two words remain.
+    const Outcome outcome = compile(repeated("1.10.5,", 95) + "2.20.7,30");
+    ASSERT_EQ(outcome.result, 1152);
+    EXPECT_THAT(Bytes(outcome.bytes.end() - 12, outcome.bytes.end()),
+                ElementsAre(0, 0, 0, 20, 0, 20, 2, 0, 0, 8, 0, 30));
 }
 
 TEST(CompositeWaveform, WritingStopsAtTheLastWordThatFits) {

@@ -245,12 +245,12 @@ TEST_P(EffectOnForceFeedback, SetsTheGainUploadsItsPatternAndPlaysIt) {
 }
 
 TEST_P(EffectOnForceFeedback, WhoseUploadFailsIsRefusedWithItsLengthSet) {
-    kernel.addFault({.path = kMotor, .operation = Operation::kIoctl, .error = EINVAL});
+    kernel.addFault({.path = kMotorNode, .operation = Operation::kIoctl, .error = EINVAL});
     EXPECT_FALSE(play(6700));
 }
 
 TEST_P(EffectOnForceFeedback, WhoseStartFailsIsRefusedWithItsLengthSet) {
-    kernel.addFault({.path = kMotor, .operation = Operation::kWrite, .error = ENODEV, .after = 1});
+    kernel.addFault({.path = kMotorNode, .operation = Operation::kWrite, .error = ENODEV, .after = 1});
     EXPECT_FALSE(play(6700));
     EXPECT_EQ(log.lines().back(), "I HW_API: performPrebakedHapticPattern on fail");
 }

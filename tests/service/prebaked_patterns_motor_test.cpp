@@ -142,7 +142,7 @@ TEST_F(PatternOnMotor, SecondPatternReplacesTheFirst) {
 
 TEST_F(PatternOnMotor, RepeatThatCannotBeUploadedIsNotPlayed) {
     const auto hwApi = makeHwApi();
-    kernel.addFault({.path = kMotor, .operation = Operation::kIoctl, .error = ENOSPC});
+    kernel.addFault({.path = kMotorNode, .operation = Operation::kIoctl, .error = ENOSPC});
     EXPECT_FALSE(hwApi->performPrebakedHapticPattern(5, 6700, true));
     EXPECT_EQ(log.lines().back(), "I V_2_0: performPrebakedHapticPattern setAndTriggerOwt fail");
     EXPECT_EQ(kernel.calls().size(), 3U);

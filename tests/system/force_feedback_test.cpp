@@ -3,6 +3,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include "force_feedback_journal.h"
 #include "phone_control.h"
 
 namespace qvx::test {
@@ -12,30 +13,13 @@ using nlohmann::json;
 using testing::ElementsAre;
 using testing::HasSubstr;
 
-// What the motor saw, in short: "upload LENGTH CUSTOM_HEX", "erase ID", "event CODE VALUE".
-std::vector<std::string> motorRequests(const Phone& phone) {
-    std::vector<std::string> result;
-    for (const json& entry : phone.journal()) {
-        const std::string op = entry.value("op", "");
-        if (op == "upload") {
-            result.push_back("upload " + std::to_string(entry.value("length", -1)) + " " +
-                             entry.value("custom_hex", ""));
-        } else if (op == "erase") {
-            result.push_back("erase " + std::to_string(entry.value("id", -1)));
-        } else if (op == "event") {
-            result.push_back("event " + std::to_string(entry.value("code", -1)) + " " +
-                             std::to_string(entry.value("value", -1)));
-        }
-    }
-    return result;
-}
-
 TEST(ForceFeedbackPhone, OnUploadsAnEffectOfThatLengthAndPlaysIt) {
     const Phone phone("ff");
     ASSERT_EQ(phone.up().status, 0) << phone.up().out << phone.up().err;
     phone.reset();
     EXPECT_EQ(phone.call({"std", "on", "500"})["exception"], 0);
-    EXPECT_THAT(motorRequests(phone), ElementsAre("upload 500 00000000", "event 0 1"));
+    EXPECT_THAT(motorRequests(phone),
+                ElementsAre("open O_RDWR", "upload 500 00000000", "event 0 1"));
 }
 
 TEST(ForceFeedbackPhone, SecondOnErasesTheFirstEffect) {
@@ -58,7 +42,7 @@ TEST(ForceFeedbackPhone, AmplitudeIsSentAsGain) {
     const Phone phone("ff");
     phone.reset();
     EXPECT_EQ(phone.call({"std", "setAmplitude", "0.5"})["exception"], 0);
-    EXPECT_THAT(motorRequests(phone), ElementsAre("event 96 5000"));
+    EXPECT_THAT(motorRequests(phone), ElementsAre("open O_RDWR", "event 96 5000"));
 }
 
 TEST(ForceFeedbackPhone, CalibrationReachesTheDriver) {
@@ -78,7 +62,8 @@ TEST(ForceFeedbackPhone, CompositionIsUploadedAsACompiledWaveformAndCompletes) {
     EXPECT_TRUE(answer["callback"].is_number()) << answer;
     EXPECT_GE(answer["callback"].get<double>(), 70.0);
     EXPECT_THAT(motorRequests(phone),
-                ElementsAre("upload 0 0000020000000000000000320064010000000000", "event 0 1"));
+                ElementsAre("open O_RDWR", "upload 0 0000020000000000000000320064010000000000",
+                            "event 0 1"));
 }
 
 TEST(ForceFeedbackPhone, NegativeDelayIsRefusedByTheWaveformCompiler) {
@@ -88,12 +73,81 @@ TEST(ForceFeedbackPhone, NegativeDelayIsRefusedByTheWaveformCompiler) {
     EXPECT_THAT(motorRequests(phone), testing::IsEmpty());
 }
 
-TEST(ForceFeedbackPhone, FailedUploadIsIllegalState) {
+TEST(ForceFeedbackPhone, EveryFieldOfARequestIsAsTheDriverExpectsIt) {
     const Phone phone("ff");
     phone.reset();
-    phone.fault({{"node", "motor"}, {"op", "upload"}, {"errno", "ENOSPC"}, {"times", 1}});
-    EXPECT_EQ(phone.call({"std", "on", "500"})["exception"], -5);
-    EXPECT_THAT(phone.log(), HasSubstr("HW_API: [uploadForceFeedbackeffect]ioctl fail: "));
+    phone.call({"std", "on", "500"});
+    phone.call({"std", "setAmplitude", "1.0"});
+    phone.call({"std", "on", "70"});
+    const auto upload = [](int length) {
+        return json{{"uid", 1000},        {"op", "upload"},
+                    {"node", "motor"},    {"id", -1},
+                    {"result", 0},        {"type", 81},
+                    {"waveform", 93},     {"length", length},
+                    {"delay", 0},         {"direction", 0},
+                    {"button", 0},        {"interval", 0},
+                    {"period", 0},        {"magnitude", 0},
+                    {"offset", 0},        {"phase", 0},
+                    {"attack_length", 0}, {"attack_level", 0},
+                    {"fade_length", 0},   {"fade_level", 0},
+                    {"custom_len", 2},    {"custom_hex", "00000000"}};
+    };
+    const auto event = [](int code, int value) {
+        return json{{"uid", 1000},  {"op", "event"},  {"node", "motor"}, {"type", 21},
+                    {"code", code}, {"value", value}, {"result", 24}};
+    };
+    EXPECT_THAT(motorLines(phone), ElementsAre(json({{"uid", 1000},
+                                                     {"op", "open"},
+                                                     {"node", "motor"},
+                                                     {"flags", "O_RDWR"},
+                                                     {"error", 0}}),
+                                               upload(500), event(0, 1), event(96, 10000),
+                                               json({{"uid", 1000},
+                                                     {"op", "erase"},
+                                                     {"node", "motor"},
+                                                     {"id", 0},
+                                                     {"result", 0}}),
+                                               upload(70), event(0, 1)));
+}
+
+TEST(ForceFeedbackPhone, DurationIsOfSixteenBits) {
+    const Phone phone("ff");
+    phone.reset();
+    for (const char* duration : {"65536", "65535", "-1"}) {
+        EXPECT_EQ(phone.call({"std", "on", duration})["exception"], 0) << duration;
+    }
+    EXPECT_THAT(motorRequests(phone), ElementsAre("open O_RDWR", "upload 0 00000000", "event 0 1",
+                                                  "erase 0", "upload 65535 00000000", "event 0 1",
+                                                  "erase 0", "upload 65535 00000000", "event 0 1"));
+}
+
+TEST(ForceFeedbackPhone, OffBeforeAnyOnStopsNoEffect) {
+    const Phone phone("ff");
+    phone.reset();
+    EXPECT_EQ(phone.call({"std", "off"})["exception"], 0);
+    EXPECT_THAT(motorRequests(phone), ElementsAre("open O_RDWR", "event 65535 0"));
+}
+
+TEST(ForceFeedbackPhone, OnAfterAnEffectStartsThatEffectAgain) {
+    const Phone phone("ff");
+    EXPECT_EQ(phone.call({"std", "perform", "CLICK", "STRONG"})["exception"], 0);
+    phone.reset();
+    EXPECT_EQ(phone.call({"std", "on", "500"})["exception"], 0);
+    EXPECT_THAT(motorRequests(phone), ElementsAre("event 0 1"));
+}
+
+TEST(ForceFeedbackPhone, SwitchesTheDriverToThePlatformsNumbersAtItsStart) {
+    const Phone phone("ff");
+    EXPECT_THAT(phone.writes(), ElementsAre("use_kyp_index 1\n", "f0_stored 137\n"));
+    EXPECT_THAT(phone.log(), HasSubstr("HW_API: Vibrator using ForceFeedback\n"));
+}
+
+TEST(ForceFeedbackPhone, CalibrationOfWhiteSpaceIsNotPassedOn) {
+    json profile = builtInProfile("ff");
+    profile["files"]["/efs/FactoryApp/vibrator_calibration"] = " \n";
+    const Phone phone(profile);
+    EXPECT_THAT(phone.writes(), ElementsAre("use_kyp_index 1\n"));
+    EXPECT_THAT(phone.log(), HasSubstr("HW_API: Fail - read vibrator_calibration\n"));
 }
 
 }  // namespace

@@ -11,7 +11,8 @@
 namespace binder_ndk {
 namespace {
 
-void logLine(android_LogPriority priority, const char* format, va_list arguments) {
+__attribute__((format(printf, 2, 0))) void logLine(android_LogPriority priority, const char* format,
+                                                   va_list arguments) {
     const int saved = errno;
     __android_log_vprint(priority, "libbinder_ndk", format, arguments);
     errno = saved;

@@ -106,8 +106,8 @@ size_t utf8Length(std::u16string_view utf16) {
 }
 
 void utf16ToUtf8(std::u16string_view utf16, char* to) {
-    constexpr char32_t kLeadMarks[] = {0, 0, 0xc0, 0xe0, 0xf0};
-    forEachCodePoint(utf16, [&to, &kLeadMarks](char32_t code) {
+    static constexpr char32_t kLeadMarks[] = {0, 0, 0xc0, 0xe0, 0xf0};
+    forEachCodePoint(utf16, [&to](char32_t code) {
         const size_t length = encodedLength(code);
         for (size_t at = length; at-- > 1;) {
             to[at] = static_cast<char>(0x80 | (code & 0x3f));

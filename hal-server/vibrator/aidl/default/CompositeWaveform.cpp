@@ -7,6 +7,7 @@
 #include <cerrno>
 #include <climits>
 #include <cstdarg>
+#include <cstddef>
 #include <cstdio>
 #include <cstring>
 
@@ -16,7 +17,7 @@ namespace aidl::android::hardware::vibrator {
 namespace {
 
 constexpr int HEADER_SIZE = 4;
-constexpr size_t SPECIFIER_SEARCH_LENGTH = 20;  // a "!" or "." further on is not looked for
+constexpr ptrdiff_t SPECIFIER_SEARCH_LENGTH = 20;  // a "!" or "." further on is not looked for
 constexpr unsigned long AMPLITUDE_MAX = 100;
 constexpr unsigned long DELAY_MAX = 10000;
 constexpr unsigned long DURATION_OWN_LENGTH = 65535;
@@ -40,25 +41,35 @@ bool isSeparator(char character) {
     return character == ',' || character == ' ' || character == '\n';
 }
 
+char* skipSeparators(char* text) {
+    while (isSeparator(*text)) ++text;
+    return text;
+}
+
 bool isDigit(char character) {
     return character >= '0' && character <= '9';
 }
 
-// The number at `*text`, as strtoul(3) reads it in base 10: white space, a sign, digits; a negative
-// number wraps and one too large is ULONG_MAX. `*text` is moved behind it. False when there is no
-// digit.
-bool readNumber(const char** text, unsigned long* number) {
-    const char* at = *text;
-    while (*at == ' ' || (*at >= '\t' && *at <= '\r')) ++at;
-    const bool negative = *at == '-';
-    if (*at == '-' || *at == '+') ++at;
-    if (!isDigit(*at)) return false;
+struct Number {
+    unsigned long value;
+    const char* end;  // behind the last digit; null when there was none
+};
 
+// The number at `text`, as strtoul(3) reads it in base 10: white space, a sign, digits; a negative
+// number wraps and one too large is ULONG_MAX.
+inline Number readNumber(const char* text) {
+    bool negative = false;
+    if (!isDigit(*text)) {
+        while (*text == ' ' || (*text >= '\t' && *text <= '\r')) ++text;
+        negative = *text == '-';
+        if (negative || *text == '+') ++text;
+        if (!isDigit(*text)) return {0, nullptr};
+    }
     unsigned long value = 0;
     bool overflow = false;
-    for (; isDigit(*at); ++at) {
-        const auto digit = static_cast<unsigned long>(*at - '0');
-        overflow = overflow || value > (ULONG_MAX - digit) / 10;
+    for (; isDigit(*text); ++text) {
+        const auto digit = static_cast<unsigned long>(*text - '0');
+        if (value >= ULONG_MAX / 10) overflow |= value > (ULONG_MAX - digit) / 10;
         value = value * 10 + digit;
     }
     if (overflow) {
@@ -66,15 +77,12 @@ bool readNumber(const char** text, unsigned long* number) {
     } else if (negative) {
         value = 0 - value;
     }
-    *text = at;
-    *number = value;
-    return true;
+    return {value, text};
 }
 
 // The number a token begins with; 0 when it begins with none.
 unsigned long leadingNumber(const char* token) {
-    unsigned long number = 0;
-    return readNumber(&token, &number) ? number : 0;
+    return readNumber(token).value;
 }
 
 bool hasContent(const wt_type10_comp_section& section) {
@@ -146,28 +154,46 @@ int addDelay(wt_type10_comp* comp, const char* token) {
     return 0;
 }
 
-// First rule that fits wins; see the list in the header.
-wt_type10_comp_specifier classify(const char* token, size_t length) {
-    if (length == 1 && token[0] == '~') return WT_TYPE10_COMP_OUTER_LOOP_FOREVER;
-    if (length == 2 && memcmp(token, "!!", 2) == 0) return WT_TYPE10_COMP_INNER_LOOP_BEGIN;
-    if (strstr(token, "!!") != nullptr) return WT_TYPE10_COMP_INNER_LOOP_END;
-    const size_t searched = std::min(length, SPECIFIER_SEARCH_LENGTH);
-    if (memchr(token, '!', searched) != nullptr) return WT_TYPE10_COMP_OUTER_LOOP_COUNT;
-    if (memchr(token, '.', searched) != nullptr) return WT_TYPE10_COMP_WAVEFORM;
-    return WT_TYPE10_COMP_DELAY;
-}
+struct Token {
+    char* text;
+    wt_type10_comp_specifier kind;
+};
 
-// Cuts the next token out of `*text` and moves behind it; null at the end of the text.
-char* nextToken(char** text, size_t* length) {
-    char* token = *text;
-    while (isSeparator(*token)) ++token;
-    char* end = token;
-    while (*end != '\0' && !isSeparator(*end)) ++end;
-    *length = static_cast<size_t>(end - token);
-    *text = end;
-    if (*length == 0) return nullptr;
-    if (*end != '\0') *(*text)++ = '\0';
-    return token;
+// Cuts the next token out of `*text`, moves behind it and says what it is, all in one pass. Of the
+// rules the first that fits wins. False at the end of the text.
+bool nextToken(char** text, Token* token) {
+    char* const begin = skipSeparators(*text);
+    char* at = begin;
+    bool hasDoubleMark = false;
+    bool hasMark = false;
+    bool hasPoint = false;
+    for (;; ++at) {
+        if (*at >= '0') continue;  // digits and "~", most of every text
+        if (*at == '.') {
+            hasPoint |= at - begin < SPECIFIER_SEARCH_LENGTH;
+        } else if (*at == '!') {
+            hasDoubleMark |= at[1] == '!';
+            hasMark |= at - begin < SPECIFIER_SEARCH_LENGTH;
+        } else if (*at == '\0' || isSeparator(*at)) {
+            break;
+        }
+    }
+    const ptrdiff_t length = at - begin;
+    *text = at;
+    if (length == 0) return false;
+    if (*at != '\0') *(*text)++ = '\0';
+
+    token->text = begin;
+    if (length == 1 && *begin == '~') {
+        token->kind = WT_TYPE10_COMP_OUTER_LOOP_FOREVER;
+    } else if (hasDoubleMark) {
+        token->kind = length == 2 ? WT_TYPE10_COMP_INNER_LOOP_BEGIN : WT_TYPE10_COMP_INNER_LOOP_END;
+    } else if (hasMark) {
+        token->kind = WT_TYPE10_COMP_OUTER_LOOP_COUNT;
+    } else {
+        token->kind = hasPoint ? WT_TYPE10_COMP_WAVEFORM : WT_TYPE10_COMP_DELAY;
+    }
+    return true;
 }
 
 // Appends 32-bit words whose first byte is 0, until the space runs out.
@@ -195,12 +221,14 @@ class WordWriter {
 }  // namespace
 
 int wt_type10_comp_waveform_get(char* token, wt_type10_comp_wvfrm* out) {
-    const char* at = token;
     unsigned long numbers[3] = {0, 0, 0};  // index, amplitude, duration
     int count = 0;
-    while (count < 3 && readNumber(&at, &numbers[count])) {
-        ++count;
-        if (*at++ != '.') break;
+    for (const char* at = token; count < 3;) {
+        const Number number = readNumber(at);
+        if (number.end == nullptr) break;
+        numbers[count++] = number.value;
+        if (*number.end != '.') break;
+        at = number.end + 1;
     }
     const auto [index, amplitude, duration] = numbers;
 
@@ -266,9 +294,9 @@ int wt_type10_comp_str_to_bin(char* text, uint8_t* out) {
     comp.inner_loop_open = false;
     comp.sections[0] = {};  // the others are cleared when they are reached
 
-    size_t length = 0;
-    while (char* token = nextToken(&text, &length)) {
-        const int result = wt_type10_comp_decode(&comp, classify(token, length), token);
+    Token token;
+    while (nextToken(&text, &token)) {
+        const int result = wt_type10_comp_decode(&comp, token.kind, token.text);
         if (result != 0) return result;
     }
     if (comp.inner_loop_open) return refuse("Inner loop never terminated\n");

@@ -1,0 +1,20 @@
+// SPDX-License-Identifier: Apache-2.0
+// What a force-feedback motor saw of the service, read from the driver's journal.
+#pragma once
+
+#include <string>
+#include <vector>
+
+#include "phone_control.h"
+
+namespace qvx::test {
+
+// The motor's part of the journal, in short: "open O_RDWR", "upload LENGTH CUSTOM_HEX", "erase ID",
+// "event CODE VALUE", "close"; what failed ends with " = " and the error's name.
+std::vector<std::string> motorRequests(const Phone& phone);
+
+// The motor's part of the journal as it stands, but for what differs from run to run: running
+// number, time and process.
+std::vector<nlohmann::json> motorLines(const Phone& phone);
+
+}  // namespace qvx::test
