@@ -23,14 +23,15 @@ from failure import Failure
 SOURCES = os.path.join(guest_image.PROJECT, "handset", "kernel")
 MODULE = "qvx_vibrator.ko"
 
+_PREFIXES = {"amd64": "", "arm64": "aarch64-linux-gnu-"}  # of the compiler and its tools
+_COMPILER_PACKAGES = {"amd64": "g++", "arm64": "g++-aarch64-linux-gnu"}
+
 # What make is told beside the folders; the headers name the compiler they want themselves.
 _VARIABLES = {
     "amd64": [],
     "arm64": ["ARCH=arm64", "CROSS_COMPILE=aarch64-linux-gnu-", "DEB_BUILD_ARCH=amd64",
               "DEB_HOST_ARCH=arm64", "DEB_HOST_GNU_TYPE=aarch64-linux-gnu"],
 }
-_COMPILERS = {"amd64": ("gcc-12", "g++"), "arm64": ("aarch64-linux-gnu-gcc-12",
-                                                    "g++-aarch64-linux-gnu")}
 
 
 def module_path(arch):
@@ -70,9 +71,10 @@ def _source_files():
 
 def _stamp(release):
     digest = hashlib.sha256(release.encode())
-    for name in _source_files():
-        with open(os.path.join(SOURCES, name), "rb") as source:
-            digest.update(name.encode() + b"\0" + source.read())
+    paths = [os.path.join(SOURCES, name) for name in _source_files()]
+    for path in [*paths, os.path.realpath(__file__)]:
+        with open(path, "rb") as source:
+            digest.update(os.path.basename(path).encode() + b"\0" + source.read())
     return digest.hexdigest()
 
 
@@ -95,7 +97,7 @@ def _fetch_headers(arch, release, target, say):
 def _make(arch, headers, target):
     """Compiles a copy of the sources, so that nothing is left beside them."""
     debian_packages.find_tool("make", "make")
-    debian_packages.find_tool(*_COMPILERS[arch])
+    debian_packages.find_tool(_PREFIXES[arch] + "gcc-12", _COMPILER_PACKAGES[arch])
     source = os.path.join(target, "source")
     os.mkdir(source)
     for name in _source_files():
@@ -107,5 +109,7 @@ def _make(arch, headers, target):
     if done.returncode != 0:
         complaints = [line for line in done.stderr.splitlines() if "error" in line.lower()]
         raise Failure("\n  ".join(["the kernel module does not build:"] + complaints[:10]))
+    # What a debugger wants is most of the file, which the guest reads through an export.
+    debian_packages.run([_PREFIXES[arch] + "strip", "--strip-debug", MODULE], source)
     shutil.move(os.path.join(source, MODULE), target)
     shutil.rmtree(source)

@@ -91,6 +91,13 @@ std::string readersServices(const std::string& motor) {
                    outcome(ioctl(file.fd(), EVIOCREVOKE, 0)), file.upload()});
 }
 
+std::string repeatSettings(const std::string& motor) {
+    const MotorFile file(motor, O_RDWR);
+    unsigned settings[2] = {};
+    return joined({outcome(ioctl(file.fd(), EVIOCGREP, settings)),
+                   outcome(ioctl(file.fd(), EVIOCSREP, settings))});
+}
+
 std::string moreThanAPage(const std::string&) {
     const int node = open(kReadWrite.c_str(), O_RDWR);
     const std::string text(5000, '7');
@@ -179,7 +186,7 @@ const std::vector<Difference> kDifferences = {
          "48 48 ",
          {"event 96 7"},
          "48 EAGAIN ",
-         {"open motor O_RDWR = 0", "event 96 7", "event of type 0 0 0", "close motor"}},
+         {"open motor O_RDWR|O_NONBLOCK = 0", "event 96 7", "event of type 0 0 0", "close motor"}},
         // A device in user space cannot say that it has no places to seek.
         {"SeekingInTheMotor",
          seekInMotor,
@@ -194,6 +201,13 @@ const std::vector<Difference> kDifferences = {
          {},
          "EINVAL EINVAL EINVAL 0 ",
          {"open motor O_RDWR = 0", "upload -1 = 0" + kUpload, "erase 0 = 0", "close motor"}},
+        // A device in user space cannot answer ENOSYS.
+        {"RepeatSettings",
+         repeatSettings,
+         "ENOSYS ENOSYS ",
+         {},
+         "EINVAL EINVAL ",
+         {"open motor O_RDWR = 0", "close motor"}},
         // sysfs hands a driver one page at most and shows one byte less; nodes on phones that take
         // more are not plain sysfs files, so the simulated one takes any length.
         {"WritesOfMoreThanAPage",

@@ -270,8 +270,7 @@ std::string questionsItDoesNotAnswer(const std::string& motor) {
     unsigned char memory[256] = {};
     std::string answers;
     for (const unsigned long command :
-         {static_cast<unsigned long>(EVIOCGABS(0)), static_cast<unsigned long>(EVIOCGREP),
-          static_cast<unsigned long>(EVIOCSREP), static_cast<unsigned long>(EVIOCGKEYCODE),
+         {static_cast<unsigned long>(EVIOCGABS(0)), static_cast<unsigned long>(EVIOCGKEYCODE),
           static_cast<unsigned long>(EVIOCGMTSLOTS(8)), static_cast<unsigned long>(_IO('E', 0xee)),
           static_cast<unsigned long>(_IOR('E', 0xee, int)),
           static_cast<unsigned long>(_IOW('E', 0x80, int)),  // an upload of another size
@@ -322,9 +321,12 @@ const Agreement kCases[] = {
         {"QuestionsAreAnswered", kSystem, questions,
          "0 65537 0 3 0 6 0 0 0 21 qvx_vibrator_inputff 5 qvx_v### 11 qvx/input0 ENOENT 0 "},
         {"BitMapsSayWhatItCan", kSystem, bitMaps,
-         "8:0=1:2=32 96 8 8 8 8 EINVAL EINVAL EINVAL EINVAL EINVAL EINVAL EINVAL EINVAL EINVAL "
-         "EINVAL EINVAL 8 8 EINVAL EINVAL 16:10=3:12=1 "},
-        {"OtherQuestionsAreRefused", kSystem, questionsItDoesNotAnswer, ""},
+         "8:0=1:2=32 96 8 8 8 8 "
+         "EINVAL EINVAL EINVAL EINVAL EINVAL EINVAL EINVAL EINVAL EINVAL "
+         "EINVAL EINVAL 8 8 EINVAL EINVAL 16:10=3:11=32:12=1 EINVAL EINVAL EINVAL EINVAL EINVAL "
+         "EINVAL EINVAL EINVAL EINVAL EINVAL 11:10=3 8 96 8 8 8 "},
+        {"OtherQuestionsAreRefused", kSystem, questionsItDoesNotAnswer,
+         "EINVAL EINVAL EINVAL EINVAL EINVAL EFAULT EINVAL EINVAL "},
         {"ThereIsNothingToRead", kSystem, nothingToRead, "EAGAIN EINVAL 1 4 "},
 };
 

@@ -89,12 +89,12 @@ std::string sizesOfWrites(const std::string&) {
         answers += file.put(std::string(size, 'x')) + " ";
         answers += std::to_string(file.getAt(5, 0).size() - 2) + " ";
     }
-    return answers + file.put("") + " " + file.put("9\n") + " " + file.getAt(16, 0);
+    return answers + joined({file.put(""), file.put("9\n"), file.getAt(16, 0)});
 }
 
 std::string bytesOfWrites(const std::string&) {
     const NodeFile file(kControlClass, O_RDWR);
-    return joined({file.put(std::string("a\0b", 3)), file.getAt(9, 0), file.put("\xff\xfe"),
+    return joined({file.put(std::string("a\0b", 3)), file.getAt(9, 2), file.put("\xff\xfe"),
                    file.getAt(9, 0), file.put("\n"), file.getAt(9, 0)});
 }
 
@@ -126,24 +126,23 @@ std::string heldText(const std::string&) {
 std::string readsInPieces(const std::string&) {
     writeNode(kReadWrite, "123456\n", O_WRONLY);
     const NodeFile file(kReadWrite, O_RDONLY);
-    std::string answers = file.get(3);
+    const std::string first = file.get(3);
     writeNode(kReadWrite, "x\n", O_WRONLY);
-    answers += file.get(2) + file.get(9) + file.get(9) + file.get(1);
-    return answers + file.getAt(9, 0);
+    return joined({first, file.get(2), file.get(9), file.get(9), file.get(1), file.getAt(9, 0)});
 }
 
 std::string readsOutOfOrder(const std::string&) {
     writeNode(kReadWrite, "123456\n", O_WRONLY);
     const NodeFile file(kReadWrite, O_RDONLY);
-    std::string answers = file.getAt(2, 3) + file.getAt(9, 5) + file.getAt(9, 7) +
-                          file.getAt(9, 100) + file.get(2);
+    std::string answers = joined({file.getAt(2, 3), file.getAt(9, 5), file.getAt(9, 7),
+                                  file.getAt(9, 100), file.get(2)});
     writeNode(kReadWrite, "abcdef\n", O_WRONLY);
-    // The next piece is of the text as it was; elsewhere it is the text as it is.
-    answers += file.get(2) + file.getAt(2, 2) + file.getAt(2, 4);
+    // The piece that follows is of the text as it was; elsewhere it is the text as it is.
+    answers += joined({file.get(2), file.getAt(2, 2), file.getAt(2, 4)});
     writeNode(kReadWrite, "z\n", O_WRONLY);
-    answers += file.getAt(2, 6) + file.getAt(2, 1) + file.getAt(2, 0);
+    answers += joined({file.getAt(2, 6), file.getAt(2, 1), file.getAt(2, 0)});
     lseek(file.fd(), 0, SEEK_SET);
-    return answers + file.get(16) + file.get(16);
+    return answers + joined({file.get(16), file.get(16)});
 }
 
 std::string readsOfOneByte(const std::string&) {
@@ -190,14 +189,20 @@ std::string attributes(const std::string&) {
 
 std::string changedAttributes(const std::string&) {
     const auto change = [](int mode) { return outcome(chmod(kReadWrite.c_str(), mode)); };
-    std::string answers = change(0444) + " " + openNode(kReadWrite, O_RDWR) + " ";
-    answers += change(0220) + " " + openNode(kReadWrite, O_RDONLY) + " ";
-    answers += change(0) + " " + openNode(kReadWrite, O_WRONLY) + " ";
-    answers += change(0666) + " " + openNode(kReadWrite, O_RDWR) + " ";
-    // Permission without a method is none.
-    answers += outcome(chmod(kReadOnly.c_str(), 0666)) + " " + openNode(kReadOnly, O_RDWR) + " ";
-    answers += outcome(chown(kReadWrite.c_str(), 2000, 2000)) + " ";
-    return answers + attributesOf(kReadWrite);
+    return joined({change(0444), openNode(kReadWrite, O_RDWR), change(0220),
+                   openNode(kReadWrite, O_RDONLY), change(0), openNode(kReadWrite, O_WRONLY),
+                   change(0666), openNode(kReadWrite, O_RDWR),
+                   outcome(chown(kReadWrite.c_str(), 2000, 2000)), attributesOf(kReadWrite)});
+}
+
+/// The bits alone say who may open; without the method in the driver the access itself fails.
+std::string bitsWithoutMethods(const std::string&) {
+    std::string answers = joined(
+            {outcome(chmod(kReadOnly.c_str(), 0666)), outcome(chmod(kWriteOnly.c_str(), 0666))});
+    const NodeFile readOnly(kReadOnly, O_RDWR);
+    const NodeFile writeOnly(kWriteOnly, O_RDWR);
+    return answers + joined({readOnly.put("1"), readOnly.put(""), readOnly.getAt(9, 0),
+                             writeOnly.get(9), writeOnly.put("1"), writeOnly.get(9)});
 }
 
 std::string changedFolders(const std::string&) {
@@ -207,7 +212,8 @@ std::string changedFolders(const std::string&) {
                    outcome(rename(kReadWrite.c_str(), kMissing.c_str())),
                    outcome(symlink("duration", kMissing.c_str())),
                    outcome(link(kReadWrite.c_str(), kMissing.c_str())),
-                   outcome(mknod(kMissing.c_str(), S_IFREG | 0644, 0))});
+                   outcome(mknod(kMissing.c_str(), S_IFREG | 0644, 0)),
+                   outcome(mknod(kMissing.c_str(), S_IFIFO | 0644, 0))});
 }
 
 const Agreement kCases[] = {
@@ -222,19 +228,26 @@ const Agreement kCases[] = {
          "ok ok ok ok EEXIST EACCES EACCES ENOTDIR ok EISDIR ok 0\n "},
         {"FlagsOfAnOpenByTheSystemUser", kSystem, opensWithFlags,
          "ok ok ok EACCES EEXIST EACCES EACCES ENOTDIR ok EISDIR ok 0\n "},
-        {"AccessOfRoot", kRoot, accesses, ""},
-        {"AccessOfTheSystemUser", kSystem, accesses, ""},
-        {"AccessOfAStranger", kStranger, accesses, ""},
+        {"AccessOfRoot", kRoot, accesses,
+         "0 0 0 EACCES 0 0 0 0 EACCES 0 0 0 0 EACCES 0 ENOENT ENOENT ENOENT ENOENT ENOENT "},
+        {"AccessOfTheSystemUser", kSystem, accesses,
+         "0 0 0 EACCES 0 0 0 EACCES EACCES EACCES 0 EACCES 0 EACCES EACCES ENOENT ENOENT ENOENT "
+         "ENOENT ENOENT "},
+        {"AccessOfAStranger", kStranger, accesses,
+         "0 0 EACCES EACCES EACCES 0 0 EACCES EACCES EACCES 0 EACCES EACCES EACCES EACCES ENOENT "
+         "ENOENT ENOENT ENOENT ENOENT "},
         {"WritesOfUpToAPageArriveWhole", kSystem, sizesOfWrites,
-         "1 1 2 2 7 5 255 5 4094 5 4095 5 4096 5 0 2 [9\n]"},
-        {"BytesArriveAsTheyAre", kSystem, bytesOfWrites, nullptr},
+         "1 1 2 2 7 5 255 5 4094 5 4095 5 4096 5 0 2 [9\n] "},
+        {"BytesArriveAsTheyAre", kSystem, bytesOfWrites, "3 [b] 2 [\xff\xfe] 1 [\n] "},
         {"EveryWriteIsAFreshStore", kSystem, freshStores, "6 2 7\n 1 9 7 1234567 1 5 "},
         {"FailedCallsChangeNothing", kSystem, writesToNowhere, "EFAULT EFAULT EBADF EBADF 1 0\n "},
         {"AHeldTextStays", kSystem, heldText, "7 [LINEAR_1040\n] LINEAR_1040\n "},
-        {"AReadInPiecesGoesThroughOneShowing", kSystem, readsInPieces, "[123][45][6\n][][][x\n]"},
-        {"AReadElsewhereShowsAnew", kSystem, readsOutOfOrder, ""},
+        {"AReadInPiecesGoesThroughOneShowing", kSystem, readsInPieces,
+         "[123] [45] [6\n] [] [] [x\n] "},
+        {"AReadElsewhereShowsAnew", kSystem, readsOutOfOrder,
+         "[45] [6\n] [] [] [12] [34] [cd] [ef] [\n] [\n] [z\n] [z\n] [] "},
         {"AReadByteByByte", kSystem, readsOfOneByte, "[L][I][N][E][A][R][_][1][0][4][0][\n][][]"},
-        {"AWriteMovesTheReadingPlaceToo", kSystem, readAfterOwnWrite, ""},
+        {"AWriteMovesTheReadingPlaceToo", kSystem, readAfterOwnWrite, "[0] 5 [] [] [5678\n] "},
         {"SeekingGoesByASizeOfOnePage", kSystem, seeks, "4096 5 7 EINVAL 3 10 "},
         {"SizesCannotBeChanged", kRoot, sizesAndSyncs, "0 0 EINVAL 0 0 0 0\n "},
         {"SizesCannotBeChangedByTheSystemUser", kSystem, sizesAndSyncs,
@@ -242,11 +255,19 @@ const Agreement kCases[] = {
         {"AttributesAreThoseOfSysfs", kStranger, attributes,
          "0 100664 1000 1000 4096 0 100444 1000 1000 4096 0 100220 1000 1000 4096 "
          "ENOENT 0 0 0 0 "},
-        {"RootChangesAttributes", kRoot, changedAttributes, ""},
-        {"TheOwnerChangesAttributes", kSystem, changedAttributes, ""},
-        {"AStrangerChangesNothing", kStranger, changedAttributes, ""},
-        {"RootCreatesAndRemovesNothing", kRoot, changedFolders, ""},
-        {"AStrangerCreatesAndRemovesNothing", kStranger, changedFolders, ""},
+        {"RootChangesAttributes", kRoot, changedAttributes,
+         "0 EACCES 0 EACCES 0 EACCES 0 ok 0 0 100666 2000 2000 4096  "},
+        {"TheOwnerChangesAttributes", kSystem, changedAttributes,
+         "0 EACCES 0 EACCES 0 EACCES 0 ok EPERM 0 100666 1000 1000 4096  "},
+        {"AStrangerChangesNothing", kStranger, changedAttributes,
+         "EPERM EACCES EPERM ok EPERM EACCES EPERM EACCES EPERM 0 100664 1000 1000 4096  "},
+        {"PermissionBitsMakeNoMethods", kRoot, bitsWithoutMethods, "0 0 EIO 0 [137\n] EIO 1 EIO "},
+        {"RootCreatesAndRemovesNothing", kRoot, changedFolders,
+         "EPERM ENOENT EPERM ENOENT EPERM EPERM EPERM EACCES EPERM "},
+        {"TheSystemUserCreatesAndRemovesNothing", kSystem, changedFolders,
+         "EACCES ENOENT EACCES ENOENT EACCES EACCES EACCES EACCES EACCES "},
+        {"AStrangerCreatesAndRemovesNothing", kStranger, changedFolders,
+         "EACCES ENOENT EACCES ENOENT EACCES EACCES EPERM EACCES EACCES "},
 };
 
 class SysfsAgreement : public testing::TestWithParam<Agreement> {};

@@ -151,6 +151,18 @@ TEST_F(Motor, BadPointersAreFaults) {
     EXPECT_EQ(linesOf(driver_, "upload").size(), 1U);
 }
 
+TEST_F(Motor, ARefusedUploadsSamplesAreNotLookedAt) {
+    EXPECT_EQ(driver_.inside([] {
+        int16_t* nowhere = nullptr;
+        ff_effect effect = MotorFile::record(2, 500, nowhere + 8, 2);
+        return OpenMotor().upload(effect);
+    }),
+              "EINVAL");
+    const Lines uploads = linesOf(driver_, "upload");
+    ASSERT_EQ(uploads.size(), 1U);
+    EXPECT_NE(uploads[0].find(R"("custom_len":2,"custom_hex":"")"), std::string::npos);
+}
+
 TEST_F(Motor, WhatTheMotorDoesNotHaveIsRefused) {
     EXPECT_EQ(driver_.inside([] {
         const OpenMotor motor;
@@ -292,10 +304,11 @@ TEST_F(Motor, ThereIsNothingToRead) {
         input_event event{};
         pollfd polled{motor.fd(), POLLIN | POLLOUT, 0};
         const int ready = poll(&polled, 1, 0);
-        return outcome(read(motor.fd(), &event, sizeof event)) + " " + std::to_string(ready) + " " +
+        return outcome(read(motor.fd(), &event, sizeof event)) + " " +
+               outcome(read(motor.fd(), &event, 5)) + " " + std::to_string(ready) + " " +
                std::to_string(polled.revents);
     }),
-              "EAGAIN 1 4");
+              "EAGAIN EINVAL 1 4");
 }
 
 TEST_F(Motor, TheDeviceGoesAwayWithTheDriver) {
