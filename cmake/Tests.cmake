@@ -7,11 +7,27 @@
 #   qvx_add_guest_test(NAME SOURCES ... LIBRARIES ... [PROFILE profile] [TIMEOUT seconds])
 #       A GoogleTest program that runs as root inside the virtual handset, one boot for the whole
 #       program, which ends with a check that the kernel log holds no complaint about binder. The
-#       default profile is "off": the tests bring phones up themselves. Label "guest".
+#       default profile is "off": the tests bring phones up themselves. The guest is of the build's
+#       own architecture. Label "guest". A build without the handset, or one that QVX_GUEST_TESTS
+#       keeps from running the program, leaves it out of "all".
 
 find_package(GTest REQUIRED)
 find_package(nlohmann_json REQUIRED)
 include(GoogleTest)
+
+set(QVX_GUEST_TESTS "all" CACHE STRING
+    "Guest test programs of this build: \"all\", or their names. Emulated Arm is slow, so its build
+    runs the whole road of a request, and leaves the rest to the others")
+
+# What the handset calls the processor this build is for, and how many times as long it is given:
+# emulating Arm takes about three times as long as emulating the machine's own kind.
+if(CMAKE_SYSTEM_PROCESSOR STREQUAL "aarch64")
+    set(guest_architecture arm64)
+    set(guest_patience 3)
+else()
+    set(guest_architecture amd64)
+    set(guest_patience 1)
+endif()
 
 # The headers that cost most of a test's compile time, compiled once a build.
 if(NOT TARGET test_headers)
@@ -41,17 +57,21 @@ function(qvx_add_guest_test name)
     if(NOT arg_TIMEOUT)
         set(arg_TIMEOUT 300)
     endif()
-    math(EXPR ctest_timeout "${arg_TIMEOUT} + 60")
+    math(EXPR timeout "${arg_TIMEOUT} * ${guest_patience}")
+    math(EXPR ctest_timeout "${timeout} + 60")
     add_executable(${name} ${arg_SOURCES})
     target_link_libraries(${name} PRIVATE ${arg_LIBRARIES} guest_main)
     target_precompile_headers(${name} REUSE_FROM test_headers)
     # Only a build that holds the handset can boot one.
-    if(NOT TARGET handset-agent)
+    if(NOT TARGET handset-agent
+       OR NOT (QVX_GUEST_TESTS STREQUAL "all" OR name IN_LIST QVX_GUEST_TESTS))
+        set_target_properties(${name} PROPERTIES EXCLUDE_FROM_ALL ON)
         return()
     endif()
     add_test(NAME ${QVX_TEST_PREFIX}${name}
-             COMMAND ${CMAKE_SOURCE_DIR}/handset/run --build ${CMAKE_BINARY_DIR} --arch amd64
-                     --profile ${arg_PROFILE} --timeout ${arg_TIMEOUT} -- $<TARGET_FILE:${name}>)
+             COMMAND ${CMAKE_SOURCE_DIR}/handset/run --build ${CMAKE_BINARY_DIR}
+                     --arch ${guest_architecture} --profile ${arg_PROFILE} --timeout ${timeout}
+                     -- $<TARGET_FILE:${name}>)
     # One guest at a time: two would share the machine's cores and stretch every sleep.
     set_tests_properties(${QVX_TEST_PREFIX}${name} PROPERTIES LABELS guest
                          RESOURCE_LOCK handset TIMEOUT ${ctest_timeout})

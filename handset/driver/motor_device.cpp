@@ -125,9 +125,11 @@ void onRelease(fuse_req_t request, fuse_file_info* info) {
 }
 
 /// The motor sends no events: a reader waits until it is interrupted or the device is gone.
-void onRead(fuse_req_t request, size_t, off_t, fuse_file_info* info) {
+void onRead(fuse_req_t request, size_t size, off_t, fuse_file_info* info) {
     State& state = stateOf(request);
-    if (isUnplugged(state)) {
+    if (size < sizeof(input_event)) {
+        fuse_reply_err(request, EINVAL);
+    } else if (isUnplugged(state)) {
         fuse_reply_err(request, ENODEV);
     } else if ((info->flags & O_NONBLOCK) != 0) {
         fuse_reply_err(request, EAGAIN);
@@ -204,15 +206,32 @@ void fetchUpload(fuse_req_t request, char* record, const ff_effect* known) {
     fuse_reply_ioctl_retry(request, in, count, &out, 1);
 }
 
-/// Judges and takes an upload whose data has arrived.
-int uploadResult(fuse_req_t request, State& state, uint64_t file, const ff_effect& effect) {
-    {
-        const std::lock_guard lock(state.slotsMutex);
-        if (const int refused = state.slots.check(file, effect); refused < 0) return refused;
-    }
-    return -meetFault(request, state, state.faults.next(kMotorNode, FaultOp::kUpload));
+/// Whether the slots would take an upload: 0, or why not (negative).
+int checkUpload(State& state, uint64_t file, const ff_effect& effect) {
+    const std::lock_guard lock(state.slotsMutex);
+    return std::min(state.slots.check(file, effect), 0);
 }
 
+/// Takes an upload unless it has failed already (`result` negative), notes it and answers.
+void finishUpload(fuse_req_t request, uint64_t file, const ff_effect& effect,
+                  std::string_view custom, int result) {
+    State& state = stateOf(request);
+    {
+        const std::lock_guard lock(state.slotsMutex);
+        if (result == 0) result = state.slots.upload(file, effect);
+        state.journal.record(state.files.get(file).callerOf(request),
+                             uploadLine(asDriverSees(effect), custom, result));
+    }
+    if (result < 0) {
+        fuse_reply_err(request, -result);
+        return;
+    }
+    const auto id = static_cast<decltype(ff_effect::id)>(result);
+    fuse_reply_ioctl(request, 0, &id, sizeof id);
+}
+
+/// Comes up to three times for one upload: with nothing, with the record, and with its data, which
+/// are asked for only when the input core would have the driver fetch them.
 void onUpload(fuse_req_t request, char* record, const fuse_file_info* info, const void* buffer,
               size_t size) {
     State& state = stateOf(request);
@@ -222,26 +241,18 @@ void onUpload(fuse_req_t request, char* record, const fuse_file_info* info, cons
     }
     ff_effect effect;
     memcpy(&effect, buffer, sizeof effect);
-    const bool isTooLong = customBytes(effect) > kMostCustomValues * sizeof(int16_t);
-    if (!isTooLong && size != sizeof effect + customBytes(effect)) {
+    int result = checkUpload(state, info->fh, effect);
+    if (result == 0 && customBytes(effect) > kMostCustomValues * sizeof(int16_t)) result = -EINVAL;
+    if (result == 0 && size != sizeof effect + customBytes(effect)) {
         fetchUpload(request, record, &effect);
         return;
     }
+    if (result == 0) {
+        result = -meetFault(request, state, state.faults.next(kMotorNode, FaultOp::kUpload));
+    }
     const std::string_view custom(static_cast<const char*>(buffer) + sizeof effect,
                                   size - sizeof effect);
-    int result = isTooLong ? -EINVAL : uploadResult(request, state, info->fh, effect);
-    {
-        const std::lock_guard lock(state.slotsMutex);
-        if (result == 0) result = state.slots.upload(info->fh, effect);
-        state.journal.record(state.files.get(info->fh).callerOf(request),
-                             uploadLine(asDriverSees(effect), custom, result));
-    }
-    if (result < 0) {
-        fuse_reply_err(request, -result);
-        return;
-    }
-    const auto id = static_cast<decltype(ff_effect::id)>(result);
-    fuse_reply_ioctl(request, 0, &id, sizeof id);
+    finishUpload(request, info->fh, effect, custom, result);
 }
 
 void onErase(fuse_req_t request, int id, const fuse_file_info* info) {
@@ -282,6 +293,13 @@ void onQuery(fuse_req_t request, unsigned command, void* memory, size_t room) {
     }
 }
 
+/// The kernel takes the size in a request's number for part of its argument, and a record of
+/// another size for one it cannot reach.
+bool isUploadOfAnotherSize(unsigned command) {
+    return command != EVIOCSFF && _IOC_DIR(command) == _IOC_DIR(EVIOCSFF) &&
+           _IOC_TYPE(command) == _IOC_TYPE(EVIOCSFF) && _IOC_NR(command) == _IOC_NR(EVIOCSFF);
+}
+
 void onIoctl(fuse_req_t request, int number, void* argument, fuse_file_info* info, unsigned flags,
              const void* input, size_t inputSize, size_t outputSize) {
     const auto command = static_cast<unsigned>(number);
@@ -291,6 +309,8 @@ void onIoctl(fuse_req_t request, int number, void* argument, fuse_file_info* inf
         fuse_reply_err(request, EINVAL);  // 32-bit clients have another layout
     } else if (command == EVIOCSFF) {
         onUpload(request, static_cast<char*>(argument), info, input, inputSize);
+    } else if (isUploadOfAnotherSize(command)) {
+        fuse_reply_err(request, EFAULT);
     } else if (command == EVIOCRMFF) {
         // The id is the argument itself, not what it points at.
         onErase(request, static_cast<int>(reinterpret_cast<intptr_t>(argument)), info);

@@ -31,6 +31,19 @@ constexpr std::array kEventTypes = {
         EventType{EV_LED, LED_MAX}, EventType{EV_SND, SND_MAX}, EventType{EV_FF, FF_MAX},
 };
 
+struct State {
+    unsigned number;
+    unsigned largestCode;
+};
+
+// What is pressed, lit, heard or switched now: nothing, for every code there could be.
+constexpr std::array kStates = {
+        State{_IOC_NR(EVIOCGKEY(0)), KEY_MAX},
+        State{_IOC_NR(EVIOCGLED(0)), LED_MAX},
+        State{_IOC_NR(EVIOCGSND(0)), SND_MAX},
+        State{_IOC_NR(EVIOCGSW(0)), SW_MAX},
+};
+
 /// A bit map of whole longs for codes up to `largest`.
 std::string bitMap(unsigned largest, std::initializer_list<unsigned> bits) {
     std::string map((largest + kLongBits - 1) / kLongBits * sizeof(uint64_t), '\0');
@@ -48,6 +61,13 @@ std::optional<std::string> eventBits(unsigned type) {
     if (type == EV_FF) {
         return bitMap(known->largestCode, {FF_RUMBLE, FF_PERIODIC, FF_CUSTOM, FF_GAIN});
     }
+    return bitMap(known->largestCode, {});
+}
+
+std::optional<std::string> presentState(unsigned number) {
+    const auto* known = std::find_if(kStates.begin(), kStates.end(),
+                                     [number](const State& one) { return one.number == number; });
+    if (known == kStates.end()) return std::nullopt;
     return bitMap(known->largestCode, {});
 }
 
@@ -87,6 +107,9 @@ std::optional<QueryAnswer> answerQuery(const MotorSpec& motor, unsigned command)
         case _IOC_NR(EVIOCGPROP(0)):
             return cutTo(room, bitMap(INPUT_PROP_MAX, {}));
         default: {
+            if (std::optional<std::string> state = presentState(number)) {
+                return cutTo(room, std::move(*state));
+            }
             constexpr unsigned kFirst = _IOC_NR(EVIOCGBIT(0, 0));
             if (number < kFirst || number > kFirst + EV_MAX) return std::nullopt;
             std::optional<std::string> bits = eventBits(number - kFirst);

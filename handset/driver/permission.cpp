@@ -19,6 +19,10 @@ unsigned wantedBy(int openFlags) {
     }
 }
 
+unsigned neededBy(int openFlags) {
+    return wantedBy(openFlags) | ((openFlags & O_TRUNC) != 0 ? kMayWrite : 0U);
+}
+
 bool grants(const Attributes& attributes, const Credentials& credentials, unsigned wanted) {
     if (credentials.uid == 0) return true;
     unsigned granted = attributes.mode;

@@ -30,6 +30,10 @@ inline constexpr unsigned kMayWrite = 2;
 /// What an open with these flags asks for.
 unsigned wantedBy(int openFlags);
 
+/// What the permission bits have to grant for it: the same, and writing where the file is to be
+/// truncated, even if it is opened for reading only.
+unsigned neededBy(int openFlags);
+
 /// True when owner, group and mode grant `wanted`. Root is granted everything.
 bool grants(const Attributes& attributes, const Credentials& credentials, unsigned wanted);
 

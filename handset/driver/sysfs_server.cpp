@@ -22,6 +22,7 @@
 #include "driver/handle_table.h"
 #include "driver/open_flags.h"
 #include "driver/request_delay.h"
+#include "driver/showing.h"
 
 namespace handset {
 namespace {
@@ -40,7 +41,7 @@ struct OpenNode {
     Node& node;
     const Opener opener;
     std::mutex mutex;
-    std::string showing;  ///< the text as the last read at offset 0 found it
+    Showing showing;
 };
 
 }  // namespace
@@ -81,12 +82,12 @@ bool callerIsGranted(fuse_req_t request, const Node& node, unsigned wanted) {
     return grants(attributes, credentialsOf(request), wanted);
 }
 
-/// As sysfs has it, even root needs the method and at least one permission bit for it.
+/// As sysfs has it, even root needs at least one permission bit for what it wants. The bits are all
+/// that counts: without the method a read or write fails later.
 bool isOpenable(const Node& node, unsigned wanted) {
     const mode_t mode = node.attributes().mode;
-    const bool readable = node.isReadable() && (mode & 0444) != 0;
-    const bool writable = node.isWritable() && (mode & 0222) != 0;
-    return ((wanted & kMayRead) == 0 || readable) && ((wanted & kMayWrite) == 0 || writable);
+    return ((wanted & kMayRead) == 0 || (mode & 0444) != 0) &&
+           ((wanted & kMayWrite) == 0 || (mode & 0222) != 0);
 }
 
 struct stat statOf(const State& state, const TreeEntry& entry) {
@@ -219,9 +220,9 @@ void onOpen(fuse_req_t request, fuse_ino_t inode, fuse_file_info* info) {
     }
     Node& node = *entry->node;
     const Opener opener(request);
-    const unsigned wanted = wantedBy(info->flags);
     int error = 0;
-    if (!isOpenable(node, wanted) || !callerIsGranted(request, node, wanted)) {
+    if (!isOpenable(node, wantedBy(info->flags)) ||
+        !callerIsGranted(request, node, neededBy(info->flags))) {
         error = EACCES;
     } else {
         const FaultAction fault = state.faults.next(node.path(), FaultOp::kOpen);
@@ -242,14 +243,15 @@ void onRead(fuse_req_t request, fuse_ino_t, size_t size, off_t offset, fuse_file
     State& state = stateOf(request);
     OpenNode& file = state.files.get(info->fh);
     const FaultAction fault = state.faults.next(file.node.path(), FaultOp::kRead);
-    const int error = delayRequest(request, fault.delay, state.stopping) ? fault.error : EINTR;
+    int error = delayRequest(request, fault.delay, state.stopping) ? fault.error : EINTR;
+    if (!file.node.isReadable()) error = EIO;
 
     std::string part;
     if (error == 0) {
         const std::lock_guard lock(file.mutex);
-        if (offset == 0) file.showing = file.node.text();
-        const size_t start = std::min(static_cast<size_t>(offset), file.showing.size());
-        part = file.showing.substr(start, std::min(size, fault.shortCount.value_or(size)));
+        part = file.showing.read(static_cast<size_t>(offset),
+                                 std::min(size, fault.shortCount.value_or(size)),
+                                 [&] { return file.node.text(); });
     }
     state.journal.record(
             file.opener.callerOf(request),
@@ -269,7 +271,8 @@ void onWrite(fuse_req_t request, fuse_ino_t, const char* data, size_t size, off_
     State& state = stateOf(request);
     OpenNode& file = state.files.get(info->fh);
     const FaultAction fault = state.faults.next(file.node.path(), FaultOp::kWrite);
-    const int error = delayRequest(request, fault.delay, state.stopping) ? fault.error : EINTR;
+    int error = delayRequest(request, fault.delay, state.stopping) ? fault.error : EINTR;
+    if (!file.node.isWritable()) error = EIO;
     const std::string_view bytes(data, size);
     const std::string_view taken = bytes.substr(0, fault.shortCount.value_or(size));
 
@@ -305,6 +308,23 @@ void onCreate(fuse_req_t request, fuse_ino_t parent, const char* name, mode_t,
     fuse_reply_err(request, EACCES);
 }
 
+/// A plain file is created rather than made, and there is no way to create one.
+void onMknod(fuse_req_t request, fuse_ino_t, const char*, mode_t mode, dev_t) {
+    const bool mayTry = S_ISREG(mode) || fuse_req_ctx(request)->uid != 0;
+    fuse_reply_err(request, mayTry ? EACCES : EPERM);
+}
+
+/// The kernel lets nobody link to what they neither own nor may read and write
+/// (fs.protected_hardlinks), and asks that before it looks at the folder.
+void onLink(fuse_req_t request, fuse_ino_t inode, fuse_ino_t, const char*) {
+    const TreeEntry* entry = stateOf(request).tree.find(inode);
+    const uid_t uid = fuse_req_ctx(request)->uid;
+    const bool mayLink = entry != nullptr && entry->node &&
+                         (uid == entry->node->attributes().uid ||
+                          callerIsGranted(request, *entry->node, kMayRead | kMayWrite));
+    fuse_reply_err(request, uid != 0 && mayLink ? EACCES : EPERM);
+}
+
 /// Folders and nodes come and go with the device, not by a user's hand.
 void refuseChange(fuse_req_t request) {
     fuse_reply_err(request, fuse_req_ctx(request)->uid == 0 ? EPERM : EACCES);
@@ -323,12 +343,12 @@ fuse_lowlevel_ops operations() {
     ops.write = onWrite;
     ops.release = onRelease;
     ops.create = onCreate;
-    ops.mknod = [](auto request, auto...) { refuseChange(request); };
+    ops.mknod = onMknod;
+    ops.link = onLink;
     ops.mkdir = [](auto request, auto...) { refuseChange(request); };
     ops.unlink = [](auto request, auto...) { refuseChange(request); };
     ops.rmdir = [](auto request, auto...) { refuseChange(request); };
     ops.rename = [](auto request, auto...) { refuseChange(request); };
-    ops.link = [](auto request, auto...) { refuseChange(request); };
     ops.symlink = [](auto request, auto...) { refuseChange(request); };
     return ops;
 }

@@ -3,8 +3,9 @@
 // sysfs does.
 //
 // - A write is one store: the offset is ignored and the text replaced whole.
-// - A read at offset 0 shows the text as it is then; reads further on go through the same showing.
-// - A node without a read or write method refuses root too; nothing can be created or removed.
+// - Reads that follow each other go through one showing of the text (showing.h).
+// - Where no permission bit allows it root too is refused; a node whose bits were changed to allow
+//   what it has no method for answers EIO. Nothing can be created or removed.
 #pragma once
 
 #include <atomic>

@@ -13,7 +13,6 @@ download. Runs at the same time wait for each other.
 """
 
 import contextlib
-import fcntl
 import hashlib
 import lzma
 import os
@@ -23,6 +22,8 @@ import subprocess
 import sys
 import tempfile
 
+import debian_packages
+import made_folder
 from failure import Failure
 
 PROJECT = os.path.dirname(os.path.dirname(os.path.dirname(os.path.realpath(__file__))))
@@ -50,21 +51,31 @@ def prepare(arch, say):
     """Makes image_folder(arch) unless it is up to date. `say` is called with lines of progress."""
     wanted = _stamp()
     folder = image_folder(arch)
-    if _read_stamp(folder) == wanted:
+    if made_folder.read_stamp(folder) == wanted:
         return
-    os.makedirs(os.path.dirname(folder), exist_ok=True)
-    with _lock(folder + ".lock", arch, say):
-        if _read_stamp(folder) == wanted:
+    with made_folder.lock(folder + ".lock", f"the {arch} guest", say):
+        if made_folder.read_stamp(folder) == wanted:
             return
-        parts = folder + ".parts"
-        if _read_stamp(parts) != _parts_stamp():
-            with _replacing(parts) as scratch:
+        parts = _parts_folder(arch)
+        if made_folder.read_stamp(parts) != _parts_stamp():
+            with made_folder.replacing(parts) as scratch:
                 _fetch_parts(arch, scratch, say)
-                _write(os.path.join(scratch, "stamp"), _parts_stamp())
-        with _replacing(folder) as scratch:
+                made_folder.write_stamp(scratch, _parts_stamp())
+        with made_folder.replacing(folder) as scratch:
             _assemble(arch, parts, scratch)
-            _write(os.path.join(scratch, "stamp"), wanted)
+            made_folder.write_stamp(scratch, wanted)
         say(f"the {arch} guest is ready")
+
+
+def kernel_release(arch):
+    """The release of a prepared guest's kernel, "6.1.0-13-amd64": its modules say it."""
+    modules = os.path.join(_parts_folder(arch), "modules")
+    module = os.path.join(modules, sorted(os.listdir(modules))[0])
+    return debian_packages.run(["modinfo", "-F", "vermagic", module]).split()[0]
+
+
+def _parts_folder(arch):
+    return image_folder(arch) + ".parts"
 
 
 # --- up to date or not ---------------------------------------------------------------------------
@@ -81,64 +92,17 @@ def _stamp():
     return digest.hexdigest()
 
 
-def _read_stamp(folder):
-    try:
-        with open(os.path.join(folder, "stamp"), encoding="ascii") as stamp:
-            return stamp.read()
-    except FileNotFoundError:
-        return None
-
-
-def _write(path, text):
-    with open(path, "w", encoding="ascii") as file:
-        file.write(text)
-
-
-@contextlib.contextmanager
-def _lock(path, arch, say):
-    """Holds the lock for one architecture's folders; the kernel drops it when the holder dies."""
-    with open(path, "w", encoding="ascii") as lock:
-        try:
-            fcntl.flock(lock, fcntl.LOCK_EX | fcntl.LOCK_NB)
-        except BlockingIOError:
-            say(f"another run is preparing the {arch} guest, waiting for it")
-            fcntl.flock(lock, fcntl.LOCK_EX)
-        yield
-
-
-@contextlib.contextmanager
-def _replacing(folder):
-    """A scratch folder that takes the place of `folder` when all went well, else disappears."""
-    for stale in (folder + ".new", folder + ".old"):
-        shutil.rmtree(stale, ignore_errors=True)
-    scratch = folder + ".new"
-    os.mkdir(scratch)
-    try:
-        yield scratch
-    except BaseException:
-        shutil.rmtree(scratch, ignore_errors=True)
-        raise
-    with contextlib.suppress(FileNotFoundError):
-        os.rename(folder, folder + ".old")
-    os.rename(scratch, folder)
-    shutil.rmtree(folder + ".old", ignore_errors=True)
-
-
 # --- fetching ------------------------------------------------------------------------------------
 
 def _fetch_parts(arch, target, say):
     """Fills `target` with kernel, modules/ (named in load order) and busybox."""
     for tool, package in (("apt-get", "apt"), ("dpkg-deb", "dpkg"), ("depmod", "kmod"),
                           ("cpio", "cpio")):
-        _find_tool(tool, package)
+        debian_packages.find_tool(tool, package)
     with tempfile.TemporaryDirectory(prefix="unpack.", dir=target) as unpacked:
         image = _kernel_package(arch, say)
         for package in (image, f"busybox-static:{arch}"):
-            _download(package, unpacked, say)
-        say("unpacking")
-        for deb in [name for name in os.listdir(unpacked) if name.endswith(".deb")]:
-            _run(["dpkg-deb", "-x", deb, "."], unpacked)
-            os.unlink(os.path.join(unpacked, deb))
+            debian_packages.unpack(package, unpacked, say)
         release = os.listdir(os.path.join(unpacked, "lib", "modules"))[0]
         _take_kernel(os.path.join(unpacked, "boot", f"vmlinuz-{release}"),
                      os.path.join(target, "kernel"), arch)
@@ -146,56 +110,13 @@ def _fetch_parts(arch, target, say):
         shutil.move(os.path.join(unpacked, "bin", "busybox"), os.path.join(target, "busybox"))
 
 
-def _find_tool(tool, package):
-    """The path of a program, which on Debian may lie outside a plain user's PATH."""
-    path = shutil.which(tool, path=os.environ.get("PATH", "") + ":/usr/sbin:/sbin")
-    if path is None:
-        raise Failure(f"{tool} is not installed: scripts/install-packages installs {package}")
-    return path
-
-
-def _run(command, folder=None):
-    """Runs a program and returns its output; a failure is reported with its last line."""
-    command = [_find_tool(command[0], command[0])] + command[1:]
-    done = subprocess.run(command, cwd=folder, stdin=subprocess.DEVNULL, capture_output=True,
-                          text=True, errors="replace", check=False)
-    if done.returncode != 0:
-        last = (done.stderr.strip().splitlines() or [f"exit status {done.returncode}"])[-1]
-        raise Failure(f"{' '.join(command)}: {last}")
-    return done.stdout
-
-
 def _kernel_package(arch, say):
     """The numbered kernel package behind the metapackage: older numbers vanish from the archive."""
     meta = f"linux-image-{arch}:{arch}"
-    text = _with_fresh_lists(lambda: _run(["apt-cache", "show", "--no-all-versions", meta]), say)
-    for line in text.splitlines():
+    for line in debian_packages.describe(meta, say).splitlines():
         if line.startswith("Depends: linux-image-"):
             return line.split()[1] + ":" + arch
     raise Failure(f"the package {meta} names no kernel")
-
-
-def _download(package, folder, say):
-    size = ""
-    for line in _run(["apt-cache", "show", "--no-all-versions", package]).splitlines():
-        if line.startswith("Size: "):
-            size = f" ({int(line.split()[1]) / 1e6:.0f} MB)"
-    say(f"downloading {package}{size}")
-    # apt's own download user cannot write here; as root it needs telling.
-    options = ["-o", "APT::Sandbox::User=root"] if os.geteuid() == 0 else []
-    _with_fresh_lists(lambda: _run(["apt-get", *options, "download", package], folder), say)
-
-
-def _with_fresh_lists(action, say):
-    """Runs `action` again after apt-get update when it fails, where that may be run."""
-    try:
-        return action()
-    except Failure as failure:
-        if os.geteuid() != 0:
-            raise Failure(f"{failure}; 'apt-get update' may help") from None
-        say("updating the package lists")
-        _run(["apt-get", "update"])
-        return action()
 
 
 def _take_kernel(vmlinuz, target, arch):
@@ -216,11 +137,11 @@ def _take_kernel(vmlinuz, target, arch):
 
 def _take_modules(root, release, target):
     """Copies MODULES and what they depend on, numbered in the order in which they load."""
-    _run(["depmod", "-b", root, release])
+    debian_packages.run(["depmod", "-b", root, release])
     os.mkdir(target)
     taken = []
     for module in MODULES:
-        listing = _run(["modprobe", "-d", root, "-S", release, "--show-depends", module])
+        listing = debian_packages.run(["modprobe", "-d", root, "-S", release, "--show-depends", module])
         for line in listing.splitlines():
             action, path = line.split()[:2]
             if action == "insmod" and path not in taken:
@@ -251,12 +172,12 @@ def _assemble(arch, parts, target):
 def _make_layer(busybox, layer, arch):
     """The folder that lies over the host's root. Its links are made here: making them at boot
     would take seconds. /bin and /sbin are links into /usr on a Debian system."""
-    emulator = [_find_tool(word, "qemu-user-static") for word in EMULATORS[arch]]
+    emulator = [debian_packages.find_tool(word, "qemu-user-static") for word in EMULATORS[arch]]
     os.makedirs(os.path.join(layer, "usr", "bin"))
     os.makedirs(os.path.join(layer, "usr", "sbin"))
     program = os.path.join(layer, "usr", "bin", "busybox")
     shutil.copy(busybox, program)
-    for applet in _run([*emulator, program, "--list-full"]).split():
+    for applet in debian_packages.run([*emulator, program, "--list-full"]).split():
         folder = "sbin" if os.path.dirname(applet).endswith("sbin") else "bin"
         link = os.path.join(layer, "usr", folder, os.path.basename(applet))
         with contextlib.suppress(FileExistsError):

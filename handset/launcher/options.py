@@ -124,11 +124,20 @@ def _check_build(options):
     except OSError:
         raise Failure(f"no handset-agent in {options.build}/bin; "
                       f"{options.how_to_build}") from None
-    if int.from_bytes(header[_ELF_MACHINE_OFFSET:], "little") != _ELF_MACHINES[options.arch]:
-        raise Failure(f"{options.build} is not built for {options.arch}")
+    machine = int.from_bytes(header[_ELF_MACHINE_OFFSET:], "little")
+    if machine != _ELF_MACHINES[options.arch]:
+        _refuse_build(options, machine)
     phone = os.path.join(options.build, "bin", "phone")
     if options.profile is not None and not os.path.exists(phone):
         raise Failure(f"no phone in {options.build}/bin; {options.how_to_build}")
+
+
+def _refuse_build(options, machine):
+    for arch, number in _ELF_MACHINES.items():
+        if number == machine:
+            raise Failure(f"{options.build} is built for {arch}, not for {options.arch}: give "
+                          f"--arch {arch}, or with --build the folder of an {options.arch} build")
+    raise Failure(f"{options.agent} is no program for {options.arch}; {options.how_to_build}")
 
 
 def _check_profile(options):

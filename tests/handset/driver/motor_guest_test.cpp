@@ -18,6 +18,7 @@
 #include <string>
 #include <string_view>
 
+#include "motor_file.h"
 #include "running_driver.h"
 
 namespace handset {
@@ -35,53 +36,10 @@ std::string onMotor(const std::string& op, const std::string& rest) {
     return R"({"node": "motor", "op": ")" + op + "\", " + rest + "}";
 }
 
-/// A motor device that is open.
-class OpenMotor {
+/// This test's motor, open.
+class OpenMotor : public MotorFile {
   public:
-    explicit OpenMotor(int flags = O_RDWR) : fd_(open(kMotor, flags | O_CLOEXEC)) {}
-    ~OpenMotor() {
-        if (fd_ >= 0) close(fd_);
-    }
-    OpenMotor(const OpenMotor&) = delete;
-    OpenMotor& operator=(const OpenMotor&) = delete;
-
-    int fd() const { return fd_; }
-
-    /// The id an upload gets, or the error's name.
-    std::string upload(int id = -1, int16_t index = 0, uint16_t length = 500) const {
-        int16_t data[2] = {0, index};
-        ff_effect effect = record(id, length, data, 2);
-        return upload(effect);
-    }
-
-    std::string upload(ff_effect& effect) const {
-        const std::string result = outcome(ioctl(fd_, EVIOCSFF, &effect));
-        return result == "0" ? std::to_string(effect.id) : result;
-    }
-
-    std::string erase(int id) const { return outcome(ioctl(fd_, EVIOCRMFF, id)); }
-
-    std::string event(uint16_t code, int32_t value) const {
-        input_event event{};
-        event.type = EV_FF;
-        event.code = code;
-        event.value = value;
-        return outcome(write(fd_, &event, sizeof event));
-    }
-
-    static ff_effect record(int id, uint16_t length, int16_t* data, uint32_t count) {
-        ff_effect effect{};
-        effect.type = FF_PERIODIC;
-        effect.id = static_cast<int16_t>(id);
-        effect.replay.length = length;
-        effect.u.periodic.waveform = FF_CUSTOM;
-        effect.u.periodic.custom_len = count;
-        effect.u.periodic.custom_data = data;
-        return effect;
-    }
-
-  private:
-    int fd_;
+    explicit OpenMotor(int flags = O_RDWR) : MotorFile(kMotor, flags) {}
 };
 
 /// The part of a line from "op" on, of the journal's lines with that op.
@@ -137,7 +95,7 @@ TEST_F(Motor, AnUploadOfTheLargestWaveformArrivesWhole) {
     EXPECT_EQ(driver_.inside([] {
         static int16_t data[576];
         for (int16_t i = 0; i < 576; ++i) data[i] = i;
-        ff_effect effect = OpenMotor::record(-1, 0, data, 576);
+        ff_effect effect = MotorFile::record(-1, 0, data, 576);
         return OpenMotor().upload(effect);
     }),
               "0");
@@ -168,7 +126,7 @@ TEST_F(Motor, IdsFollowTheKernelsRules) {
 TEST_F(Motor, OnlyTheIdIsWrittenBack) {
     EXPECT_EQ(driver_.inside([] {
         int16_t data[2] = {};
-        ff_effect effect = OpenMotor::record(-1, 500, data, 2);
+        ff_effect effect = MotorFile::record(-1, 500, data, 2);
         effect.direction = 77;
         const ff_effect before = effect;
         OpenMotor().upload(effect);
@@ -182,7 +140,7 @@ TEST_F(Motor, OnlyTheIdIsWrittenBack) {
 TEST_F(Motor, BadPointersAreFaults) {
     EXPECT_EQ(driver_.inside([] {
         int16_t* nowhere = nullptr;
-        ff_effect effect = OpenMotor::record(-1, 500, nowhere + 8, 2);
+        ff_effect effect = MotorFile::record(-1, 500, nowhere + 8, 2);
         const OpenMotor motor;
         std::string results = motor.upload(effect);
         results += " " + outcome(ioctl(motor.fd(), EVIOCSFF, nullptr));
@@ -191,6 +149,18 @@ TEST_F(Motor, BadPointersAreFaults) {
     }),
               "EFAULT EFAULT EFAULT 0");
     EXPECT_EQ(linesOf(driver_, "upload").size(), 1U);
+}
+
+TEST_F(Motor, ARefusedUploadsSamplesAreNotLookedAt) {
+    EXPECT_EQ(driver_.inside([] {
+        int16_t* nowhere = nullptr;
+        ff_effect effect = MotorFile::record(2, 500, nowhere + 8, 2);
+        return OpenMotor().upload(effect);
+    }),
+              "EINVAL");
+    const Lines uploads = linesOf(driver_, "upload");
+    ASSERT_EQ(uploads.size(), 1U);
+    EXPECT_NE(uploads[0].find(R"("custom_len":2,"custom_hex":"")"), std::string::npos);
 }
 
 TEST_F(Motor, WhatTheMotorDoesNotHaveIsRefused) {
@@ -203,7 +173,7 @@ TEST_F(Motor, WhatTheMotorDoesNotHaveIsRefused) {
         effect.type = FF_PERIODIC;
         effect.u.periodic.waveform = FF_SINE;
         results += " " + motor.upload(effect);
-        effect = OpenMotor::record(-1, 0, nullptr, 0x7fffffff);
+        effect = MotorFile::record(-1, 0, nullptr, 0x7fffffff);
         results += " " + motor.upload(effect);
         effect = {};
         effect.id = -1;
@@ -334,10 +304,11 @@ TEST_F(Motor, ThereIsNothingToRead) {
         input_event event{};
         pollfd polled{motor.fd(), POLLIN | POLLOUT, 0};
         const int ready = poll(&polled, 1, 0);
-        return outcome(read(motor.fd(), &event, sizeof event)) + " " + std::to_string(ready) + " " +
+        return outcome(read(motor.fd(), &event, sizeof event)) + " " +
+               outcome(read(motor.fd(), &event, 5)) + " " + std::to_string(ready) + " " +
                std::to_string(polled.revents);
     }),
-              "EAGAIN 1 4");
+              "EAGAIN EINVAL 1 4");
 }
 
 TEST_F(Motor, TheDeviceGoesAwayWithTheDriver) {

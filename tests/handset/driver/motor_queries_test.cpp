@@ -46,11 +46,18 @@ TEST(MotorQueries, BitMapsHaveTheKernelsSizes) {
     EXPECT_EQ(answerQuery(kMotor, EVIOCGPROP(64))->result, 8);
 }
 
+TEST(MotorQueries, NothingIsPressedLitHeardOrSwitched) {
+    EXPECT_EQ(answerQuery(kMotor, EVIOCGKEY(128))->data, std::string(96, '\0'));
+    EXPECT_EQ(answerQuery(kMotor, EVIOCGLED(128))->data, std::string(8, '\0'));
+    EXPECT_EQ(answerQuery(kMotor, EVIOCGSND(128))->data, std::string(8, '\0'));
+    EXPECT_EQ(answerQuery(kMotor, EVIOCGSW(4))->data, std::string(4, '\0'));
+}
+
 TEST(MotorQueries, AnythingElseIsNoQuestion) {
     EXPECT_FALSE(answerQuery(kMotor, EVIOCGBIT(EV_REP, 8)));
     EXPECT_FALSE(answerQuery(kMotor, EVIOCGRAB));
     EXPECT_FALSE(answerQuery(kMotor, EVIOCSFF));
-    EXPECT_FALSE(answerQuery(kMotor, EVIOCGKEY(96)));
+    EXPECT_FALSE(answerQuery(kMotor, EVIOCGABS(0)));
     EXPECT_FALSE(answerQuery(kMotor, _IOR('X', 1, int)));
 }
 

@@ -18,6 +18,12 @@ TEST(Permission, AnOpenAsksForWhatItsModeSays) {
     EXPECT_EQ(wantedBy(O_RDWR), kMayRead | kMayWrite);
 }
 
+TEST(Permission, TruncationNeedsWritingToo) {
+    EXPECT_EQ(neededBy(O_RDONLY), kMayRead);
+    EXPECT_EQ(neededBy(O_RDONLY | O_TRUNC), kMayRead | kMayWrite);
+    EXPECT_EQ(neededBy(O_WRONLY | O_TRUNC), kMayWrite);
+}
+
 TEST(Permission, RootMayDoAnything) {
     EXPECT_TRUE(grants({0000, 1000, 1000}, {0, 0, {}}, kMayRead | kMayWrite));
 }

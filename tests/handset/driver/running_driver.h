@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// A handset-driver that runs for one test, and processes that live in its mount namespace.
+// A handset-driver that runs for one test.
 #pragma once
 
 #include <sys/types.h>
@@ -8,6 +8,7 @@
 #include <string>
 #include <vector>
 
+#include "client_process.h"
 #include "temporary_folder.h"
 
 namespace handset {
@@ -41,9 +42,10 @@ class RunningDriver {
     /// The journal as it stands.
     std::string rawJournal() const { return contentOf(folder_.file("journal")); }
 
-    /// Runs `work` in a process of its own that sees the driver's mounts, as that user with no
-    /// further groups, and returns what it returned.
-    std::string inside(uid_t user, const std::function<std::string()>& work) const;
+    /// Runs `work` in a process of its own that sees the driver's mounts, as runAs() does.
+    std::string inside(uid_t user, const std::function<std::string()>& work) const {
+        return runAs(user, work, pid_);
+    }
 
     /// The same as root.
     std::string inside(const std::function<std::string()>& work) const { return inside(0, work); }
@@ -53,18 +55,5 @@ class RunningDriver {
     pid_t pid_ = -1;
     bool ready_ = false;
 };
-
-/// Opens, writes once and closes: "4" for four bytes, or the error's name, after "open " where the
-/// open failed.
-std::string writeNode(const std::string& path, const std::string& text, int flags);
-
-/// Opens, reads once and closes: the text, or the error's name as above.
-std::string readNode(const std::string& path);
-
-/// Opens and closes: "ok" or the error's name.
-std::string openNode(const std::string& path, int flags);
-
-/// The number of bytes a call returned, or the name of the error it set.
-std::string outcome(ssize_t returned);
 
 }  // namespace handset

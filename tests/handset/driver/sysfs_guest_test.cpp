@@ -162,6 +162,19 @@ TEST_F(SysfsNodes, ChangingTheModeChangesWhoMay) {
     EXPECT_EQ(driver_.inside(1000, [] { return openNode(kDuration, O_RDONLY); }), "EACCES");
 }
 
+TEST_F(SysfsNodes, PermissionBitsMakeNoMethods) {
+    EXPECT_EQ(driver_.inside([] { return outcome(chmod(kWaves.c_str(), 0666)); }), "0");
+    EXPECT_EQ(driver_.inside([] { return outcome(chmod(kTrigger.c_str(), 0666)); }), "0");
+    EXPECT_EQ(driver_.inside([] { return writeNode(kWaves, "1\n", O_RDWR); }), "EIO");
+    EXPECT_EQ(driver_.inside([] { return readNode(kTrigger); }), "EIO");
+    EXPECT_EQ(driver_.inside([] { return readNode(kWaves); }), "137\n");
+}
+
+TEST_F(SysfsNodes, TruncationNeedsThePermissionToWrite) {
+    EXPECT_EQ(driver_.inside(1000, [] { return openNode(kDuration, O_RDONLY | O_TRUNC); }), "ok");
+    EXPECT_EQ(driver_.inside(1000, [] { return openNode(kWaves, O_RDONLY | O_TRUNC); }), "EACCES");
+}
+
 TEST_F(SysfsNodes, NothingIsCreatedOrRemoved) {
     EXPECT_EQ(driver_.inside([] { return openNode(kFolder + "new", O_WRONLY | O_CREAT); }),
               "EACCES");
@@ -169,6 +182,9 @@ TEST_F(SysfsNodes, NothingIsCreatedOrRemoved) {
     EXPECT_EQ(driver_.inside([] { return outcome(mkdir((kFolder + "new").c_str(), 0755)); }),
               "EPERM");
     EXPECT_EQ(driver_.inside([] { return outcome(unlink(kDuration.c_str())); }), "EPERM");
+    EXPECT_EQ(driver_.inside(
+                      [] { return outcome(mknod((kFolder + "new").c_str(), S_IFREG | 0644, 0)); }),
+              "EACCES");
     EXPECT_EQ(driver_.inside(
                       [] { return outcome(rename(kDuration.c_str(), (kFolder + "new").c_str())); }),
               "EPERM");

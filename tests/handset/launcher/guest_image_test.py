@@ -12,6 +12,7 @@ import unittest
 from unittest import mock
 
 import launcher_path  # noqa: F401
+import debian_packages
 import guest_image
 from failure import Failure
 
@@ -162,12 +163,12 @@ class KernelPackage(unittest.TestCase):
     META = "Package: linux-image-amd64\nDepends: linux-image-6.1.0-99-amd64 (= 6.1.999-1)\n"
 
     def test_is_the_one_behind_the_metapackage(self):
-        with mock.patch.object(guest_image, "_run", return_value=self.META):
+        with mock.patch.object(debian_packages, "run", return_value=self.META):
             self.assertEqual(guest_image._kernel_package("amd64", print),
                              "linux-image-6.1.0-99-amd64:amd64")
 
     def test_metapackage_without_a_kernel_is_a_failure(self):
-        with mock.patch.object(guest_image, "_run", return_value="Package: other\n"):
+        with mock.patch.object(debian_packages, "run", return_value="Package: other\n"):
             with self.assertRaisesRegex(Failure, "linux-image-arm64:arm64 names no kernel"):
                 guest_image._kernel_package("arm64", print)
 
@@ -176,11 +177,11 @@ class Tools(unittest.TestCase):
     def test_missing_tool_is_named_with_its_package(self):
         with self.assertRaisesRegex(Failure, "^no-such-tool is not installed: "
                                              "scripts/install-packages installs some-package$"):
-            guest_image._find_tool("no-such-tool", "some-package")
+            debian_packages.find_tool("no-such-tool", "some-package")
 
     def test_failing_tool_is_shown_with_its_last_line(self):
         with self.assertRaisesRegex(Failure, "sh -c .*: the reason$"):
-            guest_image._run(["sh", "-c", "echo first >&2; echo the reason >&2; exit 1"])
+            debian_packages.run(["sh", "-c", "echo first >&2; echo the reason >&2; exit 1"])
 
 
 class BusyboxLayer(unittest.TestCase):

@@ -9,5 +9,6 @@ PROJECT = os.path.dirname(os.path.dirname(os.path.dirname(os.path.dirname(
 RUN = os.path.join(PROJECT, "handset", "run")
 SHELL = os.path.join(PROJECT, "handset", "shell")
 PREPARE_GUEST = os.path.join(PROJECT, "handset", "launcher", "prepare-guest")
+BUILD_MODULE = os.path.join(PROJECT, "handset", "kernel", "build-module")
 
 sys.path.insert(0, os.path.join(PROJECT, "handset", "launcher"))

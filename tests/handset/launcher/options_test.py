@@ -6,7 +6,7 @@ import subprocess
 import tempfile
 import unittest
 
-from launcher_path import PREPARE_GUEST, PROJECT, RUN, SHELL
+from launcher_path import BUILD_MODULE, PREPARE_GUEST, PROJECT, RUN, SHELL
 
 ELF_AMD64 = b"\x7fELF\x02\x01\x01" + bytes(9) + b"\x02\x00\x3e\x00"
 ELF_ARM64 = b"\x7fELF\x02\x01\x01" + bytes(9) + b"\x02\x00\xb7\x00"
@@ -81,14 +81,17 @@ class Options(unittest.TestCase):
     def test_build_for_the_other_architecture(self):
         build = self.make_build(ELF_ARM64)
         self.assertEqual(self.refused("--build", build, "--", "true"),
-                         f"handset/run: {build} is not built for amd64")
+                         f"handset/run: {build} is built for arm64, not for amd64: give "
+                         "--arch arm64, or with --build the folder of an amd64 build")
         self.assertEqual(self.refused("--arch", "arm64", "--build", self.build, "--", "true"),
-                         f"handset/run: {self.build} is not built for arm64")
+                         f"handset/run: {self.build} is built for amd64, not for arm64: give "
+                         "--arch amd64, or with --build the folder of an arm64 build")
 
     def test_truncated_agent_is_not_built_for_any(self):
         build = self.make_build(b"")
         self.assertEqual(self.refused("--build", build, "--", "true"),
-                         f"handset/run: {build} is not built for amd64")
+                         f"handset/run: {build}/bin/handset-agent is no program for amd64; build "
+                         "it with: cmake --preset release && cmake --build --preset release")
 
     def test_timeout_must_be_above_zero(self):
         for text in ("0", "-1", "soon", "nan", "inf", ""):
@@ -143,9 +146,10 @@ class Options(unittest.TestCase):
         self.assertEqual(self.refused("ls", program=SHELL),
                          "handset/shell: unrecognized arguments: ls")
 
-    def test_prepare_guest_refuses_an_unknown_architecture(self):
-        self.assertEqual(self.refused("--arch", "mips", program=PREPARE_GUEST),
-                         "prepare-guest: unknown architecture 'mips': use amd64 or arm64")
+    def test_preparations_refuse_an_unknown_architecture(self):
+        for program, name in ((PREPARE_GUEST, "prepare-guest"), (BUILD_MODULE, "build-module")):
+            self.assertEqual(self.refused("--arch", "mips", program=program),
+                             f"{name}: unknown architecture 'mips': use amd64 or arm64")
 
     def test_help_goes_to_standard_output(self):
         for program, usage in ((RUN, "usage: handset/run [options] -- COMMAND..."),
