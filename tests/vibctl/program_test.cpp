@@ -81,8 +81,9 @@ TEST_P(WrongUsageOf, GetsOneLineAndStatus2) {
 }
 
 constexpr WrongUsage kWrongUsages[] = {
-        {"NoCommand", "", "vibctl: no command given; there are std, ext, list and help\n"},
-        {"Command", "foo", "vibctl: unknown command \"foo\"; there are std, ext, list and help\n"},
+        {"NoCommand", "", "vibctl: no command given; there are std, ext, list, doctor and help\n"},
+        {"Command", "foo",
+         "vibctl: unknown command \"foo\"; there are std, ext, list, doctor and help\n"},
         {"Option", "--jsno list",
          "vibctl: unknown option \"--jsno\"; there are --json, --wait SECONDS, --callback, --help, "
          "--version\n"},
