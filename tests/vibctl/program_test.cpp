@@ -97,6 +97,8 @@ constexpr WrongUsage kWrongUsages[] = {
         {"ArgumentCount", "ext setAmplitude",
          "vibctl: ext setAmplitude: takes 1 argument, got 0; usage: vibctl ext setAmplitude "
          "AMPLITUDE\n"},
+        {"ArgumentOfDoctor", "doctor quickly",
+         "vibctl: doctor takes no arguments; usage: vibctl [--json] doctor\n"},
         {"ArgumentOfList", "list all",
          "vibctl: list takes no arguments; usage: vibctl [--json] list\n"},
 };
@@ -113,6 +115,16 @@ TEST(Program, WithoutABinderDeviceSaysSoWithStatus3) {
         EXPECT_EQ(result.err, "vibctl: cannot open /dev/binder: No such file or directory\n")
                 << arguments;
     }
+}
+
+TEST(Program, DoctorWithoutABinderDeviceSaysSoAndGoesOn) {
+    if (access("/dev/binder", F_OK) == 0) GTEST_SKIP() << "this machine has a binder device";
+    const Execution result = run("doctor");
+    EXPECT_EQ(result.status, 1);
+    EXPECT_THAT(result.out, StartsWith("bad      binder: cannot open /dev/binder: No such file or "
+                                       "directory; next: load the kernel's binder driver"));
+    EXPECT_THAT(result.out, HasSubstr("\nskipped  extension: needs the registered service\n"));
+    EXPECT_EQ(result.err, "");
 }
 
 }  // namespace
