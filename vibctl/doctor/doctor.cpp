@@ -117,7 +117,7 @@ Finding checkExtension(const BinderFacts& facts) {
 /// What the service sees as "/", its private mounts included, as far as it may be looked at.
 fs::path viewOf(const fs::path& root, std::optional<pid_t> running) {
     if (running) {
-        const fs::path own = root / "proc" / std::to_string(*running) / "root";
+        fs::path own = root / "proc" / std::to_string(*running) / "root";
         if (access((own / ".").c_str(), R_OK | X_OK) == 0) return own;
     }
     return root;
