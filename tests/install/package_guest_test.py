@@ -74,7 +74,7 @@ class Package(unittest.TestCase):
             phone up --no-service
             manager=$(cat /proc/[0-9]*/stat | sed -n 's/^\\([0-9]*\\) (servicemanager).*/\\1/p')
             kill $manager
-            while kill -0 $manager 2>/dev/null; do sleep 0.1; done
+            while [ -e /proc/$manager/exe ]; do sleep 0.1; done
             rm -r /vendor/etc/vintf/manifest/*
             {usr}/libexec/qvx-vibrator/servicemanager --root {usr}/share/qvx-vibrator &
             phone exec --user 1000 -- {usr}/libexec/qvx-vibrator/{SERVICE} 2>/run/service.log &
@@ -88,7 +88,7 @@ class Package(unittest.TestCase):
             phone down
         """
         result = subprocess.run(
-            [PROJECT / "handset" / "run", "--build", BUILD, "--profile", "off", "--",
+            [PROJECT / "handset" / "run", "--build", BUILD, "--profile", "off", "--timeout", "60", "--",
              "sh", "-c", script], capture_output=True, text=True)
         self.assertEqual(result.returncode, 0, result.stdout + result.stderr)
         self.assertIn("\non: ok\n", result.stdout)
