@@ -16,6 +16,7 @@ class Package(unittest.TestCase):
         # Below the build folder, because the guest sees that.
         cls.folder = tempfile.TemporaryDirectory(prefix="package-", dir=BUILD)
         cls.root = pathlib.Path(cls.folder.name)
+        cls.root.chmod(0o755)  # for the user that the service runs as
         run("cpack", "-G", "DEB", "--config", BUILD / "CPackConfig.cmake", "-B", cls.root,
             cwd=cls.root)
         packages = list(cls.root.glob("*.deb"))
