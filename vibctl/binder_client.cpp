@@ -28,6 +28,7 @@ constexpr std::chrono::seconds kManagerPatience{2};
 /// The service manager registers itself, so it is found as any service is.
 constexpr const char* kManagerName = "manager";
 constexpr transaction_code_t kListServices = FIRST_CALL_TRANSACTION + 3;
+constexpr transaction_code_t kGetServiceDebugInfo = FIRST_CALL_TRANSACTION + 11;
 constexpr int32_t kEveryDumpPriority = 15;
 
 std::string standardName() {
@@ -67,19 +68,33 @@ binder_status_t callListServices(AIBinder* manager, std::vector<std::string>& na
     return status;
 }
 
-Problem checkDevice() {
-    for (const char* device : kBinderDevices) {
-        if (access(device, R_OK | W_OK) == 0) return std::nullopt;
-        if (errno == ENOENT) continue;
-        return fmt::format("cannot open {}: {}", device, std::strerror(errno));
-    }
-    return fmt::format("cannot open {}: {}", kBinderDevices[0], std::strerror(ENOENT));
+/// One ServiceDebugInfo: an int that is not 0, the parcelable's size, the name, the process.
+binder_status_t readDebugInfo(const AParcel* in, std::string& name, int32_t& pid) {
+    int32_t present = 0;
+    int32_t size = 0;
+    binder_status_t status = AParcel_readInt32(in, &present);
+    const int32_t start = AParcel_getDataPosition(in);
+    if (status == STATUS_OK) status = AParcel_readInt32(in, &size);
+    if (status == STATUS_OK) status = ndk::AParcel_readString(in, &name);
+    if (status == STATUS_OK) status = AParcel_readInt32(in, &pid);
+    // What a later version adds stands behind.
+    return status == STATUS_OK ? AParcel_setDataPosition(in, start + size) : status;
 }
 
 }  // namespace
 
-Problem checkBinder() {
-    if (Problem problem = checkDevice()) return problem;
+Problem checkDevice(std::string& device) {
+    for (const char* candidate : kBinderDevices) {
+        device = candidate;
+        if (access(candidate, R_OK | W_OK) == 0) return std::nullopt;
+        if (errno == ENOENT) continue;
+        return fmt::format("cannot open {}: {}", candidate, std::strerror(errno));
+    }
+    device = kBinderDevices[0];
+    return fmt::format("cannot open {}: {}", device, std::strerror(ENOENT));
+}
+
+Problem checkManager() {
     // Without a service manager, the first look-up of a process waits for one for ever; a thread
     // of its own does the waiting, and is left behind when it takes too long.
     std::promise<void> answered;
@@ -90,6 +105,12 @@ Problem checkBinder() {
     }).detach();
     if (answer.wait_for(kManagerPatience) == std::future_status::ready) return std::nullopt;
     return fmt::format("no service manager has answered for {} seconds", kManagerPatience.count());
+}
+
+Problem checkBinder() {
+    std::string device;
+    if (Problem problem = checkDevice(device)) return problem;
+    return checkManager();
 }
 
 std::shared_ptr<IVibrator> connect(IVibrator*, Problem& problem) {
@@ -142,6 +163,29 @@ Outcome listServices() {
         outcome.text = textOf(names, Show::kPlain);
     }
     return outcome;
+}
+
+pid_t findRegistrant(const std::string& name) {
+    const ndk::SpAIBinder manager(AServiceManager_checkService(kManagerName));
+    AIBinder_associateClass(manager.get(), managerClass());
+    ndk::ScopedAParcel in;
+    ndk::ScopedAParcel out;
+    ndk::ScopedAStatus header = ndk::ScopedAStatus::ok();
+    int32_t count = 0;
+    binder_status_t status = AIBinder_prepareTransaction(manager.get(), in.getR());
+    if (status == STATUS_OK) {
+        status = AIBinder_transact(manager.get(), kGetServiceDebugInfo, in.getR(), out.getR(), 0);
+    }
+    if (status == STATUS_OK) status = AParcel_readStatusHeader(out.get(), header.getR());
+    if (status != STATUS_OK || !header.isOk()) return 0;
+    status = AParcel_readInt32(out.get(), &count);
+    for (int32_t i = 0; status == STATUS_OK && i < count; ++i) {
+        std::string registered;
+        int32_t pid = 0;
+        status = readDebugInfo(out.get(), registered, pid);
+        if (status == STATUS_OK && registered == name) return pid;
+    }
+    return 0;
 }
 
 ndk::ScopedAStatus CompletionCallback::onComplete() {

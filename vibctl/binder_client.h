@@ -4,11 +4,14 @@
 // hanging where there is no service manager, and a callback that can be waited for.
 #pragma once
 
+#include <sys/types.h>
+
 #include <chrono>
 #include <condition_variable>
 #include <memory>
 #include <mutex>
 #include <optional>
+#include <string>
 
 #include <aidl/android/hardware/vibrator/BnVibratorCallback.h>
 
@@ -22,6 +25,10 @@ namespace vibctl {
 /// answers within a few seconds. To be asked before anything else here.
 Problem checkBinder();
 
+/// The two halves of checkBinder(). `device` becomes the one that the binder library will take.
+Problem checkDevice(std::string& device);
+Problem checkManager();
+
 /// The service behind an interface; null with the reason in `problem`.
 std::shared_ptr<IVibrator> connect(IVibrator*, Problem& problem);
 
@@ -30,6 +37,10 @@ std::shared_ptr<IZelVibrator> connect(IZelVibrator*, Problem& problem);
 
 /// Asks the service manager which services are registered. The result is a list of names.
 Outcome listServices();
+
+/// The process that registered the service, or 0: there is no such service, or the service manager
+/// does not tell.
+pid_t findRegistrant(const std::string& name);
 
 /// A callback that remembers when it was first called.
 class CompletionCallback : public aidl::android::hardware::vibrator::BnVibratorCallback {

@@ -14,6 +14,8 @@
 
 #include "binder_client.h"
 #include "command_line.h"
+#include "doctor/binder_questions.h"
+#include "doctor/doctor.h"
 #include "outcome.h"
 #include "usage.h"
 
@@ -90,6 +92,17 @@ Exit runList(const CommandLine& line) {
     return Exit::kOk;
 }
 
+Exit runDoctor(const CommandLine& line) {
+    if (!line.method.empty()) {
+        return fail("doctor takes no arguments; usage: vibctl [--json] doctor", Exit::kUsage);
+    }
+    const std::vector<Finding> findings = diagnose(askOverBinder(), "/");
+    for (const Finding& finding : findings) {
+        fmt::print("{}\n", line.json ? jsonLine(finding) : humanLine(finding));
+    }
+    return allIsWell(findings) ? Exit::kOk : Exit::kException;
+}
+
 Exit run(const std::vector<std::string>& words) {
     CommandLine line;
     if (const Problem problem = parseCommandLine(words, line)) {
@@ -100,6 +113,7 @@ Exit run(const std::vector<std::string>& words) {
     if (line.command == "ext") return runMethod<IZelVibrator>(line);
     if (line.help || line.command == "help") return print(programHelp());
     if (line.command == "list") return runList(line);
+    if (line.command == "doctor") return runDoctor(line);
     return fail(unknownCommand(line.command), Exit::kUsage);
 }
 

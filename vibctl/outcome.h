@@ -19,7 +19,7 @@ namespace vibctl {
 /// Exit statuses of the program.
 enum class Exit : int {
     kOk = 0,
-    kException = 1,  ///< the call returned an exception
+    kException = 1,  ///< the call returned an exception, or the doctor found something
     kUsage = 2,      ///< the command line was wrong; nothing was called
     kNoService = 3,  ///< no service, or the call did not get through
 };

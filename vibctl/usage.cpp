@@ -131,13 +131,18 @@ std::string programHelp() {
     return "usage: vibctl [--json] [--wait SECONDS] std METHOD [ARG...] [--callback]\n"
            "       vibctl [--json] ext METHOD [ARG...] [--callback]\n"
            "       vibctl [--json] list\n"
+           "       vibctl [--json] doctor\n"
            "\n"
            "Calls the vibrator service over binder: std is IVibrator, ext the maker's "
            "IZelVibrator\n"
-           "that is attached to it, list shows the services registered.\n"
+           "that is attached to it. list shows the services registered; doctor asks what keeps a "
+           "phone\n"
+           "from vibrating, from binder to the driver's nodes, and says what to do next.\n"
            "\n"
            "  --json          print one JSON object: iface, method, exception, status, message,\n"
-           "                  result, callback, us\n"
+           "                  result, callback, us; doctor prints one for each check: check, "
+           "ok,\n"
+           "                  text, next\n"
            "  --callback      pass a callback; compose and composePwle then wait for completion\n"
            "  --wait SECONDS  how long to wait for it (default 5)\n"
            "  --help          this text; after std or ext its methods, after a method its "
@@ -149,13 +154,14 @@ std::string programHelp() {
            "any case, or by any number. The fields of a packet are joined by commas, packets are\n"
            "separate words and come last: vibctl ext performHapticEngine 10000 7,10000,2050,0\n"
            "\n"
-           "Exit status: 0 ok, 1 the call returned an exception, 2 wrong usage, 3 no service or a\n"
-           "transport failure.\n";
+           "Exit status: 0 ok, 1 the call returned an exception or the doctor found something "
+           "bad,\n"
+           "2 wrong usage, 3 no service or a transport failure.\n";
 }
 
 std::string unknownCommand(const std::string& word) {
     return fmt::format(
-            "{}; there are std, ext, list and help",
+            "{}; there are std, ext, list, doctor and help",
             word.empty() ? "no command given" : fmt::format("unknown command {:?}", word));
 }
 

@@ -27,6 +27,7 @@ struct Entry {
     std::string interface;
     std::string instance;
     std::string apex;  ///< empty: not updatable
+    fs::path file;     ///< where it stands
 };
 
 /// What was wrong with a file; empty when nothing was.
@@ -138,7 +139,10 @@ Fault readFile(const fs::path& file, const char* type, std::vector<Entry>& entri
         Fault fault = readHal(*hal, found);
         if (!fault.empty()) return fault;
     }
-    entries.insert(entries.end(), found.begin(), found.end());
+    for (Entry& entry : found) {
+        entry.file = file;
+        entries.push_back(std::move(entry));
+    }
     return {};
 }
 
@@ -217,6 +221,22 @@ std::optional<std::string> Manifests::updatableViaApex(const std::string& servic
     const std::optional<Entry> entry = findEntry(mRoot, serviceName, mLog);
     if (!entry || entry->apex.empty()) return std::nullopt;
     return entry->apex;
+}
+
+std::optional<fs::path> Manifests::fileDeclaring(const std::string& serviceName) const {
+    const std::optional<Entry> entry = findEntry(mRoot, serviceName, mLog);
+    if (!entry) return std::nullopt;
+    return entry->file;
+}
+
+std::vector<fs::path> Manifests::files() const {
+    std::vector<fs::path> all;
+    for (const ManifestKind* kind : {&kDevice, &kFramework}) {
+        for (const char* partition : kind->partitions) {
+            for (fs::path& file : filesOf(mRoot, partition)) all.push_back(std::move(file));
+        }
+    }
+    return all;
 }
 
 }  // namespace servicemanager

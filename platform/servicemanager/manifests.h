@@ -35,6 +35,12 @@ class Manifests {
     /// The APEX that may update the service `package.IFoo/instance`, when its entry names one.
     std::optional<std::string> updatableViaApex(const std::string& serviceName) const;
 
+    /// The file whose entry declares the service `package.IFoo/instance`.
+    std::optional<std::filesystem::path> fileDeclaring(const std::string& serviceName) const;
+
+    /// The manifest files there are, faulty ones included, in the order in which they are read.
+    std::vector<std::filesystem::path> files() const;
+
   private:
     std::filesystem::path mRoot;
     Log mLog;

@@ -220,6 +220,17 @@ constexpr Fault kFaults[] = {
 INSTANTIATE_TEST_SUITE_P(Manifests, FaultyManifest, ::testing::ValuesIn(kFaults),
                          [](const auto& fault) { return fault.param.name; });
 
+TEST_F(ManifestsTest, TellsWhichFileDeclaresAService) {
+    put("vendor/etc/vintf/manifest.xml", device(""));
+    put("vendor/etc/vintf/manifest/v.xml", device(kVibrator));
+    put("system/etc/vintf/manifest/s.xml", framework(""));
+    EXPECT_EQ(mManifests.fileDeclaring(kVibratorName), at("vendor/etc/vintf/manifest/v.xml"));
+    EXPECT_EQ(mManifests.fileDeclaring("a.b.IFoo/x"), std::nullopt);
+    EXPECT_THAT(mManifests.files(), ElementsAre(at("vendor/etc/vintf/manifest.xml"),
+                                                at("vendor/etc/vintf/manifest/v.xml"),
+                                                at("system/etc/vintf/manifest/s.xml")));
+}
+
 TEST_F(ManifestsTest, AFaultDropsTheWholeFileNotItsBeginning) {
     put("vendor/etc/vintf/manifest.xml",
         device("<hal format=\"aidl\"><name>a.b</name><fqname>IFoo/x</fqname></hal>"

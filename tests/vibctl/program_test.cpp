@@ -81,8 +81,9 @@ TEST_P(WrongUsageOf, GetsOneLineAndStatus2) {
 }
 
 constexpr WrongUsage kWrongUsages[] = {
-        {"NoCommand", "", "vibctl: no command given; there are std, ext, list and help\n"},
-        {"Command", "foo", "vibctl: unknown command \"foo\"; there are std, ext, list and help\n"},
+        {"NoCommand", "", "vibctl: no command given; there are std, ext, list, doctor and help\n"},
+        {"Command", "foo",
+         "vibctl: unknown command \"foo\"; there are std, ext, list, doctor and help\n"},
         {"Option", "--jsno list",
          "vibctl: unknown option \"--jsno\"; there are --json, --wait SECONDS, --callback, --help, "
          "--version\n"},
@@ -124,6 +125,8 @@ constexpr WrongUsage kWrongUsages[] = {
          "composePwle; usage: vibctl std getPrimitiveDuration PRIMITIVE\n"},
         {"WaitWithoutSeconds", "std compose 0,CLICK,1 --callback --wait",
          "vibctl: --wait needs a number of seconds\n"},
+        {"ArgumentOfDoctor", "doctor quickly",
+         "vibctl: doctor takes no arguments; usage: vibctl [--json] doctor\n"},
         {"ArgumentOfList", "list all",
          "vibctl: list takes no arguments; usage: vibctl [--json] list\n"},
 };
@@ -140,6 +143,16 @@ TEST(Program, WithoutABinderDeviceSaysSoWithStatus3) {
         EXPECT_EQ(result.err, "vibctl: cannot open /dev/binder: No such file or directory\n")
                 << arguments;
     }
+}
+
+TEST(Program, DoctorWithoutABinderDeviceSaysSoAndGoesOn) {
+    if (access("/dev/binder", F_OK) == 0) GTEST_SKIP() << "this machine has a binder device";
+    const Execution result = run("doctor");
+    EXPECT_EQ(result.status, 1);
+    EXPECT_THAT(result.out, StartsWith("bad      binder: cannot open /dev/binder: No such file or "
+                                       "directory; next: load the kernel's binder driver"));
+    EXPECT_THAT(result.out, HasSubstr("\nskipped  extension: needs the registered service\n"));
+    EXPECT_EQ(result.err, "");
 }
 
 }  // namespace

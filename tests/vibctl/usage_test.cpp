@@ -148,8 +148,9 @@ TEST(CallbackOption, GoesOnlyWithMethodsThatTakeOne) {
 }
 
 TEST(UnknownCommand, GetsTheOnesThereAre) {
-    EXPECT_EQ(unknownCommand("foo"), "unknown command \"foo\"; there are std, ext, list and help");
-    EXPECT_EQ(unknownCommand(""), "no command given; there are std, ext, list and help");
+    EXPECT_EQ(unknownCommand("foo"),
+              "unknown command \"foo\"; there are std, ext, list, doctor and help");
+    EXPECT_EQ(unknownCommand(""), "no command given; there are std, ext, list, doctor and help");
 }
 
 TEST(Help, OfAMethodSaysWhatItsArgumentsAccept) {
