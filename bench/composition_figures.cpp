@@ -34,8 +34,9 @@ double sleepMs(int32_t lengthMs) {
 }
 
 struct Lateness {
-    std::vector<double> callbacks;
     std::vector<double> sleeps;
+    std::vector<double> calls;
+    std::vector<double> callbacks;
 };
 
 // Short when a callback does not come.
@@ -43,9 +44,10 @@ Lateness measure(IVibrator& vibrator, int32_t delayMs) {
     const int32_t lengthMs = delayMs + kClickMs;
     Lateness lateness;
     for (int round = 0; round < kRounds; ++round) {
-        const auto taken = composeAndWait(vibrator, clickAfter(delayMs));
-        if (!taken) break;
-        lateness.callbacks.push_back(*taken - lengthMs);
+        const auto composed = composeAndWait(vibrator, clickAfter(delayMs));
+        if (!composed) break;
+        lateness.callbacks.push_back(composed->notified - composed->called - lengthMs);
+        lateness.calls.push_back(composed->returned - composed->called);
         lateness.sleeps.push_back(sleepMs(lengthMs) - lengthMs);
     }
     return lateness;
@@ -69,8 +71,8 @@ bool measureAll() {
         fmt::print(stderr, "composition_figures: the service is not registered\n");
         return false;
     }
-    fmt::print("{:<22} {:>9} {:>8} {:>8} {:>8} {:>8} {:>8}\n", "ms late", "length ms", "min",
-               "median", "95 %", "max", "ratio");
+    fmt::print("{:<22} {:>9} {:>8} {:>8} {:>8} {:>8} {:>8}\n", "ms", "length", "min", "median",
+               "95 %", "max", "ratio");
     for (const int32_t delayMs : kDelaysMs) {
         const Lateness lateness = measure(*vibrator, delayMs);
         if (lateness.callbacks.size() != kRounds) {
@@ -78,8 +80,9 @@ bool measureAll() {
             return false;
         }
         const double baseline = quantile(lateness.sleeps, 0.5);
-        print("sleep", delayMs + kClickMs, lateness.sleeps, baseline);
-        print("composition's callback", delayMs + kClickMs, lateness.callbacks, baseline);
+        print("sleep: late by", delayMs + kClickMs, lateness.sleeps, baseline);
+        print("call: takes", delayMs + kClickMs, lateness.calls, baseline);
+        print("callback: late by", delayMs + kClickMs, lateness.callbacks, baseline);
     }
     return true;
 }

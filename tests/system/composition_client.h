@@ -78,16 +78,23 @@ inline std::vector<CompositeEffect> clickAfter(int32_t delayMs) {
     return {click};
 }
 
-// Milliseconds from the call of compose() to its notification; nothing when the call was refused or
-// no notification came.
-inline std::optional<double> composeAndWait(IVibrator& vibrator,
-                                            const std::vector<CompositeEffect>& composition) {
+// A composition as its client saw it, by monotonicMs().
+struct Composed {
+    double called;
+    double returned;
+    double notified;
+};
+
+// Nothing when the call was refused or no notification came.
+inline std::optional<Composed> composeAndWait(IVibrator& vibrator,
+                                              const std::vector<CompositeEffect>& composition) {
     const auto notification = ndk::SharedRefBase::make<Notification>();
-    const double before = monotonicMs();
+    const double called = monotonicMs();
     if (!vibrator.compose(composition, notification).isOk()) return std::nullopt;
+    const double returned = monotonicMs();
     const std::optional<double> notified = notification->wait();
     if (!notified) return std::nullopt;
-    return *notified - before;
+    return Composed{called, returned, *notified};
 }
 
 }  // namespace qvx::test

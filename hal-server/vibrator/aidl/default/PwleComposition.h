@@ -28,11 +28,13 @@ void constructBrakingSegment(std::ostream& text, const int& segment, int duratio
 
 struct PwleSequence {
     std::string text;
+    // Sum of the durations. Negative when those are: nothing refuses a negative duration, and 64
+    // bits hold the sum of any list.
     int64_t totalMs;
 };
 
 // Empty when an entry is out of range: amplitudes 0.0 to 0.98256, frequencies 140.0 to 160.0 Hz,
-// durations below 16384 ms, braking below 2.
+// durations below 16384 ms, braking below 2. An entry of a kind that is not known is left out.
 std::optional<PwleSequence> buildPwleSequence(const std::vector<PrimitivePwle>& composite);
 
 }  // namespace aidl::android::hardware::vibrator
