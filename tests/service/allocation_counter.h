@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 //
-// Counts what the calling thread takes from the heap and gives back, whichever function it uses:
+// Counts what the calling thread takes from the heap and gives back, whichever function it uses
+// (the thread sanitizer does not tell of blocks of a wanted alignment):
 //
 //     const AllocationCounter counter;
 //     ... call the code under test ...
