@@ -3,6 +3,9 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <iterator>
+#include <sstream>
+
 #include "extension_calls.h"
 
 namespace qvx::test {
@@ -52,57 +55,68 @@ constexpr Method kMethods[] = {
         {"hasFeature INTENSITY", "false", "null", -1, "[hasFeature]Fail - "},
 };
 
-class ServedCaller : public testing::TestWithParam<const char*> {};
+std::vector<json> callEveryMethodAs(const std::string& user) {
+    std::vector<std::string> calls;
+    for (const Method& method : kMethods) calls.push_back(method.words);
+    return callAllAs(user, calls);
+}
 
-TEST_P(ServedCaller, GetsEveryMethodsAnswer) {
+TEST(ExtensionCaller, RootAndSystemGetEveryMethodsAnswer) {
     const Phone phone("leds");
     ASSERT_EQ(phone.up().status, 0) << phone.up().out << phone.up().err;
-    phone.reset();
-    for (const Method& method : kMethods) {
-        const json answer = callAs(GetParam(), extensionCall(method.words));
-        EXPECT_EQ(answer["exception"], 0) << method.words;
-        EXPECT_EQ(answer["status"], 0) << method.words;
-        EXPECT_EQ(answer["result"], json::parse(method.served)) << method.words;
+    for (const char* user : {"0", "1000"}) {
+        const std::vector<json> answers = callEveryMethodAs(user);
+        ASSERT_EQ(answers.size(), std::size(kMethods));
+        for (size_t i = 0; i < answers.size(); ++i) {
+            SCOPED_TRACE(std::string(kMethods[i].words) + " by " + user);
+            EXPECT_EQ(answers[i]["exception"], 0);
+            EXPECT_EQ(answers[i]["status"], 0);
+            EXPECT_EQ(answers[i]["result"], json::parse(kMethods[i].served));
+        }
     }
     EXPECT_THAT(phone.log(), Not(HasSubstr("Pemission denied")));
 }
 
-INSTANTIATE_TEST_SUITE_P(Users, ServedCaller, testing::Values("0", "1000"));
+// The lines in which the service refuses, from the version in front of them.
+std::vector<std::string> refusalsIn(const std::string& log) {
+    std::vector<std::string> refusals;
+    std::istringstream stream(log);
+    for (std::string line; std::getline(stream, line);) {
+        if (line.find("Pemission denied") == std::string::npos) continue;
+        refusals.push_back(line.substr(line.find("V_4_0: ")));
+    }
+    return refusals;
+}
 
-class RefusedCaller : public testing::TestWithParam<const char*> {};
-
-TEST_P(RefusedCaller, GetsEveryMethodsRefusalAndReachesNoNode) {
+TEST(ExtensionCaller, OthersGetEveryMethodsRefusalAndReachNoNode) {
     const Phone phone("leds");
     ASSERT_EQ(phone.up().status, 0) << phone.up().out << phone.up().err;
     phone.reset();
-    std::string expectedLines;
-    for (const Method& method : kMethods) {
-        const json answer = callAs(GetParam(), extensionCall(method.words));
-        EXPECT_EQ(answer["exception"], method.refusal) << method.words;
-        EXPECT_EQ(answer["status"], 0) << method.words;
-        EXPECT_EQ(answer["result"], json::parse(method.refused)) << method.words;
-        EXPECT_THAT(phone.log(), HasSubstr(std::string("V_4_0: ") + method.line +
-                                           "Pemission denied (" + GetParam() + ")\n"))
-                << method.words;
-        phone.reset();
+    std::vector<std::string> lines;
+    for (const char* user : {"1001", "2000", "10123"}) {
+        const std::vector<json> answers = callEveryMethodAs(user);
+        ASSERT_EQ(answers.size(), std::size(kMethods));
+        for (size_t i = 0; i < answers.size(); ++i) {
+            SCOPED_TRACE(std::string(kMethods[i].words) + " by " + user);
+            EXPECT_EQ(answers[i]["exception"], kMethods[i].refusal);
+            EXPECT_EQ(answers[i]["status"], 0);
+            EXPECT_EQ(answers[i]["result"], json::parse(kMethods[i].refused));
+            lines.push_back(std::string("V_4_0: ") + kMethods[i].line + "Pemission denied (" +
+                            user + ")");
+        }
     }
-    EXPECT_THAT(phone.journal(), IsEmpty());
+    EXPECT_EQ(refusalsIn(phone.log()), lines);
+    EXPECT_THAT(journalInWords(phone), IsEmpty());
 }
-
-INSTANTIATE_TEST_SUITE_P(Users, RefusedCaller, testing::Values("1001", "2000", "10123"));
 
 TEST(ExtensionBinder, IsFoundThroughTheStandardServiceAndNotByName) {
     const Phone phone("leds");
     EXPECT_EQ(runCommand({"vibctl", "list"}).out,
               "android.hardware.vibrator.IVibrator/default\nmanager\n");
     EXPECT_EQ(phone.call({"ext", "getInterfaceVersion"})["result"], 4);
+    EXPECT_EQ(callAllAs("10123", {"getInterfaceVersion"}).at(0)["result"], 4);
     EXPECT_EQ(phone.call({"ext", "getInterfaceHash"})["result"],
               "a494dcbbfe8baded1569bcb7cb0d8f38ea65e21a");
-}
-
-TEST(ExtensionBinder, TellsItsVersionToAnyUser) {
-    const Phone phone("leds");
-    EXPECT_EQ(callAs("10123", {"ext", "getInterfaceVersion"})["result"], 4);
 }
 
 }  // namespace

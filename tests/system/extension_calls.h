@@ -2,6 +2,7 @@
 // Calls of the maker's interface as any user, and the journal in words.
 #pragma once
 
+#include <cstddef>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -10,17 +11,19 @@
 
 namespace qvx::test {
 
-// One call by another user of the phone that is up; otherwise as Phone::call().
-nlohmann::json callAs(const std::string& user, const std::vector<std::string>& words);
+// Calls of the extension, each as "performFifoHapticEngine 25", one after another by one user of
+// the phone that is up: what vibctl printed for each, parsed.
+std::vector<nlohmann::json> callAllAs(const std::string& user,
+                                      const std::vector<std::string>& calls);
 
-// "performFifoHapticEngine 25" as the words of a call of the extension.
+// One such call as the words for Phone::call().
 std::vector<std::string> extensionCall(std::string_view words);
 
-// What the driver was asked since the last reset, in order. Closing is left out: the kernel tells
-// of it when it likes.
+// What the driver was asked since the last reset, in order, without the first `skipped` lines.
+// Closing is left out: the kernel tells of it when it likes.
 //   "open LEAF O_RDWR"      "read LEAF SIZE"      "write LEAF DATA"
 //   "upload LENGTH CUSTOM_HEX"      "event CODE VALUE"      "erase ID"
 // What did not go as asked ends with " = " and the error's name or the count that was taken.
-std::vector<std::string> journalInWords(const Phone& phone);
+std::vector<std::string> journalInWords(const Phone& phone, size_t skipped = 0);
 
 }  // namespace qvx::test

@@ -41,9 +41,10 @@ TEST(Extension, SingleLettersOfEventCmdAnswerThePostureQueries) {
                 {"FOLD\n", true, false},
                 {"TENT\n", false, true},
                 {"O", false, false}};
+    const Phone phone("leds");
+    ASSERT_EQ(phone.up().status, 0) << phone.up().out << phone.up().err;
     for (const auto& [text, folder, tentMode] : rows) {
-        const Phone phone(plainLeds("event_cmd", text));
-        ASSERT_EQ(phone.up().status, 0) << phone.up().out << phone.up().err;
+        runCommand({"phone", "node", kFolder + "event_cmd", text});
         EXPECT_EQ(phone.call({"ext", "supportsFolderStatusSetting"})["result"], folder) << text;
         EXPECT_EQ(phone.call({"ext", "supportsFolderTentModeStatusSetting"})["result"], tentMode)
                 << text;
