@@ -4,7 +4,9 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <chrono>
+#include <cstddef>
 #include <cstdint>
 #include <ostream>
 #include <thread>
@@ -47,14 +49,17 @@ std::vector<std::string> driverRequests(const Phone& phone) {
     return requests;
 }
 
-// Waits until the driver has seen so many requests; a double click's come after its answer.
-std::vector<std::string> awaitRequests(const Phone& phone, size_t count) {
+// The requests after the first `seen`, once there are `count` of them: some of a double click's
+// come after its answer.
+std::vector<std::string> awaitRequests(const Phone& phone, size_t seen, size_t count) {
     const auto end = std::chrono::steady_clock::now() + milliseconds(5000);
     std::vector<std::string> requests = driverRequests(phone);
-    while (requests.size() < count && std::chrono::steady_clock::now() < end) {
+    while (requests.size() < seen + count && std::chrono::steady_clock::now() < end) {
         std::this_thread::sleep_for(milliseconds(20));
         requests = driverRequests(phone);
     }
+    requests.erase(requests.begin(),
+                   requests.begin() + static_cast<ptrdiff_t>(std::min(seen, requests.size())));
     return requests;
 }
 
@@ -171,35 +176,31 @@ const EffectsOfPhone kPhones[] = {
 };
 // clang-format on
 
-class PhoneWithEffects : public testing::TestWithParam<EffectsOfPhone> {
-  protected:
-    const Phone phone{GetParam().profile};
-};
+class PhoneWithEffects : public testing::TestWithParam<EffectsOfPhone> {};
 
-TEST_P(PhoneWithEffects, PlaysEachAtEachStrengthAndSaysHowLongItLasts) {
+TEST_P(PhoneWithEffects, PlaysFourAtEachStrengthAndRefusesTheRest) {
+    const Phone phone(GetParam().profile);
     ASSERT_EQ(phone.up().status, 0) << phone.up().out << phone.up().err;
-    for (const Played& played : GetParam().effects) {
-        phone.reset();
-        const json answer = phone.call({"std", "perform", played.effect, played.strength});
-        EXPECT_EQ(answer["exception"], 0) << played.effect << " " << played.strength;
-        EXPECT_EQ(answer["result"], played.durationMs) << played.effect << " " << played.strength;
-        EXPECT_THAT(awaitRequests(phone, played.requests.size()), ElementsAreArray(played.requests))
-                << played.effect << " " << played.strength;
-    }
-}
-
-TEST_P(PhoneWithEffects, SupportsFourAndRefusesTheRestWithoutTouchingTheDriver) {
     const json four = json::array({0, 1, 2, 5});
     EXPECT_EQ(phone.call({"std", "getSupportedEffects"})["result"], four);
     EXPECT_EQ(phone.call({"std", "getSupportedAlwaysOnEffects"})["result"], four);
+
     phone.reset();
+    size_t seen = 0;
+    for (const Played& played : GetParam().effects) {
+        const json answer = phone.call({"std", "perform", played.effect, played.strength});
+        EXPECT_EQ(answer["exception"], 0) << played.effect << " " << played.strength;
+        EXPECT_EQ(answer["result"], played.durationMs) << played.effect << " " << played.strength;
+        EXPECT_THAT(awaitRequests(phone, seen, played.requests.size()),
+                    ElementsAreArray(played.requests))
+                << played.effect << " " << played.strength;
+        seen += played.requests.size();
+    }
+
     const std::vector<std::vector<std::string>> refused = {
             {"std", "perform", "THUD", "STRONG"},
             {"std", "perform", "POP", "STRONG"},
-            {"std", "perform", "RINGTONE_1", "STRONG"},
-            {"std", "perform", "TEXTURE_TICK", "STRONG"},
             {"std", "perform", "99", "STRONG"},
-            {"std", "perform", "-1", "STRONG"},
             {"std", "perform", "CLICK", "3"},
             {"std", "perform", "CLICK", "-1"},
             {"std", "perform", "CLICK", "STRONG", "--callback"},
@@ -210,7 +211,7 @@ TEST_P(PhoneWithEffects, SupportsFourAndRefusesTheRestWithoutTouchingTheDriver) 
         EXPECT_EQ(answer["exception"], kUnsupportedOperation) << call[2] << " " << call[3];
         EXPECT_TRUE(answer["result"].is_null()) << call[2] << " " << call[3];
     }
-    EXPECT_THAT(driverRequests(phone), IsEmpty());
+    EXPECT_EQ(driverRequests(phone).size(), seen);
     EXPECT_THAT(phone.log(), HasSubstr("V_2_0: Unsupport vibrator perform effect\n"));
     EXPECT_THAT(phone.log(), HasSubstr("V_2_0: Unsupport vibrator perform strength\n"));
     EXPECT_THAT(phone.log(), HasSubstr("] Not support perform() callback\n"));
@@ -228,10 +229,8 @@ TEST_P(PhoneWithoutEffects, SupportsNoneAndRefusesAllWithoutTouchingTheDriver) {
     EXPECT_EQ(phone.call({"std", "getSupportedAlwaysOnEffects"})["result"], json::array());
     phone.reset();
     for (const char* effect : {"CLICK", "DOUBLE_CLICK", "TICK", "HEAVY_CLICK", "THUD"}) {
-        for (const char* strength : {"LIGHT", "MEDIUM", "STRONG"}) {
-            const json answer = phone.call({"std", "perform", effect, strength});
-            EXPECT_EQ(answer["exception"], kUnsupportedOperation) << effect << " " << strength;
-        }
+        const json answer = phone.call({"std", "perform", effect, "STRONG"});
+        EXPECT_EQ(answer["exception"], kUnsupportedOperation) << effect;
     }
     EXPECT_THAT(driverRequests(phone), IsEmpty());
     EXPECT_THAT(phone.log(), HasSubstr("V_2_0: performEffect PERFORM_NONE\n"));
@@ -282,7 +281,7 @@ TEST(DoubleClickTiming, IsOffThenTenMillisecondsThenFifteenAfterAPause) {
     const Phone phone("legacy-amplitude");
     phone.reset();
     EXPECT_EQ(phone.call({"std", "perform", "DOUBLE_CLICK", "STRONG"})["result"], 95);
-    awaitRequests(phone, 4);
+    awaitRequests(phone, 0, 4);
     const std::vector<TimedWrite> writes = timedWrites(phone);
     ASSERT_EQ(writes.size(), 4U);
     EXPECT_EQ(writes[0].text, "intensity 10000\n");
@@ -300,7 +299,7 @@ TEST(DoubleClickTiming, IsOffThenTenMillisecondsThenFifteenAfterAPause) {
 int64_t answerLeadUs(const Phone& phone) {
     phone.reset();
     const json answer = phone.call({"std", "perform", "DOUBLE_CLICK", "STRONG"});
-    awaitRequests(phone, 8);
+    awaitRequests(phone, 0, 8);
     const std::vector<TimedWrite> writes = timedWrites(phone);
     if (writes.size() != 8 || writes[0].text != "intensity 10000\n" ||
         writes[5].text != "state 1\n" || writes[6].text != "duration 15\n") {
