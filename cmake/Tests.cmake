@@ -72,7 +72,9 @@ function(qvx_add_guest_test name)
              COMMAND ${CMAKE_SOURCE_DIR}/handset/run --build ${CMAKE_BINARY_DIR}
                      --arch ${guest_architecture} --profile ${arg_PROFILE} --timeout ${timeout}
                      -- $<TARGET_FILE:${name}>)
-    # One guest at a time: two would share the machine's cores and stretch every sleep.
+    # One guest at a time of each kind: more would share the machine's cores and stretch every
+    # sleep. They form the longest chain, so they come first, which is what a high cost makes them.
     set_tests_properties(${QVX_TEST_PREFIX}${name} PROPERTIES LABELS guest
-                         RESOURCE_LOCK handset TIMEOUT ${ctest_timeout})
+                         RESOURCE_LOCK handset_${guest_architecture}
+                         TIMEOUT ${ctest_timeout} COST ${timeout})
 endfunction()
