@@ -8,6 +8,7 @@
 #include <fstream>
 #include <sstream>
 
+#include "kernel_log.h"
 #include "phone_control.h"
 
 namespace qvx::test {
@@ -160,6 +161,24 @@ TEST(Doctor, WithTheServiceNotUpLooksAtTheNodesOfItsOwnView) {
               "skipped  user: the service does not run; nodes are judged for user 1000");
     EXPECT_EQ(lineAbout(diagnosis, "nodes"),
               "ok       nodes: user 1000 can open all 25 that the driver has");
+    EXPECT_EQ(lineAbout(diagnosis, "extension"),
+              "skipped  extension: needs the registered service");
+}
+
+TEST(Doctor, DoesNotWaitForAServiceThatHangs) {
+    // Its late answer finds nobody.
+    const ExpectBinderComplaints expected;
+    const Phone phone("leds");
+    const std::string pid = std::to_string(phone.servicePid());
+    ASSERT_EQ(runCommand({"kill", "-STOP", pid}).status, 0);
+    const Diagnosis diagnosis = diagnose(phone);
+    runCommand({"kill", "-CONT", pid});
+    EXPECT_EQ(runCommand({"vibctl", "std", "off"}).status, 0);
+    EXPECT_EQ(diagnosis.status, 1);
+    EXPECT_EQ(lineAbout(diagnosis, "registration"),
+              "bad      registration: process PID has registered "
+              "android.hardware.vibrator.IVibrator/default, but it has not answered for 2 seconds; "
+              "next: look into the service's log for the call that it hangs in, then restart it");
     EXPECT_EQ(lineAbout(diagnosis, "extension"),
               "skipped  extension: needs the registered service");
 }
