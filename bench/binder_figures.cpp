@@ -112,7 +112,9 @@ int main() {
         if (handle && vibrator) {
             const auto request = RequestBytes().token("android.hardware.vibrator.IVibrator").data();
             std::vector<Series> series = {
-                    {"raw ping", [&] { raw.transact(*handle, kPing, {}); }, {}},
+                    {"raw ping",
+                     [&] { raw.transact(*handle, kPing, qvx::test::RequestBytes()); },
+                     {}},
                     {"ping through the library",
                      [&] { AIBinder_ping(vibrator->asBinder().get()); },
                      {}},

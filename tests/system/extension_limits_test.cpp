@@ -170,7 +170,7 @@ class MalformedExtensionRequest : public ExtensionLimits {
         const std::optional<uint32_t> service =
                 binder_.checkService("android.hardware.vibrator.IVibrator/default");
         ASSERT_TRUE(service.has_value());
-        const RawReply reply = binder_.transact(*service, kExtensionTransaction, {});
+        const RawReply reply = binder_.transact(*service, kExtensionTransaction, RequestBytes());
         ASSERT_EQ(reply.handles.size(), 1U);
         extension_ = reply.handles.front();
     }
