@@ -112,9 +112,7 @@ int main() {
         if (handle && vibrator) {
             const auto request = RequestBytes().token("android.hardware.vibrator.IVibrator").data();
             std::vector<Series> series = {
-                    {"raw ping",
-                     [&] { raw.transact(*handle, kPing, qvx::test::RequestBytes()); },
-                     {}},
+                    {"raw ping", [&] { raw.transact(*handle, kPing, RequestBytes()); }, {}},
                     {"ping through the library",
                      [&] { AIBinder_ping(vibrator->asBinder().get()); },
                      {}},
