@@ -12,7 +12,7 @@ import unittest
 from documents import PRELUDE, PROJECT, all_blocks, blocks_of, documents, inline_commands, script
 
 BUILD = pathlib.Path(os.environ["QVX_BUILD"])
-LABELS = {"", "text", "json", "xml", "c", "cpp", "make"}  # of blocks that hold no command
+LABELS = {"", "text", "json", "xml", "c", "cpp", "make", "rc"}  # of blocks that hold no command
 
 # What takes minutes or a person, and what is run in its place: the reason why that is enough.
 INSTEAD = {
