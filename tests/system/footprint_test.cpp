@@ -1,0 +1,85 @@
+// SPDX-License-Identifier: Apache-2.0
+// What the service's process holds: one thread while nothing is under way, and no descriptor but
+// binder, its six streams and the motor's input device.
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <chrono>
+#include <filesystem>
+#include <string>
+#include <thread>
+#include <vector>
+
+#include "phone_control.h"
+
+namespace qvx::test {
+namespace {
+
+using testing::ElementsAre;
+using testing::UnorderedElementsAre;
+
+std::vector<std::string> entriesOf(const Phone& phone, const std::string& folder) {
+    std::vector<std::string> entries;
+    const std::string path = "/proc/" + std::to_string(phone.servicePid()) + "/" + folder;
+    for (const auto& entry : std::filesystem::directory_iterator(path)) {
+        entries.push_back(entry.path().filename());
+    }
+    return entries;
+}
+
+// What the descriptors beyond the three standard ones refer to.
+std::vector<std::string> openFiles(const Phone& phone) {
+    const std::string folder = "/proc/" + std::to_string(phone.servicePid()) + "/fd/";
+    std::vector<std::string> files;
+    for (const std::string& number : entriesOf(phone, "fd")) {
+        if (std::stoi(number) <= 2) continue;
+        files.push_back(std::filesystem::read_symlink(folder + number));
+    }
+    return files;
+}
+
+size_t threadsOf(const Phone& phone) {
+    return entriesOf(phone, "task").size();
+}
+
+TEST(Footprint, OnTheLedClassIsOneThreadBinderAndSixStreams) {
+    const Phone phone("leds");
+    ASSERT_EQ(phone.up().status, 0) << phone.up().err;
+    EXPECT_EQ(threadsOf(phone), 1U);
+    for (const char* effect : {"CLICK", "TICK"}) phone.call({"std", "perform", effect, "STRONG"});
+    phone.call({"std", "on", "500"});
+    phone.call({"ext", "performPlaybackEngine", "false", "0", "5,100,0"});
+    EXPECT_EQ(threadsOf(phone), 1U);
+    EXPECT_THAT(openFiles(phone),
+                UnorderedElementsAre("/dev/binder", "/sys/class/leds/vibrator/asp_enable",
+                                     "/sys/class/leds/vibrator/gpio1_fall_index",
+                                     "/sys/class/leds/vibrator/gpio1_fall_dig_scale",
+                                     "/sys/class/leds/vibrator/gpio1_rise_index",
+                                     "/sys/class/leds/vibrator/gpio1_rise_dig_scale",
+                                     "/sys/class/leds/vibrator/vibe_state"));
+}
+
+TEST(Footprint, OnForceFeedbackIsOneThreadBinderAndTheMotor) {
+    const Phone phone("ff");
+    ASSERT_EQ(phone.up().status, 0) << phone.up().err;
+    EXPECT_THAT(openFiles(phone), ElementsAre("/dev/binder")) << "before the motor's first use";
+    phone.call({"std", "on", "500"});
+    phone.call({"std", "compose", "0,CLICK,1.0"});
+    EXPECT_THAT(openFiles(phone),
+                UnorderedElementsAre("/dev/binder", testing::StartsWith("/dev/input/event")));
+    // The worker of the composition is gone when that is over.
+    for (int i = 0; i < 100 && threadsOf(phone) > 1; ++i) {
+        std::this_thread::sleep_for(std::chrono::milliseconds(20));
+    }
+    EXPECT_EQ(threadsOf(phone), 1U);
+}
+
+TEST(Footprint, WithoutAMotorIsBinderAlone) {
+    const Phone phone("none");
+    phone.call({"std", "on", "500"});
+    EXPECT_THAT(openFiles(phone), ElementsAre("/dev/binder"));
+    EXPECT_EQ(threadsOf(phone), 1U);
+}
+
+}  // namespace
+}  // namespace qvx::test
