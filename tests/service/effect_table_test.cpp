@@ -250,7 +250,8 @@ TEST_P(EffectOnForceFeedback, WhoseUploadFailsIsRefusedWithItsLengthSet) {
 }
 
 TEST_P(EffectOnForceFeedback, WhoseStartFailsIsRefusedWithItsLengthSet) {
-    kernel.addFault({.path = kMotorNode, .operation = Operation::kWrite, .error = ENODEV, .after = 1});
+    kernel.addFault(
+            {.path = kMotorNode, .operation = Operation::kWrite, .error = ENODEV, .after = 1});
     EXPECT_FALSE(play(6700));
     EXPECT_EQ(log.lines().back(), "I HW_API: performPrebakedHapticPattern on fail");
 }

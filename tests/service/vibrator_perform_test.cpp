@@ -206,7 +206,8 @@ TEST_F(PerformOnForceFeedback, EveryStrengthIsAGain) {
 
 TEST_F(PerformOnForceFeedback, UnpluggedMotorIsAnIllegalState) {
     const auto vibrator = makeVibrator();
-    kernel.addFault({.path = kMotorNode, .operation = Operation::kWrite, .error = ENODEV, .times = 0});
+    kernel.addFault(
+            {.path = kMotorNode, .operation = Operation::kWrite, .error = ENODEV, .times = 0});
     int32_t durationMs = 77;
     EXPECT_EQ(exceptionOf(vibrator->perform(Effect::CLICK, EffectStrength::LIGHT, nullptr,
                                             &durationMs)),
