@@ -1,8 +1,11 @@
 # How a test is declared.
 #
-#   qvx_add_unit_test(NAME SOURCES ... LIBRARIES ...)
-#       A GoogleTest program that needs no privileges and no kernel feature: CTest runs each of its
-#       tests on its own, on the host and, in the arm64 build, under user emulation. Label "unit".
+#   qvx_add_unit_test(NAME SOURCES ... LIBRARIES ... [HEADERS ...])
+#       A GoogleTest program that needs no privileges and no kernel feature. In the release build
+#       CTest runs each of its tests on its own; in the others it runs the program, because there
+#       the start of a process costs more than a test. Those of the arm64 build run under user
+#       emulation. HEADERS are compiled ahead for this program alone, where the common ones are too
+#       few. Label "unit".
 #
 #   qvx_add_guest_test(NAME SOURCES ... LIBRARIES ... [PROFILE profile] [TIMEOUT seconds])
 #       A GoogleTest program that runs as root inside the virtual handset, one boot for the whole
@@ -41,12 +44,21 @@ if(NOT TARGET test_headers)
 endif()
 
 function(qvx_add_unit_test name)
-    cmake_parse_arguments(PARSE_ARGV 1 arg "" "" "SOURCES;LIBRARIES")
+    cmake_parse_arguments(PARSE_ARGV 1 arg "" "" "SOURCES;LIBRARIES;HEADERS")
     add_executable(${name} ${arg_SOURCES})
     target_link_libraries(${name} PRIVATE ${arg_LIBRARIES} GTest::gmock GTest::gtest_main)
-    target_precompile_headers(${name} REUSE_FROM test_headers)
+    if(arg_HEADERS)
+        target_precompile_headers(${name} PRIVATE ${arg_HEADERS})
+    else()
+        target_precompile_headers(${name} REUSE_FROM test_headers)
+    endif()
+    if(QVX_TEST_PREFIX)
+        add_test(NAME ${QVX_TEST_PREFIX}${name} COMMAND ${name})
+        set_tests_properties(${QVX_TEST_PREFIX}${name} PROPERTIES LABELS unit TIMEOUT 600)
+        return()
+    endif()
     gtest_discover_tests(${name} DISCOVERY_MODE PRE_TEST DISCOVERY_TIMEOUT 60
-                         TEST_PREFIX "${QVX_TEST_PREFIX}${name}." PROPERTIES LABELS unit TIMEOUT 120)
+                         TEST_PREFIX "${name}." PROPERTIES LABELS unit TIMEOUT 120)
 endfunction()
 
 function(qvx_add_guest_test name)
@@ -72,9 +84,8 @@ function(qvx_add_guest_test name)
              COMMAND ${CMAKE_SOURCE_DIR}/handset/run --build ${CMAKE_BINARY_DIR}
                      --arch ${guest_architecture} --profile ${arg_PROFILE} --timeout ${timeout}
                      -- $<TARGET_FILE:${name}>)
-    # One guest at a time of each kind: more would share the machine's cores and stretch every
-    # sleep. They form the longest chain, so they come first, which is what a high cost makes them.
+    # Each guest is one processor's worth of work, so as many run side by side as CTest is told to run
+    # tests. They form the longest chain and come first, which is what a high cost makes them.
     set_tests_properties(${QVX_TEST_PREFIX}${name} PROPERTIES LABELS guest
-                         RESOURCE_LOCK handset_${guest_architecture}
                          TIMEOUT ${ctest_timeout} COST ${timeout})
 endfunction()
