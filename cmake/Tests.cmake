@@ -22,6 +22,10 @@ set(QVX_GUEST_TESTS "all" CACHE STRING
     "Guest test programs of this build: \"all\", or their names. Emulated Arm is slow, so its build
     runs the whole road of a request, and leaves the rest to the others")
 
+set(QVX_HANDSET_BUILD "${CMAKE_BINARY_DIR}" CACHE PATH
+    "Build whose handset and client the guest tests use. A sanitizer's build takes the release one's,
+    and brings the service and the test programs: what it would add to the others is time")
+
 # What the handset calls the processor this build is for, and how many times as long it is given:
 # emulating Arm takes about three times as long as emulating the machine's own kind.
 if(CMAKE_SYSTEM_PROCESSOR STREQUAL "aarch64")
@@ -75,15 +79,16 @@ function(qvx_add_guest_test name)
     target_link_libraries(${name} PRIVATE ${arg_LIBRARIES} guest_main)
     target_precompile_headers(${name} REUSE_FROM test_headers)
     # Only a build that holds the handset can boot one.
-    if(NOT TARGET handset-agent
+    if(NOT (TARGET handset-agent OR NOT QVX_HANDSET_BUILD STREQUAL CMAKE_BINARY_DIR)
        OR NOT (QVX_GUEST_TESTS STREQUAL "all" OR name IN_LIST QVX_GUEST_TESTS))
         set_target_properties(${name} PROPERTIES EXCLUDE_FROM_ALL ON)
         return()
     endif()
+    set(service $<TARGET_FILE:android.hardware.vibrator-service.quorvan>)
     add_test(NAME ${QVX_TEST_PREFIX}${name}
-             COMMAND ${CMAKE_SOURCE_DIR}/handset/run --build ${CMAKE_BINARY_DIR}
+             COMMAND ${CMAKE_SOURCE_DIR}/handset/run --build ${QVX_HANDSET_BUILD}
                      --arch ${guest_architecture} --profile ${arg_PROFILE} --timeout ${timeout}
-                     -- $<TARGET_FILE:${name}>)
+                     -- env PHONE_SERVICE=${service} $<TARGET_FILE:${name}>)
     # Each guest is one processor's worth of work, so as many run side by side as CTest is told to run
     # tests. They form the longest chain and come first, which is what a high cost makes them.
     set_tests_properties(${QVX_TEST_PREFIX}${name} PROPERTIES LABELS guest

@@ -54,7 +54,8 @@ void addUp(CLI::App& app, std::function<int()>& chosen, UpOptions& options) {
                               [&options] { return phoneUp(options); });
     up->add_option("--profile", options.profile, "which phone: a built-in profile, or a file");
     up->add_option("--out", options.out, "folder for the journal and the logs");
-    up->add_option("--service", options.service, "another build of the service");
+    up->add_option("--service", options.service, "another build of the service")
+            ->envname("PHONE_SERVICE");
     up->add_flag("--no-service", options.noService, "driver and service manager only");
 }
 
