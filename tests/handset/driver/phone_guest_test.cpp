@@ -180,7 +180,10 @@ TEST_F(Phone, AnUnknownProfileGetsTheListOfKnownOnes) {
     EXPECT_EQ(up.status, 2);
     EXPECT_EQ(up.output, "");
     EXPECT_THAT(up.errors, StartsWith("phone: no profile named \"bogus\"; there are "));
-    EXPECT_THAT(up.errors, HasSubstr("ff, leds, legacy, none"));
+    EXPECT_THAT(up.errors,
+                HasSubstr("there are ff, leds, leds-amplitude, leds-haptic-engine, leds-none, "
+                          "leds-prebaked-index, legacy, legacy-amplitude, legacy-haptic-engine, "
+                          "legacy-none, legacy-prebaked-index, none, or give a file's path"));
     EXPECT_EQ(run("phone up --profile ./bogus.json").errors,
               "phone: profile ./bogus.json: No such file or directory\n");
 }
