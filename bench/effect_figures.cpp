@@ -227,10 +227,10 @@ std::optional<uint64_t> readTotal(const std::string& path) {
 bool runUnderValgrind(const std::string& folder, const std::string& dumps) {
     const std::string self = std::filesystem::read_symlink("/proc/self/exe");
     const std::string output = "--callgrind-out-file=" + dumps;
+    // Without --vgdb=no a run that is interrupted leaves valgrind's debugger pipes behind.
     const char* const words[] = {
-            "valgrind",     "-q",         "--tool=callgrind", "--instr-atstart=no",
-            output.c_str(), self.c_str(), "--play",           folder.c_str(),
-            nullptr};
+            "valgrind",     "-q",         "--tool=callgrind", "--vgdb=no",    "--instr-atstart=no",
+            output.c_str(), self.c_str(), "--play",           folder.c_str(), nullptr};
     pid_t process = 0;
     const int error = posix_spawnp(&process, words[0], nullptr, nullptr,
                                    const_cast<char* const*>(words), environ);
