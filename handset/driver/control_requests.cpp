@@ -24,6 +24,7 @@ std::string noSuchNode(std::string_view path) {
 }  // namespace
 
 std::string ControlRequests::answer(std::string_view request) {
+    settle_();
     const size_t blank = request.find(' ');
     const std::string_view verb = request.substr(0, blank);
     const std::string_view argument =
@@ -37,9 +38,10 @@ std::string ControlRequests::answer(std::string_view request) {
         journal_.reset();
     } else if (verb == "stop") {
         stopWanted_ = true;
-    } else {
+    } else if (verb != "settle") {
         return refusal(fmt::format(
-                "unknown request \"{}\"; accepted: fault, clear, reset, get, set, stop", verb));
+                "unknown request \"{}\"; accepted: fault, clear, reset, get, set, settle, stop",
+                verb));
     }
     return std::string(kDone);
 }

@@ -6,13 +6,17 @@
 //   reset              empties the journal; its next line is number 1 again
 //   get PATH           what a read of the node would return now
 //   set PATH "TEXT"    changes a node's text from the driver's side, unseen by the journal
+//   settle             nothing more; see below
 //   stop               ends the driver
 //
+// Whatever is asked, what was done to the nodes before is in the journal first, closes included.
 // The answer is "ok", with "get" followed by the text as a JSON string, or "error MESSAGE".
 #pragma once
 
+#include <functional>
 #include <string>
 #include <string_view>
+#include <utility>
 
 #include "driver/fault_book.h"
 #include "driver/journal.h"
@@ -23,10 +27,15 @@ namespace handset {
 
 class ControlRequests {
   public:
-    /// The references outlive the object.
+    /// The references outlive the object. `settle` returns once the journal has what was done so
+    /// far; it is called before each request.
     ControlRequests(const Profile& profile, const NodeTree& tree, FaultBook& faults,
-                    Journal& journal)
-        : profile_(profile), tree_(tree), faults_(faults), journal_(journal) {}
+                    Journal& journal, std::function<void()> settle)
+        : profile_(profile),
+          tree_(tree),
+          faults_(faults),
+          journal_(journal),
+          settle_(std::move(settle)) {}
 
     /// Does what one request line asks for and returns the answer's line.
     std::string answer(std::string_view request);
@@ -43,6 +52,7 @@ class ControlRequests {
     const NodeTree& tree_;
     FaultBook& faults_;
     Journal& journal_;
+    std::function<void()> settle_;
     bool stopWanted_ = false;
 };
 

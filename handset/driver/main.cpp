@@ -57,6 +57,7 @@ Requests on the control socket, one a line, answered by "ok ..." or "error MESSA
   fault {JSON}      add a fault, as in a profile    clear   forget all faults
   get PATH          what a read of a node returns   reset   empty the journal
   set PATH "TEXT"   change a node's text            stop    end
+  settle            wait until the journal has every close so far
 
 Exit status: 0 stopped, 1 could not start or lost its mount, 2 wrong usage or a wrong profile.)";
 
@@ -148,7 +149,7 @@ int run(const Options& options) {
             SysfsServer::start(tree, faults, **journal, ended.get());
     if (!server) return fail(kFailed, server.error().text);
 
-    ControlRequests requests(*profile, tree, faults, **journal);
+    ControlRequests requests(*profile, tree, faults, **journal, [&] { (*server)->settle(); });
     std::unique_ptr<ControlSocket> control;
     if (!options.control.empty()) {
         auto listening = ControlSocket::listenAt(

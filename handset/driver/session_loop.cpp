@@ -19,6 +19,8 @@ namespace {
 // among others.
 constexpr size_t kMostWorkers = 64;
 
+constexpr std::chrono::milliseconds kSettlePause{1};
+
 bool isRelease(const fuse_buf& buffer) {
     fuse_in_header header;
     if (buffer.size < sizeof header) return false;
@@ -72,13 +74,14 @@ void SessionLoop::work() {
 bool SessionLoop::takeRequest(fuse_buf& buffer) {
     const std::lock_guard lock(taking_);
     while (waitForRequest()) {
+        releasing_ = true;  // before the request leaves the kernel's queue; see isSettled
         const int size = fuse_session_receive_buf(session_, &buffer);
+        const bool release = size > 0 && isRelease(buffer);
+        if (release) fuse_session_process_buf(session_, &buffer);
+        releasing_ = false;
         if (size == -EAGAIN || size == -EINTR) continue;
         if (size <= 0) break;
-        if (isRelease(buffer)) {
-            fuse_session_process_buf(session_, &buffer);
-            continue;
-        }
+        if (release) continue;
         if (--idle_ == 0) addWorker();
         return true;
     }
@@ -92,6 +95,20 @@ bool SessionLoop::waitForRequest() const {
         if (errno != EINTR) return false;
     }
     return polled[1].revents == 0 && !fuse_session_exited(session_);
+}
+
+void SessionLoop::settle(std::chrono::milliseconds patience) const {
+    const auto end = std::chrono::steady_clock::now() + patience;
+    while (!isSettled() && std::chrono::steady_clock::now() < end) {
+        std::this_thread::sleep_for(kSettlePause);
+    }
+}
+
+// A release is in the kernel's queue, or being served, or done: the queue is looked at first, as
+// what has left it unserved has set the mark before it left.
+bool SessionLoop::isSettled() const {
+    pollfd queue{device_, POLLIN, 0};
+    return poll(&queue, 1, 0) == 0 && !releasing_;
 }
 
 }  // namespace handset

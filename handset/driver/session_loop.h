@@ -9,6 +9,7 @@
 #include <fuse_lowlevel.h>
 
 #include <atomic>
+#include <chrono>
 #include <mutex>
 #include <thread>
 #include <vector>
@@ -30,11 +31,17 @@ class SessionLoop {
     /// Stops serving and waits for the threads; what they are busy with is finished first.
     ~SessionLoop();
 
+    /// Waits until the files closed so far have been released: a close may return before the
+    /// driver is told of it. Gives up after `patience`, as callers that are kept waiting may have
+    /// brought the serving to a halt.
+    void settle(std::chrono::milliseconds patience) const;
+
   private:
     void addWorker();
     void work();
     bool takeRequest(fuse_buf& buffer);
     bool waitForRequest() const;
+    bool isSettled() const;
 
     fuse_session* session_;
     int device_;
@@ -42,6 +49,7 @@ class SessionLoop {
     UniqueFd stop_;
 
     std::mutex taking_;  ///< held by the one thread that talks to the kernel
+    std::atomic<bool> releasing_{false};
     std::atomic<int> idle_{0};
     std::atomic<bool> finished_{false};
 

@@ -35,6 +35,8 @@ constexpr off_t kNodeSize = 4096;
 
 constexpr mode_t kFolderMode = 0755;
 
+constexpr std::chrono::seconds kSettlePatience{1};
+
 struct OpenNode {
     OpenNode(Node& opened, Opener by) : node(opened), opener(by) {}
 
@@ -388,7 +390,12 @@ Result<std::unique_ptr<SysfsServer>> SysfsServer::start(const NodeTree& tree, Fa
     return server;
 }
 
+void SysfsServer::settle() const {
+    loop_->settle(kSettlePatience);
+}
+
 SysfsServer::~SysfsServer() {
+    if (loop_) settle();
     if (state_) state_->stopping = true;
     if (mounted_) umount2(std::string(kSysfsRoot).c_str(), MNT_DETACH);
     loop_.reset();

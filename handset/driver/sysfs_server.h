@@ -37,6 +37,9 @@ class SysfsServer {
     /// fail with ENOTCONN from then on.
     ~SysfsServer();
 
+    /// Waits until the journal has the close of every file closed so far, a second at most.
+    void settle() const;
+
     SysfsServer(const SysfsServer&) = delete;
     SysfsServer& operator=(const SysfsServer&) = delete;
 

@@ -157,6 +157,8 @@ int phoneNode(const std::string& path, const std::optional<std::string>& text) {
 }
 
 int phonePrintJournal(const std::string& out) {
+    // A phone that is down has settled; one that does not answer still has a journal.
+    if (phoneThatIsUp()) (void)askDriver(kControlSocket, "settle");
     return printFile(outFolder(out) + "/journal.jsonl");
 }
 

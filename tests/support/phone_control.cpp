@@ -1,11 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "phone_control.h"
 
-#include <chrono>
 #include <filesystem>
 #include <fstream>
 #include <sstream>
-#include <thread>
 
 namespace qvx::test {
 namespace {
@@ -47,21 +45,11 @@ nlohmann::json Phone::call(const std::vector<std::string>& words) const {
 
 std::vector<nlohmann::json> Phone::journal() const {
     std::vector<nlohmann::json> lines;
-    std::ifstream file(out_ + "/journal.jsonl");
-    for (std::string line; std::getline(file, line);) {
+    std::istringstream text(runCommand({"phone", "journal"}).out);
+    for (std::string line; std::getline(text, line);) {
         lines.push_back(nlohmann::json::parse(line, nullptr, false));
     }
     return lines;
-}
-
-std::vector<nlohmann::json> Phone::awaitJournal(size_t lines) const {
-    const auto end = std::chrono::steady_clock::now() + std::chrono::seconds(5);
-    std::vector<nlohmann::json> entries = journal();
-    while (entries.size() < lines && std::chrono::steady_clock::now() < end) {
-        std::this_thread::sleep_for(std::chrono::milliseconds(10));
-        entries = journal();
-    }
-    return entries;
 }
 
 std::vector<std::string> Phone::writes() const {

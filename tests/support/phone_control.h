@@ -30,10 +30,6 @@ class Phone {
     // The journal's lines, in order.
     std::vector<nlohmann::json> journal() const;
 
-    // The same once there are at least so many lines, or after five seconds: the kernel tells the
-    // driver of a close when it gets to it, which may be after the answer to the call.
-    std::vector<nlohmann::json> awaitJournal(size_t lines) const;
-
     // The journal's writes as "LEAF DATA", for example "duration 500\n".
     std::vector<std::string> writes() const;
 

@@ -74,7 +74,7 @@ TEST(LedsPhone, EachNodeIsOpenedReadWriteAndClosed) {
     const Phone phone("leds");
     phone.reset();
     phone.call({"std", "off"});
-    const std::vector<json> journal = phone.awaitJournal(3);
+    const std::vector<json> journal = phone.journal();
     ASSERT_EQ(journal.size(), 3U);
     EXPECT_EQ(journal[0]["op"], "open");
     EXPECT_EQ(journal[0]["flags"], "O_RDWR");

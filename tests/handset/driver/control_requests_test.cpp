@@ -2,9 +2,11 @@
 // What a running driver answers.
 #include "driver/control_requests.h"
 
+#include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
 #include <cerrno>
+#include <functional>
 #include <memory>
 
 #include "driver/profile_reader.h"
@@ -27,7 +29,8 @@ class Requests : public testing::Test {
     NodeTree tree_{"/sys/class", profile_.nodes};
     FaultBook faults_;
     std::unique_ptr<Journal> journal_ = std::move(*Journal::create(folder_.file("journal")));
-    ControlRequests requests_{profile_, tree_, faults_, *journal_};
+    std::function<void()> late_ = [] {};
+    ControlRequests requests_{profile_, tree_, faults_, *journal_, [this] { late_(); }};
 };
 
 TEST_F(Requests, FaultTakesEffectAtOnce) {
@@ -73,6 +76,15 @@ TEST_F(Requests, ResetEmptiesTheJournal) {
     EXPECT_EQ(contentOf(folder_.file("journal")), "");
 }
 
+TEST_F(Requests, TheJournalIsUpToDateFirst) {
+    journal_->record({1, 0}, JournalLine("open"));
+    late_ = [this] { journal_->record({1, 0}, JournalLine("close")); };
+    EXPECT_EQ(answer("settle"), "ok");
+    EXPECT_THAT(contentOf(folder_.file("journal")), testing::HasSubstr("\"op\":\"close\""));
+    EXPECT_EQ(answer("reset"), "ok");
+    EXPECT_EQ(contentOf(folder_.file("journal")), "");
+}
+
 TEST_F(Requests, StopIsRemembered) {
     EXPECT_FALSE(requests_.isStopWanted());
     EXPECT_EQ(answer("stop"), "ok");
@@ -81,9 +93,10 @@ TEST_F(Requests, StopIsRemembered) {
 
 TEST_F(Requests, AnythingElseIsRefused) {
     EXPECT_EQ(answer("halt"),
-              "error unknown request \"halt\"; accepted: fault, clear, reset, get, set, stop");
+              "error unknown request \"halt\"; accepted: fault, clear, reset, get, set, settle, "
+              "stop");
     EXPECT_EQ(answer(""),
-              "error unknown request \"\"; accepted: fault, clear, reset, get, set, stop");
+              "error unknown request \"\"; accepted: fault, clear, reset, get, set, settle, stop");
     EXPECT_FALSE(requests_.isStopWanted());
 }
 

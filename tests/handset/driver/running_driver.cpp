@@ -56,6 +56,11 @@ std::string RunningDriver::ask(const std::string& request) const {
     return answer ? "ok " + *answer : "error " + answer.error().text;
 }
 
+std::string RunningDriver::rawJournal() const {
+    ask("settle");
+    return contentOf(folder_.file("journal"));
+}
+
 std::vector<std::string> RunningDriver::journal() const {
     std::istringstream text(std::regex_replace(
             rawJournal(), std::regex("\"n\":[0-9]+,\"us\":[0-9]+,\"pid\":[0-9]+,"), ""));

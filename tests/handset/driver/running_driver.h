@@ -39,8 +39,8 @@ class RunningDriver {
     /// The journal, with each line's n, us and pid left out.
     std::vector<std::string> journal() const;
 
-    /// The journal as it stands.
-    std::string rawJournal() const { return contentOf(folder_.file("journal")); }
+    /// The journal once it has what was done so far.
+    std::string rawJournal() const;
 
     /// Runs `work` in a process of its own that sees the driver's mounts, as runAs() does.
     std::string inside(uid_t user, const std::function<std::string()>& work) const {
