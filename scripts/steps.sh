@@ -1,28 +1,50 @@
-# Shared by ./check and ./demo: runs a step, names it, and shows its output only when it fails or
-# when it takes long enough that someone would wonder.
+# Shared by the project's commands: runs a step, names it, and shows its output only when it fails or
+# when it takes long enough that someone would wonder. Whatever a command starts ends with it.
+
+# in_group COMMAND...: starts a command in the background as a process group of its own, its id in
+# $group, so that end_group reaches what it has started in turn.
+in_group() {
+    set -m
+    "$@" </dev/null &
+    group=$!
+    set +m
+}
+
+end_group() {
+    kill -TERM -- "-$group" 2>/dev/null || true
+    wait "$group" 2>/dev/null || true
+}
+
+# whole COMMAND...: runs a command whose output is shown as it comes; its status is the function's.
+whole() {
+    local status=0
+    in_group "$@"
+    trap 'end_group; exit 130' INT TERM HUP
+    wait "$group" || status=$?
+    trap - INT TERM HUP
+    return "$status"
+}
 
 # step NAME COMMAND...
 step() {
-    local name=$1 log started status=0 pid shown=0
+    local name=$1 log started status=0 shown=0
     shift
     log=$(mktemp)
-    # shellcheck disable=SC2064
-    trap "rm -f '$log'" EXIT
     started=$SECONDS
     printf -- '-- %s' "$name"
-    "$@" >"$log" 2>&1 &
-    pid=$!
+    in_group "$@" >"$log" 2>&1
     # shellcheck disable=SC2064
-    trap "kill $pid 2>/dev/null; wait $pid 2>/dev/null; rm -f '$log'; exit 130" INT TERM
-    while kill -0 "$pid" 2>/dev/null; do
+    trap "rm -f '$log'" EXIT
+    trap 'end_group; exit 130' INT TERM HUP
+    while kill -0 "$group" 2>/dev/null; do
         sleep 0.1
         if ((SECONDS - started >= shown + 5)); then
             shown=$((SECONDS - started))
             step_progress "$log"
         fi
     done
-    wait "$pid" || status=$?
-    trap - INT TERM EXIT
+    wait "$group" || status=$?
+    trap - INT TERM HUP EXIT
     if ((status != 0)); then
         printf ': failed after %d s\n' $((SECONDS - started))
         tail -n 60 "$log" >&2
