@@ -7,12 +7,15 @@
 #       emulation. HEADERS are compiled ahead for this program alone, where the common ones are too
 #       few. Label "unit".
 #
-#   qvx_add_guest_test(NAME SOURCES ... LIBRARIES ... [PROFILE profile] [TIMEOUT seconds])
+#   qvx_add_guest_test(NAME SOURCES ... LIBRARIES ... [PROFILE profile] [TIMEOUT seconds]
+#                      [FROM_OUTSIDE])
 #       A GoogleTest program that runs as root inside the virtual handset, one boot for the whole
 #       program, which ends with a check that the kernel log holds no complaint about binder. The
 #       default profile is "off": the tests bring phones up themselves. The guest is of the build's
 #       own architecture. Label "guest". A build without the handset, or one that QVX_GUEST_TESTS
-#       keeps from running the program, leaves it out of "all".
+#       keeps from running the program, leaves it out of "all". FROM_OUTSIDE: the program looks at
+#       the service through binder and the journal alone, so a build that takes another one's handset
+#       takes the program from there too.
 
 find_package(GTest REQUIRED)
 find_package(nlohmann_json REQUIRED)
@@ -24,7 +27,7 @@ set(QVX_GUEST_TESTS "all" CACHE STRING
 
 set(QVX_HANDSET_BUILD "${CMAKE_BINARY_DIR}" CACHE PATH
     "Build whose handset and client the guest tests use. A sanitizer's build takes the release one's,
-    and brings the service and the test programs: what it would add to the others is time")
+    and brings the service and what links its library: what it would add to the others is time")
 
 # What the handset calls the processor this build is for, and how many times as long it is given:
 # emulating Arm takes about three times as long as emulating the machine's own kind.
@@ -66,7 +69,7 @@ function(qvx_add_unit_test name)
 endfunction()
 
 function(qvx_add_guest_test name)
-    cmake_parse_arguments(PARSE_ARGV 1 arg "" "PROFILE;TIMEOUT" "SOURCES;LIBRARIES")
+    cmake_parse_arguments(PARSE_ARGV 1 arg "FROM_OUTSIDE" "PROFILE;TIMEOUT" "SOURCES;LIBRARIES")
     if(NOT arg_PROFILE)
         set(arg_PROFILE off)
     endif()
@@ -84,11 +87,16 @@ function(qvx_add_guest_test name)
         set_target_properties(${name} PROPERTIES EXCLUDE_FROM_ALL ON)
         return()
     endif()
+    set(program $<TARGET_FILE:${name}>)
+    if(arg_FROM_OUTSIDE AND NOT QVX_HANDSET_BUILD STREQUAL CMAKE_BINARY_DIR)
+        set(program ${QVX_HANDSET_BUILD}/bin/${name})
+        set_target_properties(${name} PROPERTIES EXCLUDE_FROM_ALL ON)
+    endif()
     set(service $<TARGET_FILE:android.hardware.vibrator-service.quorvan>)
     add_test(NAME ${QVX_TEST_PREFIX}${name}
              COMMAND ${CMAKE_SOURCE_DIR}/handset/run --build ${QVX_HANDSET_BUILD}
                      --arch ${guest_architecture} --profile ${arg_PROFILE} --timeout ${timeout}
-                     -- env PHONE_SERVICE=${service} $<TARGET_FILE:${name}>)
+                     -- env PHONE_SERVICE=${service} ${program})
     # Each guest is one processor's worth of work, so as many run side by side as CTest is told to run
     # tests. They form the longest chain and come first, which is what a high cost makes them.
     set_tests_properties(${QVX_TEST_PREFIX}${name} PROPERTIES LABELS guest

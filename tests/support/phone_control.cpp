@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "phone_control.h"
 
+#include <cstdlib>
 #include <filesystem>
 #include <fstream>
 #include <sstream>
@@ -84,6 +85,12 @@ int Phone::servicePid() const {
         }
     }
     return 0;
+}
+
+CommandResult Phone::startService(const std::string& user) const {
+    const char* service = getenv("PHONE_SERVICE");
+    if (service == nullptr) return {};
+    return runCommand({"phone", "exec", "--user", user, "--", service});
 }
 
 nlohmann::json builtInProfile(const std::string& name) {

@@ -45,6 +45,9 @@ class Phone {
     // The service's process id; 0 when it does not run.
     int servicePid() const;
 
+    // Starts the service once more, as `user`, and waits for its end.
+    CommandResult startService(const std::string& user) const;
+
   private:
     std::string out_;
     CommandResult up_;

@@ -19,12 +19,6 @@ constexpr const char* kRefused =
         "instance.c_str())";
 constexpr const char* kManifestFolder = "/vendor/etc/vintf/manifest";
 
-// Starts a second copy of the service on a phone that is up and waits for its end.
-CommandResult startSecondService(const std::string& user) {
-    return runCommand({"phone", "exec", "--user", user, "--",
-                       QVX_BIN_FOLDER "/android.hardware.vibrator-service.quorvan"});
-}
-
 TEST(Registration, StandardServiceIsFoundUnderItsDescriptorAndDefault) {
     const Phone phone("leds");
     ASSERT_EQ(phone.up().status, 0) << phone.up().out << phone.up().err;
@@ -35,7 +29,7 @@ TEST(Registration, StandardServiceIsFoundUnderItsDescriptorAndDefault) {
 
 TEST(Registration, ByAnApplicationUserIsRefusedAndAborts) {
     const Phone phone("none", {"--no-service"});
-    const CommandResult second = startSecondService("10123");
+    const CommandResult second = phone.startService("10123");
     EXPECT_EQ(second.status, kAborted);
     EXPECT_THAT(second.err, HasSubstr(kRefused));
 }
@@ -45,7 +39,7 @@ TEST(Registration, UndeclaredServiceIsRefusedAndAborts) {
     for (const auto& fragment : std::filesystem::directory_iterator(kManifestFolder)) {
         std::filesystem::remove(fragment);
     }
-    const CommandResult second = startSecondService("1000");
+    const CommandResult second = phone.startService("1000");
     EXPECT_EQ(second.status, kAborted);
     EXPECT_THAT(second.err, HasSubstr(kRefused));
 }

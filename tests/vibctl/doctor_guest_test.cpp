@@ -255,9 +255,7 @@ TEST_P(Fragment, ThatIsWrongKeepsTheServiceFromRegistering) {
     ASSERT_NE(at, std::string::npos) << fragment;
     std::ofstream(kFragment) << fragment.replace(at, from.size(), GetParam().to);
 
-    const CommandResult service =
-            runCommand({"phone", "exec", "--user", "1000", "--",
-                        QVX_BIN_FOLDER "/android.hardware.vibrator-service.quorvan"});
+    const CommandResult service = phone.startService("1000");
     EXPECT_EQ(service.status, 128 + 6 /* SIGABRT */);
     EXPECT_THAT(service.err, HasSubstr("Check failed: STATUS_OK == AServiceManager_addService("));
     const Diagnosis diagnosis = diagnose(phone);
