@@ -328,154 +328,82 @@ binder_status_t AParcel_resizeVector(const AParcel* parcel, std::optional<std::v
     return STATUS_OK;
 }
 
-inline binder_status_t AParcel_writeVector(AParcel* parcel, const std::vector<int32_t>& vec) {
-    return ::AParcel_writeInt32Array(parcel, vec.data(), internal::lengthOf(vec));
-}
-inline binder_status_t AParcel_writeVector(AParcel* parcel,
-                                           const std::optional<std::vector<int32_t>>& vec) {
-    return vec.has_value() ? AParcel_writeVector(parcel, *vec)
-                           : ::AParcel_writeInt32Array(parcel, nullptr, -1);
-}
-inline binder_status_t AParcel_readVector(const AParcel* parcel, std::vector<int32_t>* vec) {
-    return ::AParcel_readInt32Array(parcel, vec, AParcel_stdVectorAllocator<int32_t>);
-}
-inline binder_status_t AParcel_readVector(const AParcel* parcel,
-                                          std::optional<std::vector<int32_t>>* vec) {
-    return ::AParcel_readInt32Array(parcel, vec, AParcel_nullableStdVectorAllocator<int32_t>);
-}
-
-inline binder_status_t AParcel_writeVector(AParcel* parcel, const std::vector<uint32_t>& vec) {
-    return ::AParcel_writeUint32Array(parcel, vec.data(), internal::lengthOf(vec));
-}
-inline binder_status_t AParcel_writeVector(AParcel* parcel,
-                                           const std::optional<std::vector<uint32_t>>& vec) {
-    return vec.has_value() ? AParcel_writeVector(parcel, *vec)
-                           : ::AParcel_writeUint32Array(parcel, nullptr, -1);
-}
-inline binder_status_t AParcel_readVector(const AParcel* parcel, std::vector<uint32_t>* vec) {
-    return ::AParcel_readUint32Array(parcel, vec, AParcel_stdVectorAllocator<uint32_t>);
-}
-inline binder_status_t AParcel_readVector(const AParcel* parcel,
-                                          std::optional<std::vector<uint32_t>>* vec) {
-    return ::AParcel_readUint32Array(parcel, vec, AParcel_nullableStdVectorAllocator<uint32_t>);
-}
-
-inline binder_status_t AParcel_writeVector(AParcel* parcel, const std::vector<int64_t>& vec) {
-    return ::AParcel_writeInt64Array(parcel, vec.data(), internal::lengthOf(vec));
-}
-inline binder_status_t AParcel_writeVector(AParcel* parcel,
-                                           const std::optional<std::vector<int64_t>>& vec) {
-    return vec.has_value() ? AParcel_writeVector(parcel, *vec)
-                           : ::AParcel_writeInt64Array(parcel, nullptr, -1);
-}
-inline binder_status_t AParcel_readVector(const AParcel* parcel, std::vector<int64_t>* vec) {
-    return ::AParcel_readInt64Array(parcel, vec, AParcel_stdVectorAllocator<int64_t>);
-}
-inline binder_status_t AParcel_readVector(const AParcel* parcel,
-                                          std::optional<std::vector<int64_t>>* vec) {
-    return ::AParcel_readInt64Array(parcel, vec, AParcel_nullableStdVectorAllocator<int64_t>);
-}
-
-inline binder_status_t AParcel_writeVector(AParcel* parcel, const std::vector<uint64_t>& vec) {
-    return ::AParcel_writeUint64Array(parcel, vec.data(), internal::lengthOf(vec));
-}
-inline binder_status_t AParcel_writeVector(AParcel* parcel,
-                                           const std::optional<std::vector<uint64_t>>& vec) {
-    return vec.has_value() ? AParcel_writeVector(parcel, *vec)
-                           : ::AParcel_writeUint64Array(parcel, nullptr, -1);
-}
-inline binder_status_t AParcel_readVector(const AParcel* parcel, std::vector<uint64_t>* vec) {
-    return ::AParcel_readUint64Array(parcel, vec, AParcel_stdVectorAllocator<uint64_t>);
-}
-inline binder_status_t AParcel_readVector(const AParcel* parcel,
-                                          std::optional<std::vector<uint64_t>>* vec) {
-    return ::AParcel_readUint64Array(parcel, vec, AParcel_nullableStdVectorAllocator<uint64_t>);
-}
-
-inline binder_status_t AParcel_writeVector(AParcel* parcel, const std::vector<float>& vec) {
-    return ::AParcel_writeFloatArray(parcel, vec.data(), internal::lengthOf(vec));
-}
-inline binder_status_t AParcel_writeVector(AParcel* parcel,
-                                           const std::optional<std::vector<float>>& vec) {
-    return vec.has_value() ? AParcel_writeVector(parcel, *vec)
-                           : ::AParcel_writeFloatArray(parcel, nullptr, -1);
-}
-inline binder_status_t AParcel_readVector(const AParcel* parcel, std::vector<float>* vec) {
-    return ::AParcel_readFloatArray(parcel, vec, AParcel_stdVectorAllocator<float>);
-}
-inline binder_status_t AParcel_readVector(const AParcel* parcel,
-                                          std::optional<std::vector<float>>* vec) {
-    return ::AParcel_readFloatArray(parcel, vec, AParcel_nullableStdVectorAllocator<float>);
-}
-
-inline binder_status_t AParcel_writeVector(AParcel* parcel, const std::vector<double>& vec) {
-    return ::AParcel_writeDoubleArray(parcel, vec.data(), internal::lengthOf(vec));
-}
-inline binder_status_t AParcel_writeVector(AParcel* parcel,
-                                           const std::optional<std::vector<double>>& vec) {
-    return vec.has_value() ? AParcel_writeVector(parcel, *vec)
-                           : ::AParcel_writeDoubleArray(parcel, nullptr, -1);
-}
-inline binder_status_t AParcel_readVector(const AParcel* parcel, std::vector<double>* vec) {
-    return ::AParcel_readDoubleArray(parcel, vec, AParcel_stdVectorAllocator<double>);
-}
-inline binder_status_t AParcel_readVector(const AParcel* parcel,
-                                          std::optional<std::vector<double>>* vec) {
-    return ::AParcel_readDoubleArray(parcel, vec, AParcel_nullableStdVectorAllocator<double>);
-}
-
-inline binder_status_t AParcel_writeVector(AParcel* parcel, const std::vector<char16_t>& vec) {
-    return ::AParcel_writeCharArray(parcel, vec.data(), internal::lengthOf(vec));
-}
-inline binder_status_t AParcel_writeVector(AParcel* parcel,
-                                           const std::optional<std::vector<char16_t>>& vec) {
-    return vec.has_value() ? AParcel_writeVector(parcel, *vec)
-                           : ::AParcel_writeCharArray(parcel, nullptr, -1);
-}
-inline binder_status_t AParcel_readVector(const AParcel* parcel, std::vector<char16_t>* vec) {
-    return ::AParcel_readCharArray(parcel, vec, AParcel_stdVectorAllocator<char16_t>);
-}
-inline binder_status_t AParcel_readVector(const AParcel* parcel,
-                                          std::optional<std::vector<char16_t>>* vec) {
-    return ::AParcel_readCharArray(parcel, vec, AParcel_nullableStdVectorAllocator<char16_t>);
-}
-
-// Bytes are unsigned in lists although a single one is signed.
+// Numbers, bytes, characters and enumerations: lists the parcel takes in one piece.
 
 namespace internal {
 
-inline bool byteVectorAllocator(void* vectorData, int32_t length, int8_t** outBuffer) {
-    uint8_t* bytes = nullptr;
-    if (!AParcel_stdVectorAllocator<uint8_t>(vectorData, length, &bytes)) return false;
-    *outBuffer = reinterpret_cast<int8_t*>(bytes);
+/** A list whose elements are a Wire each in the parcel, and its C functions. */
+template <typename Wire, auto Write, auto Read>
+struct PackedAs : std::true_type {
+    using WireType = Wire;
+    static constexpr auto write = Write;
+    static constexpr auto read = Read;
+};
+
+/** How a list of T is packed; false where its elements are written one by one. */
+template <typename T, typename = void>
+struct Packed : std::false_type {};
+
+// clang-format off
+template <> struct Packed<int8_t>   : PackedAs<int8_t,   AParcel_writeByteArray,   AParcel_readByteArray> {};
+template <> struct Packed<uint8_t>  : PackedAs<int8_t,   AParcel_writeByteArray,   AParcel_readByteArray> {};
+template <> struct Packed<char16_t> : PackedAs<char16_t, AParcel_writeCharArray,   AParcel_readCharArray> {};
+template <> struct Packed<int32_t>  : PackedAs<int32_t,  AParcel_writeInt32Array,  AParcel_readInt32Array> {};
+template <> struct Packed<uint32_t> : PackedAs<uint32_t, AParcel_writeUint32Array, AParcel_readUint32Array> {};
+template <> struct Packed<int64_t>  : PackedAs<int64_t,  AParcel_writeInt64Array,  AParcel_readInt64Array> {};
+template <> struct Packed<uint64_t> : PackedAs<uint64_t, AParcel_writeUint64Array, AParcel_readUint64Array> {};
+template <> struct Packed<float>    : PackedAs<float,    AParcel_writeFloatArray,  AParcel_readFloatArray> {};
+template <> struct Packed<double>   : PackedAs<double,   AParcel_writeDoubleArray, AParcel_readDoubleArray> {};
+// clang-format on
+
+/** Enumerations travel as lists of their backing type. */
+template <typename E>
+struct Packed<E, std::enable_if_t<std::is_enum_v<E>>> : Packed<std::underlying_type_t<E>> {};
+
+template <typename T, bool IsPacked = true>
+using IfPacked = std::enable_if_t<Packed<T>::value == IsPacked, bool>;
+
+template <typename T>
+using WireType = typename Packed<T>::WireType;
+
+template <typename T>
+bool packedAllocator(void* vectorData, int32_t length, WireType<T>** outBuffer) {
+    T* values = nullptr;
+    if (!AParcel_stdVectorAllocator<T>(vectorData, length, &values)) return false;
+    *outBuffer = reinterpret_cast<WireType<T>*>(values);
     return true;
 }
 
-inline bool nullableByteVectorAllocator(void* vectorData, int32_t length, int8_t** outBuffer) {
-    uint8_t* bytes = nullptr;
-    if (!AParcel_nullableStdVectorAllocator<uint8_t>(vectorData, length, &bytes)) return false;
-    if (bytes != nullptr) *outBuffer = reinterpret_cast<int8_t*>(bytes);
+template <typename T>
+bool nullablePackedAllocator(void* vectorData, int32_t length, WireType<T>** outBuffer) {
+    T* values = nullptr;
+    if (!AParcel_nullableStdVectorAllocator<T>(vectorData, length, &values)) return false;
+    *outBuffer = reinterpret_cast<WireType<T>*>(values);
     return true;
 }
 
 }  // namespace internal
 
-inline binder_status_t AParcel_writeVector(AParcel* parcel, const std::vector<uint8_t>& vec) {
-    return ::AParcel_writeByteArray(parcel, reinterpret_cast<const int8_t*>(vec.data()),
-                                    internal::lengthOf(vec));
+template <typename T, internal::IfPacked<T> = true>
+binder_status_t AParcel_writeVector(AParcel* parcel, const std::vector<T>& vec) {
+    const auto* values = reinterpret_cast<const internal::WireType<T>*>(vec.data());
+    return internal::Packed<T>::write(parcel, values, internal::lengthOf(vec));
 }
-inline binder_status_t AParcel_writeVector(AParcel* parcel,
-                                           const std::optional<std::vector<uint8_t>>& vec) {
+template <typename T, internal::IfPacked<T> = true>
+binder_status_t AParcel_writeVector(AParcel* parcel, const std::optional<std::vector<T>>& vec) {
     return vec.has_value() ? AParcel_writeVector(parcel, *vec)
-                           : ::AParcel_writeByteArray(parcel, nullptr, -1);
+                           : internal::Packed<T>::write(parcel, nullptr, -1);
 }
-inline binder_status_t AParcel_readVector(const AParcel* parcel, std::vector<uint8_t>* vec) {
-    return ::AParcel_readByteArray(parcel, vec, internal::byteVectorAllocator);
+template <typename T, internal::IfPacked<T> = true>
+binder_status_t AParcel_readVector(const AParcel* parcel, std::vector<T>* vec) {
+    return internal::Packed<T>::read(parcel, vec, internal::packedAllocator<T>);
 }
-inline binder_status_t AParcel_readVector(const AParcel* parcel,
-                                          std::optional<std::vector<uint8_t>>* vec) {
-    return ::AParcel_readByteArray(parcel, vec, internal::nullableByteVectorAllocator);
+template <typename T, internal::IfPacked<T> = true>
+binder_status_t AParcel_readVector(const AParcel* parcel, std::optional<std::vector<T>>* vec) {
+    return internal::Packed<T>::read(parcel, vec, internal::nullablePackedAllocator<T>);
 }
+
+// Truths and texts.
 
 inline binder_status_t AParcel_writeVector(AParcel* parcel, const std::vector<bool>& vec) {
     return ::AParcel_writeBoolArray(parcel, &vec, internal::lengthOf(vec),
@@ -514,77 +442,6 @@ inline binder_status_t AParcel_readVector(
         const AParcel* parcel, std::optional<std::vector<std::optional<std::string>>>* vec) {
     return ::AParcel_readStringArray(parcel, vec, AParcel_nullableStdVectorStringAllocator,
                                      AParcel_nullableStdVectorStringElementAllocator);
-}
-
-// Enumerations travel as lists of their backing type: int8_t, int32_t or int64_t.
-
-namespace internal {
-
-template <typename B>
-binder_status_t writeBackingArray(AParcel* parcel, const B* values, int32_t length) {
-    if constexpr (std::is_same_v<B, int8_t>) {
-        return ::AParcel_writeByteArray(parcel, values, length);
-    } else if constexpr (std::is_same_v<B, int32_t>) {
-        return ::AParcel_writeInt32Array(parcel, values, length);
-    } else {
-        static_assert(std::is_same_v<B, int64_t>, "enumerations are backed by byte, int or long");
-        return ::AParcel_writeInt64Array(parcel, values, length);
-    }
-}
-
-template <typename B>
-binder_status_t readBackingArray(const AParcel* parcel, void* arrayData,
-                                 bool (*allocator)(void*, int32_t, B**)) {
-    if constexpr (std::is_same_v<B, int8_t>) {
-        return ::AParcel_readByteArray(parcel, arrayData, allocator);
-    } else if constexpr (std::is_same_v<B, int32_t>) {
-        return ::AParcel_readInt32Array(parcel, arrayData, allocator);
-    } else {
-        static_assert(std::is_same_v<B, int64_t>, "enumerations are backed by byte, int or long");
-        return ::AParcel_readInt64Array(parcel, arrayData, allocator);
-    }
-}
-
-template <typename E>
-bool enumVectorAllocator(void* vectorData, int32_t length, std::underlying_type_t<E>** outBuffer) {
-    E* values = nullptr;
-    if (!AParcel_stdVectorAllocator<E>(vectorData, length, &values)) return false;
-    *outBuffer = reinterpret_cast<std::underlying_type_t<E>*>(values);
-    return true;
-}
-
-template <typename E>
-bool nullableEnumVectorAllocator(void* vectorData, int32_t length,
-                                 std::underlying_type_t<E>** outBuffer) {
-    E* values = nullptr;
-    if (!AParcel_nullableStdVectorAllocator<E>(vectorData, length, &values)) return false;
-    if (values != nullptr) *outBuffer = reinterpret_cast<std::underlying_type_t<E>*>(values);
-    return true;
-}
-
-}  // namespace internal
-
-template <typename E, std::enable_if_t<std::is_enum_v<E>, bool> = true>
-binder_status_t AParcel_writeVector(AParcel* parcel, const std::vector<E>& vec) {
-    using B = std::underlying_type_t<E>;
-    return internal::writeBackingArray<B>(parcel, reinterpret_cast<const B*>(vec.data()),
-                                          internal::lengthOf(vec));
-}
-template <typename E, std::enable_if_t<std::is_enum_v<E>, bool> = true>
-binder_status_t AParcel_writeVector(AParcel* parcel, const std::optional<std::vector<E>>& vec) {
-    using B = std::underlying_type_t<E>;
-    return vec.has_value() ? AParcel_writeVector(parcel, *vec)
-                           : internal::writeBackingArray<B>(parcel, nullptr, -1);
-}
-template <typename E, std::enable_if_t<std::is_enum_v<E>, bool> = true>
-binder_status_t AParcel_readVector(const AParcel* parcel, std::vector<E>* vec) {
-    using B = std::underlying_type_t<E>;
-    return internal::readBackingArray<B>(parcel, vec, internal::enumVectorAllocator<E>);
-}
-template <typename E, std::enable_if_t<std::is_enum_v<E>, bool> = true>
-binder_status_t AParcel_readVector(const AParcel* parcel, std::optional<std::vector<E>>* vec) {
-    using B = std::underlying_type_t<E>;
-    return internal::readBackingArray<B>(parcel, vec, internal::nullableEnumVectorAllocator<E>);
 }
 
 // Parcelables and descriptors.
@@ -626,12 +483,12 @@ binder_status_t AParcel_readNullableStdVectorParcelableElement(const AParcel* pa
     return AParcel_readNullableParcelable(parcel, &(*vec)[index]);
 }
 
-template <typename P, std::enable_if_t<!std::is_enum_v<P>, int> = 0>
+template <typename P, internal::IfPacked<P, false> = true>
 binder_status_t AParcel_writeVector(AParcel* parcel, const std::vector<P>& vec) {
     return ::AParcel_writeParcelableArray(parcel, &vec, internal::lengthOf(vec),
                                           AParcel_writeStdVectorParcelableElement<P>);
 }
-template <typename P, std::enable_if_t<!std::is_enum_v<P>, int> = 0>
+template <typename P, internal::IfPacked<P, false> = true>
 binder_status_t AParcel_readVector(const AParcel* parcel, std::vector<P>* vec) {
     return ::AParcel_readParcelableArray(parcel, vec, AParcel_stdVectorExternalAllocator<P>,
                                          AParcel_readStdVectorParcelableElement<P>);
