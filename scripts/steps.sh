@@ -21,6 +21,7 @@ whole() {
     in_group "$@"
     trap 'end_group; exit 130' INT TERM HUP
     wait "$group" || status=$?
+    end_group
     trap - INT TERM HUP
     return "$status"
 }
@@ -44,6 +45,7 @@ step() {
         fi
     done
     wait "$group" || status=$?
+    end_group
     trap - INT TERM HUP EXIT
     if ((status != 0)); then
         printf ': failed after %d s\n' $((SECONDS - started))

@@ -68,9 +68,9 @@ class Steps(unittest.TestCase):
         self.finish("step bad false")
         self.assertEqual(list(self.folder.iterdir()), [])
 
-    def assert_ends_all(self, runner, number):
-        """A grandchild of an interrupted command is gone when the command is."""
-        process = self.start(f"{runner} sh -c 'sleep 1000 & echo $! >grandchild; wait'")
+    def grandchild_of(self, runner, then):
+        """Starts a command that starts a long one and then does `then`; gives both."""
+        process = self.start(f"{runner} sh -c 'sleep 1000 & echo $! >grandchild; {then}'")
         grandchild = self.folder / "grandchild"
         limit = time.monotonic() + 20
         while not (grandchild.exists() and grandchild.read_text("ascii").endswith("\n")):
@@ -79,9 +79,9 @@ class Steps(unittest.TestCase):
         pid = int(grandchild.read_text("ascii"))
         grandchild.unlink()
         self.addCleanup(end_group_of, pid)
-        self.assertTrue(is_running(pid))
-        process.send_signal(number)
-        self.assertEqual(process.wait(timeout=20), 130)
+        return process, pid
+
+    def assert_ends(self, pid):
         limit = time.monotonic() + 20
         while is_running(pid):
             self.assertLess(time.monotonic(), limit, f"process {pid} still runs")
@@ -91,8 +91,19 @@ class Steps(unittest.TestCase):
         for runner in ("step long", "whole"):
             for number in (signal.SIGINT, signal.SIGTERM, signal.SIGHUP):
                 with self.subTest(runner=runner, signal=number.name):
-                    self.assert_ends_all(runner, number)
+                    process, grandchild = self.grandchild_of(runner, "wait")
+                    self.assertTrue(is_running(grandchild))
+                    process.send_signal(number)
+                    self.assertEqual(process.wait(timeout=20), 130)
+                    self.assert_ends(grandchild)
                     self.assertEqual(list(self.folder.iterdir()), [])
+
+    def test_failed_take_along_all_that_they_started(self):
+        for runner in ("step long", "whole"):
+            with self.subTest(runner=runner):
+                process, grandchild = self.grandchild_of(runner, "exit 3")
+                self.assertEqual(process.wait(timeout=20), 3)
+                self.assert_ends(grandchild)
 
 
 if __name__ == "__main__":
