@@ -5,6 +5,7 @@
 
 #include <android-base/logging.h>
 
+#include "Amplitude.h"
 #include "Constants.h"
 #include "HwApi.h"
 
@@ -46,7 +47,7 @@ bool HwApi::do_off() {
 
 bool HwApi::setAmplitude(int amplitude) {
     LOG(INFO) << "HW_API: setAmplitude : INTENSITY " << amplitude;
-    if (amplitude < 1 || amplitude > 10000) {
+    if (!isDriverAmplitude(amplitude)) {
         LOG(INFO) << "HW_API: setAmplitude amplitude is abnormal " << amplitude;
         return false;
     }

@@ -10,6 +10,7 @@
 
 #include <android-base/logging.h>
 
+#include "Amplitude.h"
 #include "PatternQueue.h"
 #include "ServiceStatus.h"
 #include "SystemCalls.h"
@@ -99,7 +100,7 @@ ndk::ScopedAStatus Vibrator::performPrebakedHapticPattern(int32_t patternIndex, 
     LOG(INFO) << "V_4_0: performPrebakedHapticPattern " << patternIndex << " : " << amplitude
               << " : " << repeat;
     if (!isCallerAllowed()) return core::ok();
-    if (amplitude < 1 || amplitude > 10000) {
+    if (!core::isDriverAmplitude(amplitude)) {
         LOG(INFO) << "V_4_0: performPrebakedHapticPattern amplitude is abnormal " << amplitude;
         return core::exception(EX_ILLEGAL_ARGUMENT);
     }
@@ -131,7 +132,7 @@ ndk::ScopedAStatus Vibrator::perform(core::Effect effect, int32_t amplitude,
         LOG(INFO) << "V_4_0: Unsupport vibrator perform effect for QVX";
         return core::exception(EX_UNSUPPORTED_OPERATION);
     }
-    if (amplitude < 1 || amplitude > 10000) {
+    if (!core::isDriverAmplitude(amplitude)) {
         LOG(INFO) << "V_4_0: vibrator perform effect for QVX amplitude is abnormal " << amplitude;
         return core::exception(EX_ILLEGAL_ARGUMENT);
     }

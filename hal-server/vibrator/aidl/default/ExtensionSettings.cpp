@@ -10,6 +10,7 @@
 
 #include <android-base/logging.h>
 
+#include "Amplitude.h"
 #include "Constants.h"
 #include "ServiceStatus.h"
 #include "SystemCalls.h"
@@ -20,10 +21,6 @@ namespace {
 
 constexpr uint32_t kFrequencyTypes = 5;
 constexpr uint32_t kPostures = 2;
-
-bool isAmplitude(int32_t amplitude) {
-    return amplitude >= 1 && amplitude <= 10000;
-}
 
 // Negative values count as large ones.
 template <typename Enum>
@@ -36,7 +33,7 @@ bool isBelow(Enum value, uint32_t limit) {
 ndk::ScopedAStatus Vibrator::setAmplitude(int32_t amplitude) {
     LOG(INFO) << "V_4_0: setAmplitude " << amplitude;
     if (!isCallerAllowed()) return core::ok();
-    if (!isAmplitude(amplitude)) {
+    if (!core::isDriverAmplitude(amplitude)) {
         LOG(INFO) << "V_4_0: setAmplitude amplitude is abnormal " << amplitude;
         return core::exception(EX_ILLEGAL_ARGUMENT);
     }
@@ -48,7 +45,7 @@ ndk::ScopedAStatus Vibrator::setAmplitude(int32_t amplitude) {
 ndk::ScopedAStatus Vibrator::setForceTouchAmplitude(int32_t amplitude) {
     LOG(INFO) << "V_4_0: setForceTouchAmplitude " << amplitude;
     if (!isCallerAllowed()) return core::ok();
-    if (!isAmplitude(amplitude)) {
+    if (!core::isDriverAmplitude(amplitude)) {
         LOG(INFO) << "V_4_0: setForceTouchAmplitude amplitude is abnormal " << amplitude;
         return core::exception(EX_ILLEGAL_ARGUMENT);
     }

@@ -11,6 +11,7 @@
 
 #include <android-base/logging.h>
 
+#include "Amplitude.h"
 #include "HwApi.h"
 #include "PacketText.h"
 #include "SystemCalls.h"
@@ -26,7 +27,7 @@ bool HwApi::performHapticEngine(const std::vector<HapticEnginePacket>& packets, 
         LOG(INFO) << "HW_API: performHapticEngine packet size is exceed";
         return false;
     }
-    if (amplitude < 1 || amplitude > 10000) {
+    if (!isDriverAmplitude(amplitude)) {
         LOG(INFO) << "HW_API: performHapticEngine amplitude is abnormal " << amplitude;
         return false;
     }

@@ -10,6 +10,7 @@
 
 #include <android-base/logging.h>
 
+#include "Amplitude.h"
 #include "PacketText.h"
 #include "ServiceStatus.h"
 #include "SystemCalls.h"
@@ -29,7 +30,7 @@ bool isPlayable(const char* operation, size_t packets, int32_t amplitude) {
         LOG(INFO) << "V_4_0: " << operation << " packet size is exceed";
         return false;
     }
-    if (amplitude < 1 || amplitude > 10000) {
+    if (!core::isDriverAmplitude(amplitude)) {
         LOG(INFO) << "V_4_0: " << operation << " amplitude is abnormal " << amplitude;
         return false;
     }

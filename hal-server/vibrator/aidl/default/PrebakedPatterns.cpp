@@ -11,6 +11,7 @@
 
 #include <android-base/logging.h>
 
+#include "Amplitude.h"
 #include "HwApi.h"
 #include "PatternQueue.h"
 #include "SystemCalls.h"
@@ -101,7 +102,7 @@ std::string_view formatQueueEntry(int32_t patternIndex, int32_t amplitude,
 bool HwApi::performPrebakedHapticPattern(int patternIndex, int amplitude, bool repeat) {
     LOG(INFO) << "HW_API: performPrebakedHapticPattern " << patternIndex << " : " << amplitude
               << " : " << repeat;
-    if (amplitude < 1 || amplitude > 10000) {
+    if (!isDriverAmplitude(amplitude)) {
         LOG(INFO) << "HW_API: performPrebakedHapticPattern amplitude is abnormal " << amplitude;
         return false;
     }
