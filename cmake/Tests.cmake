@@ -16,6 +16,9 @@
 #       keeps from running the program, leaves it out of "all". FROM_OUTSIDE: the program looks at
 #       the service through binder and the journal alone, so a build that takes another one's handset
 #       takes the program from there too.
+#
+#   qvx_add_python_test(SUITE FILE [LABEL label] [TIMEOUT seconds] [ENVIRONMENT NAME=VALUE ...])
+#       The unittest file FILE.py of the folder as the test SUITE.FILE. The default label is "unit".
 
 find_package(GTest REQUIRED)
 find_package(nlohmann_json REQUIRED)
@@ -101,4 +104,22 @@ function(qvx_add_guest_test name)
     # tests. They form the longest chain and come first, which is what a high cost makes them.
     set_tests_properties(${QVX_TEST_PREFIX}${name} PROPERTIES LABELS guest
                          TIMEOUT ${ctest_timeout} COST ${timeout})
+endfunction()
+
+function(qvx_add_python_test suite file)
+    cmake_parse_arguments(PARSE_ARGV 2 arg "" "LABEL;TIMEOUT" "ENVIRONMENT")
+    if(NOT arg_LABEL)
+        set(arg_LABEL unit)
+    endif()
+    if(NOT arg_TIMEOUT)
+        set(arg_TIMEOUT 300)
+    endif()
+    set(name ${QVX_TEST_PREFIX}${suite}.${file})
+    add_test(NAME ${name} COMMAND /usr/bin/python3 -B -m unittest -v ${file}
+             WORKING_DIRECTORY ${CMAKE_CURRENT_SOURCE_DIR})
+    set_tests_properties(${name} PROPERTIES LABELS ${arg_LABEL} TIMEOUT ${arg_TIMEOUT}
+                         ENVIRONMENT "${arg_ENVIRONMENT}")
+    if(arg_LABEL STREQUAL guest)
+        set_tests_properties(${name} PROPERTIES COST ${arg_TIMEOUT})
+    endif()
 endfunction()

@@ -9,7 +9,7 @@
 #include <cstdlib>
 #include <cstring>
 
-#include "driver/unique_fd.h"
+#include "common/unique_fd.h"
 
 namespace handset {
 

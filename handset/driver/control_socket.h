@@ -8,8 +8,8 @@
 #include <string>
 #include <string_view>
 
+#include "common/unique_fd.h"
 #include "driver/result.h"
-#include "driver/unique_fd.h"
 
 namespace handset {
 

@@ -17,9 +17,9 @@
 #include <string>
 #include <string_view>
 
+#include "common/unique_fd.h"
 #include "driver/caller.h"
 #include "driver/result.h"
-#include "driver/unique_fd.h"
 
 namespace handset {
 

@@ -20,6 +20,7 @@
 #include <string>
 #include <utility>
 
+#include "common/unique_fd.h"
 #include "driver/control_requests.h"
 #include "driver/control_socket.h"
 #include "driver/event_node.h"
@@ -33,7 +34,6 @@
 #include "driver/private_mounts.h"
 #include "driver/profile_reader.h"
 #include "driver/sysfs_server.h"
-#include "driver/unique_fd.h"
 
 namespace handset {
 namespace {

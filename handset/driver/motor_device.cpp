@@ -22,6 +22,7 @@
 #include <string_view>
 #include <utility>
 
+#include "common/unique_fd.h"
 #include "driver/caller.h"
 #include "driver/effect_line.h"
 #include "driver/effect_slots.h"
@@ -29,7 +30,6 @@
 #include "driver/motor_queries.h"
 #include "driver/open_flags.h"
 #include "driver/request_delay.h"
-#include "driver/unique_fd.h"
 
 namespace handset {
 namespace {

@@ -14,7 +14,7 @@
 #include <cstring>
 #include <utility>
 
-#include "driver/unique_fd.h"
+#include "common/unique_fd.h"
 
 namespace handset {
 namespace {

@@ -13,9 +13,9 @@
 #include <climits>
 #include <cstring>
 
+#include "common/unique_fd.h"
 #include "driver/error_names.h"
 #include "driver/json_fields.h"
-#include "driver/unique_fd.h"
 
 namespace handset {
 namespace {

@@ -14,7 +14,7 @@
 #include <thread>
 #include <vector>
 
-#include "driver/unique_fd.h"
+#include "common/unique_fd.h"
 
 namespace handset {
 

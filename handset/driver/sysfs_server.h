@@ -12,12 +12,12 @@
 #include <memory>
 #include <string_view>
 
+#include "common/unique_fd.h"
 #include "driver/fault_book.h"
 #include "driver/journal.h"
 #include "driver/node_tree.h"
 #include "driver/result.h"
 #include "driver/session_loop.h"
-#include "driver/unique_fd.h"
 
 struct fuse_session;
 

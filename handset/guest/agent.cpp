@@ -18,9 +18,9 @@
 #include <string>
 
 #include "command.h"
+#include "common/unique_fd.h"
 #include "file_systems.h"
 #include "frames.h"
-#include "unique_fd.h"
 
 namespace handset {
 namespace {
@@ -34,7 +34,7 @@ UniqueFd openPort() {
     for (int attempt = 0; attempt < kAttempts; ++attempt) {
         UniqueFd port(open(kPort, O_RDWR | O_CLOEXEC));
         pollfd state{.fd = port.get(), .events = POLLOUT, .revents = 0};
-        if (port.isOpen() && poll(&state, 1, 0) == 1 && (state.revents & POLLHUP) == 0) return port;
+        if (port && poll(&state, 1, 0) == 1 && (state.revents & POLLHUP) == 0) return port;
         usleep(5000);
     }
     return UniqueFd();
@@ -192,9 +192,9 @@ bool Agent::reapChildren() {
 /// is taken. A terminal delivers its last bytes a moment late.
 bool Agent::drain(UniqueFd& source, Reply kind) {
     constexpr int kLargestPipeInChunks = 64;
-    const int patienceMs = mCommand.errors.isOpen() ? 0 : 20;
+    const int patienceMs = mCommand.errors ? 0 : 20;
     pollfd wait{.fd = source.get(), .events = POLLIN, .revents = 0};
-    for (int chunk = 0; chunk < kLargestPipeInChunks && source.isOpen(); ++chunk) {
+    for (int chunk = 0; chunk < kLargestPipeInChunks && source; ++chunk) {
         if (poll(&wait, 1, patienceMs) != 1) break;
         if (!forward(source, kind)) return false;
     }
@@ -239,7 +239,7 @@ void run() {
     }
     const UniqueFd children = watchChildren();
     const UniqueFd port = openPort();
-    if (!port.isOpen()) {
+    if (!port) {
         std::fprintf(stderr, "handset-agent: %s did not appear\n", kPort);
         return;
     }

@@ -52,7 +52,7 @@ bool openTerminal(TerminalSize size, Command& command, ChildEnds& child) {
     child.input.reset(open(name, O_RDWR | O_NOCTTY | O_CLOEXEC));
     child.output.reset(fcntl(child.input.get(), F_DUPFD_CLOEXEC, 0));
     child.errors.reset(fcntl(child.input.get(), F_DUPFD_CLOEXEC, 0));
-    return command.input.isOpen() && child.errors.isOpen();
+    return command.input && child.errors;
 }
 
 std::vector<char*> pointersTo(const std::vector<std::string>& words) {
@@ -126,7 +126,7 @@ std::optional<StartFailure> startCommand(const CommandDescription& description, 
         return StartFailure{failure.error, describe(failure.step, description)};
     }
     for (const UniqueFd* end : {&started.input, &started.output, &started.errors}) {
-        if (end->isOpen()) fcntl(end->get(), F_SETFL, O_NONBLOCK);
+        if (*end) fcntl(end->get(), F_SETFL, O_NONBLOCK);
     }
     command = std::move(started);
     return std::nullopt;

@@ -9,7 +9,7 @@
 #include <string>
 #include <vector>
 
-#include "unique_fd.h"
+#include "common/unique_fd.h"
 
 namespace handset {
 

@@ -7,7 +7,7 @@
 
 #include <string_view>
 
-#include "driver/unique_fd.h"
+#include "common/unique_fd.h"
 
 namespace handset {
 

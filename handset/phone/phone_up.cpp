@@ -18,9 +18,9 @@
 #include <system_error>
 #include <vector>
 
+#include "common/unique_fd.h"
 #include "driver/one_line.h"
 #include "driver/result.h"
-#include "driver/unique_fd.h"
 #include "phone/phone_state.h"
 #include "phone/supervisor.h"
 #include "phone/text_file.h"

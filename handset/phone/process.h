@@ -9,8 +9,8 @@
 #include <string>
 #include <vector>
 
+#include "common/unique_fd.h"
 #include "driver/result.h"
-#include "driver/unique_fd.h"
 
 namespace handset {
 

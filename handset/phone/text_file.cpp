@@ -12,7 +12,7 @@
 #include <cstdio>
 #include <cstring>
 
-#include "driver/unique_fd.h"
+#include "common/unique_fd.h"
 
 namespace handset {
 namespace {

@@ -1,10 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 //
 // The program itself on a machine where it cannot serve: one line, and the right exit status.
-#include <sys/wait.h>
-
-#include <array>
-#include <cstdio>
 #include <string>
 
 #include <unistd.h>
@@ -12,52 +8,42 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include "command.h"
+
 namespace {
 
-struct Execution {
-    int status;
-    std::string output;  ///< of both streams
-};
+using qvx::test::CommandResult;
 
-Execution run(const std::string& arguments) {
-    const std::string command = std::string(SERVICEMANAGER_COMMAND) + " " + arguments + " 2>&1";
-    Execution result{};
-    FILE* pipe = popen(command.c_str(), "r");
-    std::array<char, 4096> buffer{};
-    for (size_t count = 0; (count = fread(buffer.data(), 1, buffer.size(), pipe)) > 0;) {
-        result.output.append(buffer.data(), count);
-    }
-    const int status = pclose(pipe);
-    result.status = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-    return result;
+// Both of the program's streams are in the result's `out`.
+CommandResult run(const std::string& arguments) {
+    return qvx::test::runShell(std::string(SERVICEMANAGER_COMMAND) + " " + arguments + " 2>&1");
 }
 
 TEST(Program, HelpSucceeds) {
-    const Execution result = run("--help");
+    const CommandResult result = run("--help");
     EXPECT_EQ(result.status, 0);
-    EXPECT_THAT(result.output, ::testing::HasSubstr("--root DIR"));
+    EXPECT_THAT(result.out, ::testing::HasSubstr("--root DIR"));
 }
 
 TEST(Program, WrongUsageGetsOneLineAndStatus2) {
     EXPECT_EQ(run("--root").status, 2);
-    const Execution folder = run("--root /no/such/folder");
+    const CommandResult folder = run("--root /no/such/folder");
     EXPECT_EQ(folder.status, 2);
-    EXPECT_EQ(folder.output,
+    EXPECT_EQ(folder.out,
               "servicemanager: --root: Directory does not exist: /no/such/folder; usage: "
               "servicemanager [--root DIR] [--ready-fd N]\n");
-    const Execution word = run("now");
+    const CommandResult word = run("now");
     EXPECT_EQ(word.status, 2);
-    EXPECT_EQ(word.output,
+    EXPECT_EQ(word.out,
               "servicemanager: The following argument was not expected: now; usage: "
               "servicemanager [--root DIR] [--ready-fd N]\n");
 }
 
 TEST(Program, WithoutABinderDeviceSaysSoWithStatus1) {
     if (access("/dev/binder", F_OK) == 0) GTEST_SKIP() << "this machine has a binder device";
-    const Execution result = run("");
+    const CommandResult result = run("");
     EXPECT_EQ(result.status, 1);
-    EXPECT_EQ(result.output,
-              "servicemanager: cannot open /dev/binder: No such file or directory\n");
+    EXPECT_EQ(result.out, "servicemanager: cannot open /dev/binder: No such file or directory\n");
 }
 
 }  // namespace

@@ -66,4 +66,8 @@ CommandResult runCommand(const std::vector<std::string>& arguments) {
     return result;
 }
 
+CommandResult runShell(const std::string& line) {
+    return runCommand({"sh", "-c", line});
+}
+
 }  // namespace qvx::test

@@ -17,4 +17,7 @@ struct CommandResult {
 // for its end.
 CommandResult runCommand(const std::vector<std::string>& arguments);
 
+// The same for a line in the shell's language.
+CommandResult runShell(const std::string& line);
+
 }  // namespace qvx::test

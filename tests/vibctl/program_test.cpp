@@ -1,10 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 //
 // The program itself: what it prints where, and its exit status, on a machine without a service.
-#include <sys/wait.h>
-
-#include <array>
-#include <cstdio>
 #include <string>
 
 #include <unistd.h>
@@ -12,42 +8,22 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include "command.h"
+
 namespace {
 
 using ::testing::HasSubstr;
 using ::testing::StartsWith;
 
-struct Execution {
-    int status;
-    std::string out;
-    std::string err;
-};
+using qvx::test::CommandResult;
 
-std::string readAll(const std::string& command, int& status) {
-    std::string text;
-    FILE* pipe = popen(command.c_str(), "r");
-    std::array<char, 4096> buffer{};
-    for (size_t count = 0; (count = fread(buffer.data(), 1, buffer.size(), pipe)) > 0;) {
-        text.append(buffer.data(), count);
-    }
-    status = pclose(pipe);
-    return text;
-}
-
-/// Runs the program twice, once for each of its outputs.
-Execution run(const std::string& arguments) {
-    const std::string command = std::string(VIBCTL_COMMAND) + " " + arguments;
-    Execution result{};
-    int status = 0;
-    result.out = readAll(command + " 2>/dev/null", status);
-    result.err = readAll(command + " 2>&1 >/dev/null", status);
-    result.status = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-    return result;
+CommandResult run(const std::string& arguments) {
+    return qvx::test::runShell(std::string(VIBCTL_COMMAND) + " " + arguments);
 }
 
 TEST(Program, HelpGoesToStandardOutputAndSucceeds) {
     for (const char* arguments : {"help", "--help", "-h"}) {
-        const Execution result = run(arguments);
+        const CommandResult result = run(arguments);
         EXPECT_EQ(result.status, 0) << arguments;
         EXPECT_THAT(result.out, StartsWith("usage: vibctl ")) << arguments;
         EXPECT_EQ(result.err, "") << arguments;
@@ -60,7 +36,7 @@ TEST(Program, HelpGoesToStandardOutputAndSucceeds) {
 }
 
 TEST(Program, VersionIsPrinted) {
-    const Execution result = run("--version");
+    const CommandResult result = run("--version");
     EXPECT_EQ(result.status, 0);
     EXPECT_THAT(result.out, StartsWith("vibctl "));
 }
@@ -74,7 +50,7 @@ struct WrongUsage {
 class WrongUsageOf : public ::testing::TestWithParam<WrongUsage> {};
 
 TEST_P(WrongUsageOf, GetsOneLineAndStatus2) {
-    const Execution result = run(GetParam().arguments);
+    const CommandResult result = run(GetParam().arguments);
     EXPECT_EQ(result.status, 2);
     EXPECT_EQ(result.out, "");
     EXPECT_EQ(result.err, GetParam().line);
@@ -137,7 +113,7 @@ INSTANTIATE_TEST_SUITE_P(Program, WrongUsageOf, ::testing::ValuesIn(kWrongUsages
 TEST(Program, WithoutABinderDeviceSaysSoWithStatus3) {
     if (access("/dev/binder", F_OK) == 0) GTEST_SKIP() << "this machine has a binder device";
     for (const char* arguments : {"list", "std on -1", "ext setAmplitude -1", "--json std off"}) {
-        const Execution result = run(arguments);
+        const CommandResult result = run(arguments);
         EXPECT_EQ(result.status, 3) << arguments;
         EXPECT_EQ(result.out, "") << arguments;
         EXPECT_EQ(result.err, "vibctl: cannot open /dev/binder: No such file or directory\n")
@@ -147,7 +123,7 @@ TEST(Program, WithoutABinderDeviceSaysSoWithStatus3) {
 
 TEST(Program, DoctorWithoutABinderDeviceSaysSoAndGoesOn) {
     if (access("/dev/binder", F_OK) == 0) GTEST_SKIP() << "this machine has a binder device";
-    const Execution result = run("doctor");
+    const CommandResult result = run("doctor");
     EXPECT_EQ(result.status, 1);
     EXPECT_THAT(result.out, StartsWith("bad      binder: cannot open /dev/binder: No such file or "
                                        "directory; next: load the kernel's binder driver"));

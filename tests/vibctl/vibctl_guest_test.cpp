@@ -2,11 +2,7 @@
 //
 // The client over a real binder: exit statuses, callbacks, and every way in which there may be no
 // service.
-#include <sys/wait.h>
-
-#include <array>
 #include <chrono>
-#include <cstdio>
 #include <memory>
 #include <string>
 
@@ -14,6 +10,7 @@
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
 
+#include "command.h"
 #include "fake_service.h"
 #include "kernel_log.h"
 #include "processes.h"
@@ -22,6 +19,7 @@ namespace {
 
 using processes::Manager;
 using processes::Server;
+using qvx::test::CommandResult;
 using ::testing::HasSubstr;
 
 constexpr const char* kManifest =
@@ -29,22 +27,9 @@ constexpr const char* kManifest =
         "<name>android.hardware.vibrator</name><version>2</version>"
         "<fqname>IVibrator/default</fqname></hal></manifest>";
 
-struct Execution {
-    int status;
-    std::string output;  ///< of both streams
-};
-
-Execution run(const std::string& arguments) {
-    const std::string command = std::string(VIBCTL_PROGRAM) + " " + arguments + " 2>&1";
-    Execution result{};
-    FILE* pipe = popen(command.c_str(), "r");
-    std::array<char, 4096> buffer{};
-    for (size_t count = 0; (count = fread(buffer.data(), 1, buffer.size(), pipe)) > 0;) {
-        result.output.append(buffer.data(), count);
-    }
-    const int status = pclose(pipe);
-    result.status = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-    return result;
+// Both of the program's streams are in the result's `out`.
+CommandResult run(const std::string& arguments) {
+    return qvx::test::runShell(std::string(VIBCTL_PROGRAM) + " " + arguments + " 2>&1");
 }
 
 class VibctlTest : public ::testing::Test {
@@ -57,15 +42,15 @@ class VibctlTest : public ::testing::Test {
 class VibctlWithService : public VibctlTest {
   protected:
     static void expect(const std::string& arguments, int status, const std::string& output) {
-        const Execution result = run(arguments);
+        const CommandResult result = run(arguments);
         EXPECT_EQ(result.status, status) << arguments;
-        EXPECT_EQ(result.output, output) << arguments;
+        EXPECT_EQ(result.out, output) << arguments;
     }
 
     static nlohmann::json callbackOf(const std::string& arguments) {
-        const Execution result = run("--json " + arguments);
-        EXPECT_EQ(result.status, 0) << result.output;
-        return nlohmann::json::parse(result.output).at("callback");
+        const CommandResult result = run("--json " + arguments);
+        EXPECT_EQ(result.status, 0) << result.out;
+        return nlohmann::json::parse(result.out).at("callback");
     }
 
     Manager mManager{mFolder.path()};
@@ -76,9 +61,9 @@ TEST_F(VibctlTest, WithoutAServiceManagerEndsInSecondsWithOneLine) {
     const qvx::test::ExpectBinderComplaints expected;
     const auto before = std::chrono::steady_clock::now();
     for (const char* arguments : {"list", "std off", "ext setAmplitude -1"}) {
-        const Execution result = run(arguments);
+        const CommandResult result = run(arguments);
         EXPECT_EQ(result.status, 3) << arguments;
-        EXPECT_EQ(result.output, "vibctl: no service manager has answered for 2 seconds\n");
+        EXPECT_EQ(result.out, "vibctl: no service manager has answered for 2 seconds\n");
     }
     EXPECT_LT(std::chrono::steady_clock::now() - before, std::chrono::seconds(20));
 }
@@ -86,17 +71,17 @@ TEST_F(VibctlTest, WithoutAServiceManagerEndsInSecondsWithOneLine) {
 TEST_F(VibctlTest, WithoutTheServiceNamesIt) {
     const Manager manager(mFolder.path());
     for (const char* arguments : {"std off", "ext setAmplitude -1"}) {
-        const Execution result = run(arguments);
+        const CommandResult result = run(arguments);
         EXPECT_EQ(result.status, 3);
-        EXPECT_EQ(result.output,
+        EXPECT_EQ(result.out,
                   "vibctl: android.hardware.vibrator.IVibrator/default is not registered\n");
     }
-    EXPECT_EQ(run("list").output, "manager\n");
+    EXPECT_EQ(run("list").out, "manager\n");
 }
 
 TEST_F(VibctlWithService, ListsServicesButNotTheExtension) {
     expect("list", 0, "android.hardware.vibrator.IVibrator/default\nmanager\n");
-    const nlohmann::json line = nlohmann::json::parse(run("--json list").output);
+    const nlohmann::json line = nlohmann::json::parse(run("--json list").out);
     EXPECT_EQ(line.at("result"),
               (nlohmann::json{"android.hardware.vibrator.IVibrator/default", "manager"}));
 }
@@ -114,13 +99,13 @@ TEST_F(VibctlWithService, ReportsExceptionsWithStatus1) {
     expect("std setAmplitude 1", 1, "setAmplitude: EX_ILLEGAL_ARGUMENT\n");
     expect("std on 1", 1, "on: EX_ILLEGAL_STATE: no \"motor\"\n");
     expect("std on 2", 1, "on: EX_SERVICE_SPECIFIC 7\n");
-    EXPECT_THAT(run("--json std on 1").output,
+    EXPECT_THAT(run("--json std on 1").out,
                 HasSubstr(R"("exception":-5,"status":0,"message":"no \"motor\"","result":null,)"));
 }
 
 TEST_F(VibctlWithService, ReportsTransportFailuresWithStatus3) {
     expect("std off", 3, "off: EX_TRANSACTION_FAILED STATUS_UNKNOWN_TRANSACTION\n");
-    EXPECT_THAT(run("--json std off").output, HasSubstr(R"("exception":-129,"status":-74,)"));
+    EXPECT_THAT(run("--json std off").out, HasSubstr(R"("exception":-129,"status":-74,)"));
     const qvx::test::ExpectBinderComplaints expected;
     expect("std on 3", 3, "on: EX_TRANSACTION_FAILED STATUS_DEAD_OBJECT\n");
 }
@@ -138,7 +123,7 @@ TEST_F(VibctlWithService, ReportsWhenACompositionCompletes) {
     ASSERT_TRUE(callback.is_number());
     EXPECT_GE(callback.get<int>(), 300);
     EXPECT_LT(callback.get<int>(), 2000);
-    EXPECT_THAT(run("std compose 20,CLICK,1 --callback").output,
+    EXPECT_THAT(run("std compose 20,CLICK,1 --callback").out,
                 HasSubstr("compose: ok, completed after "));
 }
 

@@ -123,7 +123,7 @@ TEST(AgentCommand, TerminalHasTheGivenSize) {
     description.terminal = TerminalSize{.rows = 24, .columns = 336};
     const Command command = started(description);
     EXPECT_EQ(readAll(command.output), "24 336\r\n");
-    EXPECT_FALSE(command.errors.isOpen());
+    EXPECT_FALSE(command.errors);
     statusOf(command);
 }
 

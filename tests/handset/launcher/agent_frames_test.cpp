@@ -8,8 +8,8 @@
 #include <string>
 #include <string_view>
 
+#include "common/unique_fd.h"
 #include "frames.h"
-#include "unique_fd.h"
 
 namespace handset {
 namespace {
