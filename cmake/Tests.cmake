@@ -67,7 +67,7 @@ function(qvx_add_unit_test name)
         set_tests_properties(${QVX_TEST_PREFIX}${name} PROPERTIES LABELS unit TIMEOUT 600)
         return()
     endif()
-    gtest_discover_tests(${name} DISCOVERY_MODE PRE_TEST DISCOVERY_TIMEOUT 60
+    gtest_discover_tests(${name} DISCOVERY_MODE PRE_TEST DISCOVERY_TIMEOUT 60 NO_PRETTY_VALUES
                          TEST_PREFIX "${name}." PROPERTIES LABELS unit TIMEOUT 120)
 endfunction()
 

@@ -5,7 +5,6 @@
 #include <cstdlib>
 #include <memory>
 #include <optional>
-#include <ostream>
 #include <string>
 #include <vector>
 
@@ -43,11 +42,6 @@ struct ListCase {
     std::string text;
     std::optional<std::string> handlers;
 };
-
-// By their names CTest lists them.
-void PrintTo(const ListCase& tested, std::ostream* out) {
-    *out << tested.name;
-}
 
 const ListCase kListCases[] = {
         {"OneBlock", kName + "H: Handlers=event7\n\n", "event7"},
@@ -99,7 +93,8 @@ TEST_P(TrickyInputDeviceList, GivesTheHandlersOfTheMotorsBlock) {
     EXPECT_EQ(field(GetParam().text, 'H'), GetParam().handlers);
 }
 
-INSTANTIATE_TEST_SUITE_P(Texts, TrickyInputDeviceList, ValuesIn(kListCases));
+INSTANTIATE_TEST_SUITE_P(Texts, TrickyInputDeviceList, ValuesIn(kListCases),
+                         [](const auto& tested) { return tested.param.name; });
 
 TEST_F(InputDeviceList, SysfsFieldIsFoundByItsKey) {
     EXPECT_EQ(field(kName + "S: Sysfs=/devices/virtual/input/input7\nH: Handlers=event7 \n\n", 'S'),
@@ -169,10 +164,6 @@ struct FieldCase {
     std::string lineAfterwards;
 };
 
-void PrintTo(const FieldCase& tested, std::ostream* out) {
-    *out << tested.name;
-}
-
 const FieldCase kFieldCases[] = {
         {"Handlers", "H: Handlers=event7 \n", 'H', "event7 ", "H: Handlers=event7 "},
         {"Sysfs", "S: Sysfs=/devices/x\n", 'S', "/devices/x", "S: Sysfs=/devices/x"},
@@ -209,7 +200,8 @@ TEST_P(ParseField, GivesACopyOfTheValueAndCutsTheLine) {
     EXPECT_STREQ(line.data(), GetParam().lineAfterwards.c_str());
 }
 
-INSTANTIATE_TEST_SUITE_P(Lines, ParseField, ValuesIn(kFieldCases));
+INSTANTIATE_TEST_SUITE_P(Lines, ParseField, ValuesIn(kFieldCases),
+                         [](const auto& tested) { return tested.param.name; });
 
 }  // namespace
 }  // namespace aidl::android::hardware::vibrator

@@ -6,7 +6,6 @@
 #include <cstdio>
 #include <memory>
 #include <optional>
-#include <ostream>
 #include <string>
 #include <utility>
 #include <vector>
@@ -201,11 +200,6 @@ struct Path {
     std::optional<Operation> failing;
 };
 
-// By their names CTest lists them.
-void PrintTo(const Path& path, std::ostream* out) {
-    *out << path.name;
-}
-
 class WavetableUploadPath : public WavetableUpload, public ::testing::WithParamInterface<Path> {
   protected:
     void play() {
@@ -239,7 +233,8 @@ INSTANTIATE_TEST_SUITE_P(Paths, WavetableUploadPath,
                                            Path{"OpenFailure", "5.100, 10, ~", Operation::kOpen},
                                            Path{"UploadFailure", "5.100, 10, ~", Operation::kIoctl},
                                            Path{"TriggerFailure", "5.100, 10, ~",
-                                                Operation::kWrite}));
+                                                Operation::kWrite}),
+                         [](const auto& tested) { return tested.param.name; });
 
 TEST_F(WavetableUpload, PlainVibrationAfterAWaveformSendsTheIndexPair) {
     EXPECT_TRUE(hwApi->setAndTriggerOwt(5, 0));

@@ -245,7 +245,8 @@ TEST_P(BuiltInProfile, IsAccepted) {
     EXPECT_TRUE(profile->faults.empty());
 }
 
-INSTANTIATE_TEST_SUITE_P(Profiles, BuiltInProfile, testing::Values("legacy", "leds", "ff", "none"));
+INSTANTIATE_TEST_SUITE_P(Profiles, BuiltInProfile, testing::Values("legacy", "leds", "ff", "none"),
+                         [](const auto& tested) { return std::string(tested.param); });
 
 }  // namespace
 }  // namespace handset
