@@ -9,8 +9,11 @@
 #include <cstddef>
 #include <cstdint>
 #include <ostream>
+#include <string_view>
 #include <thread>
+#include <utility>
 
+#include "journal_words.h"
 #include "phone_control.h"
 
 namespace qvx::test {
@@ -27,23 +30,17 @@ using testing::ValuesIn;
 constexpr int kIllegalState = -5;
 constexpr int kUnsupportedOperation = -7;
 
-// What the driver saw that drives its motor: "LEAF DATA" of a write, and of a force-feedback motor
-// "upload LENGTH CUSTOM_HEX", "erase ID" and "event CODE VALUE".
+// What the driver saw that drives its motor, in words: "LEAF DATA" of a write, and of a
+// force-feedback motor uploads, erasures and events (journal_words.h).
 std::vector<std::string> driverRequests(const Phone& phone) {
+    constexpr std::string_view kWrite = "write ";
     std::vector<std::string> requests;
-    for (const json& entry : phone.journal()) {
-        const std::string op = entry.value("op", "");
-        if (op == "write") {
-            const std::string node = entry.value("node", "");
-            requests.push_back(node.substr(node.rfind('/') + 1) + " " + entry.value("data", ""));
-        } else if (op == "upload") {
-            requests.push_back("upload " + std::to_string(entry.value("length", -1)) + " " +
-                               entry.value("custom_hex", ""));
-        } else if (op == "erase") {
-            requests.push_back("erase " + std::to_string(entry.value("id", -1)));
-        } else if (op == "event") {
-            requests.push_back("event " + std::to_string(entry.value("code", -1)) + " " +
-                               std::to_string(entry.value("value", -1)));
+    for (const json& line : phone.journal()) {
+        std::string words = inWords(line);
+        if (words.starts_with(kWrite)) {
+            requests.push_back(words.substr(kWrite.size()));
+        } else if (line.value("node", "") == "motor" && line.value("op", "") != "open") {
+            requests.push_back(std::move(words));
         }
     }
     return requests;

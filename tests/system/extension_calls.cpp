@@ -4,45 +4,11 @@
 #include <algorithm>
 #include <sstream>
 
+#include "journal_words.h"
+
 namespace qvx::test {
-namespace {
 
 using nlohmann::json;
-
-std::string leafOf(const json& entry) {
-    const std::string node = entry.value("node", "");
-    return node.substr(node.rfind('/') + 1);
-}
-
-// How an entry's line ends, when the result is not the one that was asked for.
-std::string ending(const json& entry, const char* key, const json& asked) {
-    const json result = entry.value(key, json());
-    if (result == asked) return "";
-    return " = " + (result.is_string() ? result.get<std::string>() : result.dump());
-}
-
-std::string number(const json& entry, const char* key) {
-    return std::to_string(entry.value(key, -1));
-}
-
-std::string inWords(const json& entry) {
-    const std::string op = entry.value("op", "");
-    if (op == "open") {
-        return "open " + leafOf(entry) + " " + entry.value("flags", "") + ending(entry, "error", 0);
-    }
-    if (op == "read") return "read " + leafOf(entry) + " " + number(entry, "size");
-    if (op == "write") {
-        const std::string data = entry.value("data", "");
-        return "write " + leafOf(entry) + " " + data + ending(entry, "result", data.size());
-    }
-    if (op == "upload")
-        return "upload " + number(entry, "length") + " " + entry.value("custom_hex", "");
-    if (op == "event") return "event " + number(entry, "code") + " " + number(entry, "value");
-    if (op == "erase") return "erase " + number(entry, "id");
-    return op;
-}
-
-}  // namespace
 
 std::vector<json> callAllAs(const std::string& user, const std::vector<std::string>& calls) {
     std::string script;  // one process for all calls, because a process costs much in the guest

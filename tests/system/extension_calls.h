@@ -19,11 +19,8 @@ std::vector<nlohmann::json> callAllAs(const std::string& user,
 // One such call as the words for Phone::call().
 std::vector<std::string> extensionCall(std::string_view words);
 
-// What the driver was asked since the last reset, in order, without the first `skipped` lines.
-// Closing is left out: the kernel tells of it when it likes.
-//   "open LEAF O_RDWR"      "read LEAF SIZE"      "write LEAF DATA"
-//   "upload LENGTH CUSTOM_HEX"      "event CODE VALUE"      "erase ID"
-// What did not go as asked ends with " = " and the error's name or the count that was taken.
+// What the driver was asked since the last reset, in words (journal_words.h) and in order, without
+// closing and without the first `skipped` lines.
 std::vector<std::string> journalInWords(const Phone& phone, size_t skipped = 0);
 
 }  // namespace qvx::test

@@ -41,7 +41,7 @@ TEST(MotorFault, FailedOpenIsTriedAgainByTheNextRequest) {
     phone.fault(motorFault("open", {{"errno", "EACCES"}}));
     EXPECT_EQ(phone.call({"std", "on", "500"})["exception"], kIllegalState);
     EXPECT_EQ(phone.call({"std", "on", "500"})["exception"], 0);
-    EXPECT_THAT(motorRequests(phone), ElementsAre("open O_RDWR = EACCES", "open O_RDWR",
+    EXPECT_THAT(motorRequests(phone), ElementsAre("open motor O_RDWR = EACCES", "open motor O_RDWR",
                                                   "upload 500 00000000", "event 0 1"));
     EXPECT_THAT(phone.log(),
                 HasSubstr("HW_API: [uploadForceFeedbackeffect]open fail: /dev/input/event9 "
@@ -62,8 +62,9 @@ TEST(MotorFault, FailedUploadStartsNothingAndLeavesNoEffect) {
     phone.fault(motorFault("upload", {{"errno", "ENOSPC"}}));
     EXPECT_EQ(phone.call({"std", "on", "500"})["exception"], kIllegalState);
     EXPECT_EQ(phone.call({"std", "on", "250"})["exception"], 0);
-    EXPECT_THAT(motorRequests(phone), ElementsAre("open O_RDWR", "upload 500 00000000 = ENOSPC",
-                                                  "upload 250 00000000", "event 0 1"));
+    EXPECT_THAT(motorRequests(phone),
+                ElementsAre("open motor O_RDWR", "upload 500 00000000 = ENOSPC",
+                            "upload 250 00000000", "event 0 1"));
     EXPECT_THAT(phone.log(), HasSubstr("HW_API: [uploadForceFeedbackeffect]ioctl fail: "
                                        "/dev/input/event9 ,errno: 28\n"));
 }
@@ -88,8 +89,8 @@ TEST(MotorFault, FailedEventKeepsTheUploadedEffect) {
     phone.fault(motorFault("write", {{"errno", "EIO"}}));
     EXPECT_EQ(phone.call({"std", "on", "500"})["exception"], kIllegalState);
     EXPECT_EQ(phone.call({"std", "off"})["exception"], 0);
-    EXPECT_THAT(motorRequests(phone),
-                ElementsAre("open O_RDWR", "upload 500 00000000", "event 0 1 = EIO", "event 0 0"));
+    EXPECT_THAT(motorRequests(phone), ElementsAre("open motor O_RDWR", "upload 500 00000000",
+                                                  "event 0 1 = EIO", "event 0 0"));
     EXPECT_THAT(phone.log(),
                 HasSubstr("HW_API: [writeInputEvent]write fail: /dev/input/event9 ,errno: 5\n"));
 }
@@ -117,12 +118,13 @@ TEST(MotorFault, InterruptedCallsAreRepeated) {
     phone.fault(motorFault("erase", {{"errno", "EINTR"}}, 2));
     EXPECT_EQ(phone.call({"std", "on", "500"})["exception"], 0);
     EXPECT_EQ(phone.call({"std", "on", "250"})["exception"], 0);
-    EXPECT_THAT(motorRequests(phone),
-                ElementsAre("open O_RDWR = EINTR", "open O_RDWR = EINTR", "open O_RDWR",
-                            "upload 500 00000000 = EINTR", "upload 500 00000000 = EINTR",
-                            "upload 500 00000000", "event 0 1 = EINTR", "event 0 1 = EINTR",
-                            "event 0 1", "erase 0 = EINTR", "erase 0 = EINTR", "erase 0",
-                            "upload 250 00000000", "event 0 1"));
+    EXPECT_THAT(
+            motorRequests(phone),
+            ElementsAre("open motor O_RDWR = EINTR", "open motor O_RDWR = EINTR",
+                        "open motor O_RDWR", "upload 500 00000000 = EINTR",
+                        "upload 500 00000000 = EINTR", "upload 500 00000000", "event 0 1 = EINTR",
+                        "event 0 1 = EINTR", "event 0 1", "erase 0 = EINTR", "erase 0 = EINTR",
+                        "erase 0", "upload 250 00000000", "event 0 1"));
 }
 
 TEST(MotorFault, SlowMotorIsWaitedFor) {
@@ -133,7 +135,7 @@ TEST(MotorFault, SlowMotorIsWaitedFor) {
     EXPECT_EQ(answer["exception"], 0);
     EXPECT_GE(answer["us"].get<int64_t>(), 300000);
     EXPECT_THAT(motorRequests(phone),
-                ElementsAre("open O_RDWR", "upload 500 00000000", "event 0 1"));
+                ElementsAre("open motor O_RDWR", "upload 500 00000000", "event 0 1"));
 }
 
 TEST(MotorFault, WaveformThatFailsLeavesPlainVibrationAsItWas) {
@@ -176,7 +178,8 @@ TEST(MotorFault, MotorUnpluggedBeforeItsFirstUseCannotBeOpened) {
     ASSERT_EQ(phone.up().status, 0) << phone.up().out << phone.up().err;
     EXPECT_EQ(phone.call({"std", "on", "500"})["exception"], kIllegalState);
     EXPECT_EQ(phone.call({"std", "on", "500"})["exception"], kIllegalState);
-    EXPECT_THAT(motorRequests(phone), ElementsAre("open O_RDWR = ENODEV", "open O_RDWR = ENODEV"));
+    EXPECT_THAT(motorRequests(phone),
+                ElementsAre("open motor O_RDWR = ENODEV", "open motor O_RDWR = ENODEV"));
 }
 
 size_t openDescriptors(int pid) {
@@ -230,7 +233,7 @@ TEST_P(TrickyInputDevices, LeadToTheMotorOrToNone) {
     if (GetParam().found) {
         EXPECT_EQ(answer["exception"], 0);
         EXPECT_THAT(motorRequests(phone),
-                    ElementsAre("open O_RDWR", "upload 500 00000000", "event 0 1"));
+                    ElementsAre("open motor O_RDWR", "upload 500 00000000", "event 0 1"));
         EXPECT_THAT(phone.log(), HasSubstr("HW_API: THE_DEVICE_FF: /dev/input/event9\n"));
     } else {
         EXPECT_EQ(answer["exception"], kIllegalState);

@@ -1,35 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "force_feedback_journal.h"
 
+#include "journal_words.h"
+
 namespace qvx::test {
-namespace {
 
 using nlohmann::json;
-
-std::string numberOf(const json& line, const char* key) {
-    return std::to_string(line.value(key, -1));
-}
-
-std::string inShort(const json& line) {
-    const std::string op = line.value("op", "");
-    if (op == "open") return "open " + line.value("flags", "");
-    if (op == "upload")
-        return "upload " + numberOf(line, "length") + " " + line.value("custom_hex", "");
-    if (op == "erase") return "erase " + numberOf(line, "id");
-    if (op == "event") return "event " + numberOf(line, "code") + " " + numberOf(line, "value");
-    return op;
-}
-
-std::string failureOf(const json& line) {
-    for (const char* key : {"result", "error"}) {
-        if (line.contains(key) && line[key].is_string()) {
-            return " = " + line[key].get<std::string>();
-        }
-    }
-    return "";
-}
-
-}  // namespace
 
 std::vector<json> motorLines(const Phone& phone) {
     std::vector<json> lines;
@@ -43,7 +19,7 @@ std::vector<json> motorLines(const Phone& phone) {
 
 std::vector<std::string> motorRequests(const Phone& phone) {
     std::vector<std::string> requests;
-    for (const json& line : motorLines(phone)) requests.push_back(inShort(line) + failureOf(line));
+    for (const json& line : motorLines(phone)) requests.push_back(inWords(line));
     return requests;
 }
 

@@ -9,8 +9,7 @@
 
 namespace qvx::test {
 
-// The motor's part of the journal, in short: "open O_RDWR", "upload LENGTH CUSTOM_HEX", "erase ID",
-// "event CODE VALUE", "close"; what failed ends with " = " and the error's name.
+// The motor's part of the journal in words (journal_words.h).
 std::vector<std::string> motorRequests(const Phone& phone);
 
 // The motor's part of the journal as it stands, but for what differs from run to run: running

@@ -19,7 +19,7 @@ TEST(ForceFeedbackPhone, OnUploadsAnEffectOfThatLengthAndPlaysIt) {
     phone.reset();
     EXPECT_EQ(phone.call({"std", "on", "500"})["exception"], 0);
     EXPECT_THAT(motorRequests(phone),
-                ElementsAre("open O_RDWR", "upload 500 00000000", "event 0 1"));
+                ElementsAre("open motor O_RDWR", "upload 500 00000000", "event 0 1"));
 }
 
 TEST(ForceFeedbackPhone, SecondOnErasesTheFirstEffect) {
@@ -42,7 +42,7 @@ TEST(ForceFeedbackPhone, AmplitudeIsSentAsGain) {
     const Phone phone("ff");
     phone.reset();
     EXPECT_EQ(phone.call({"std", "setAmplitude", "0.5"})["exception"], 0);
-    EXPECT_THAT(motorRequests(phone), ElementsAre("open O_RDWR", "event 96 5000"));
+    EXPECT_THAT(motorRequests(phone), ElementsAre("open motor O_RDWR", "event 96 5000"));
 }
 
 TEST(ForceFeedbackPhone, CalibrationReachesTheDriver) {
@@ -62,8 +62,8 @@ TEST(ForceFeedbackPhone, CompositionIsUploadedAsACompiledWaveformAndCompletes) {
     EXPECT_TRUE(answer["callback"].is_number()) << answer;
     EXPECT_GE(answer["callback"].get<double>(), 70.0);
     EXPECT_THAT(motorRequests(phone),
-                ElementsAre("open O_RDWR", "upload 0 0000020000000000000000320064010000000000",
-                            "event 0 1"));
+                ElementsAre("open motor O_RDWR",
+                            "upload 0 0000020000000000000000320064010000000000", "event 0 1"));
 }
 
 TEST(ForceFeedbackPhone, NegativeDelayIsRefusedByTheWaveformCompiler) {
@@ -116,16 +116,17 @@ TEST(ForceFeedbackPhone, DurationIsOfSixteenBits) {
     for (const char* duration : {"65536", "65535", "-1"}) {
         EXPECT_EQ(phone.call({"std", "on", duration})["exception"], 0) << duration;
     }
-    EXPECT_THAT(motorRequests(phone), ElementsAre("open O_RDWR", "upload 0 00000000", "event 0 1",
-                                                  "erase 0", "upload 65535 00000000", "event 0 1",
-                                                  "erase 0", "upload 65535 00000000", "event 0 1"));
+    EXPECT_THAT(motorRequests(phone),
+                ElementsAre("open motor O_RDWR", "upload 0 00000000", "event 0 1", "erase 0",
+                            "upload 65535 00000000", "event 0 1", "erase 0",
+                            "upload 65535 00000000", "event 0 1"));
 }
 
 TEST(ForceFeedbackPhone, OffBeforeAnyOnStopsNoEffect) {
     const Phone phone("ff");
     phone.reset();
     EXPECT_EQ(phone.call({"std", "off"})["exception"], 0);
-    EXPECT_THAT(motorRequests(phone), ElementsAre("open O_RDWR", "event 65535 0"));
+    EXPECT_THAT(motorRequests(phone), ElementsAre("open motor O_RDWR", "event 65535 0"));
 }
 
 TEST(ForceFeedbackPhone, OnAfterAnEffectStartsThatEffectAgain) {
