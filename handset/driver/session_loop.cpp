@@ -99,7 +99,7 @@ bool SessionLoop::waitForRequest() const {
 
 void SessionLoop::settle(std::chrono::milliseconds patience) const {
     const auto end = std::chrono::steady_clock::now() + patience;
-    while (!isSettled() && std::chrono::steady_clock::now() < end) {
+    while (!finished_ && !isSettled() && std::chrono::steady_clock::now() < end) {
         std::this_thread::sleep_for(kSettlePause);
     }
 }

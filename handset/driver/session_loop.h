@@ -32,8 +32,8 @@ class SessionLoop {
     ~SessionLoop();
 
     /// Waits until the files closed so far have been released: a close may return before the
-    /// driver is told of it. Gives up after `patience`, as callers that are kept waiting may have
-    /// brought the serving to a halt.
+    /// driver is told of it. Gives up when the loop has ended, and after `patience`, as callers
+    /// that are kept waiting may have brought the serving to a halt.
     void settle(std::chrono::milliseconds patience) const;
 
   private:
