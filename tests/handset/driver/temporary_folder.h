@@ -13,7 +13,7 @@ namespace handset {
 class TemporaryFolder {
   public:
     TemporaryFolder() {
-        std::string path = "/tmp/handset-test-XXXXXX";
+        std::string path = std::filesystem::temp_directory_path() / "handset-test-XXXXXX";
         if (mkdtemp(path.data()) != nullptr) path_ = path;
     }
     ~TemporaryFolder() { std::filesystem::remove_all(path_); }

@@ -142,7 +142,7 @@ class OneSession(unittest.TestCase):
 
     def test_nothing_is_left_in_the_temporary_folder(self):
         ours = [name for name in set(os.listdir(tempfile.gettempdir())) - self.before
-                if name.startswith("handset")]
+                if name.startswith("handset") and not name.startswith("handset-test-")]
         self.assertEqual(ours, [])
 
 
