@@ -1,13 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // What compiling a composite waveform costs for each token of its text, beside a bare scan: a pass
 // over the same bytes that finds where the tokens begin and does nothing with them. Both start from
 // a fresh copy of the text, because the compiler cuts it up.
 //
 // The texts are those the service sends: the loop of one wavetable entry, the longest composition
 // that a client may ask for, and a text that fills the driver's buffer.
-#include <benchmark/benchmark.h>
-#include <fmt/format.h>
-
 #include <algorithm>
 #include <cstdint>
 #include <cstring>
@@ -15,12 +13,15 @@
 #include <string>
 #include <vector>
 
-#include "CompositeWaveform.h"
+#include <benchmark/benchmark.h>
+#include <fmt/format.h>
+
+#include "HwApi.h"
 
 namespace {
 
+using aidl::android::hardware::vibrator::HwApi;
 using aidl::android::hardware::vibrator::WT_TYPE10_COMP_BUFFER_SIZE;
-using aidl::android::hardware::vibrator::wt_type10_comp_str_to_bin;
 
 constexpr int kRepetitions = 9;
 
@@ -108,7 +109,7 @@ int main(int argc, char** argv) {
                                          alignas(int16_t)
                                                  uint8_t bytes[WT_TYPE10_COMP_BUFFER_SIZE] = {};
                                          measure(state, text.text, [&bytes](char* copy) {
-                                             return wt_type10_comp_str_to_bin(copy, bytes);
+                                             return HwApi::wt_type10_comp_str_to_bin(copy, bytes);
                                          });
                                      })
                 ->MinTime(0.05)

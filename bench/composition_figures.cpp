@@ -1,18 +1,20 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Runs inside the guest and prints how late clients hear that their composition is over: the time
 // from the call to the callback, less the composition's length. Beside it, how late a plain sleep
 // of that length ends in this process, which is the least that can be expected here.
 //
 // Compositions and sleeps take turns, so that whatever else the machine does falls on both alike.
-#include <fmt/format.h>
 #include <time.h>
 
 #include <algorithm>
 #include <cstdio>
 #include <vector>
 
-#include "command.h"
-#include "composition_client.h"
+#include <fmt/format.h>
+
+#include "tests/support/command.h"
+#include "tests/system/composition_client.h"
 
 namespace {
 

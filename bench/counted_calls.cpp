@@ -2,7 +2,7 @@
 //
 // The tracer. The traced process says where the counted part begins and ends with two signals,
 // which it is never given.
-#include "counted_calls.h"
+#include "bench/counted_calls.h"
 
 #include <fcntl.h>
 #include <signal.h>
@@ -73,7 +73,7 @@ std::string nameOf(long number) {
 
 class Tracer {
   public:
-    explicit Tracer(pid_t process) : process_(process) {}
+    explicit Tracer(pid_t process) : mProcess(process) {}
 
     std::optional<CallCounts> run();
 
@@ -82,29 +82,29 @@ class Tracer {
     void enter(pid_t thread, uint64_t number, const uint64_t* arguments);
     void leave(pid_t thread, int64_t result);
     static bool isNodePath(pid_t thread, uint64_t address);
-    bool counts(pid_t thread) const { return begun_ && (thread != process_ || !ended_); }
+    bool counts(pid_t thread) const { return mBegun && (thread != mProcess || !mEnded); }
 
-    const pid_t process_;
-    bool begun_ = false;
-    bool ended_ = false;
-    std::set<pid_t> openingNode_;  // threads within an open of a driver's file
-    std::set<uint64_t> nodes_;     // descriptors of the driver's files
-    CallCounts counts_;
+    const pid_t mProcess;
+    bool mBegun = false;
+    bool mEnded = false;
+    std::set<pid_t> mOpeningNode;  // threads within an open of a driver's file
+    std::set<uint64_t> mNodes;     // descriptors of the driver's files
+    CallCounts mCounts;
 };
 
 std::optional<CallCounts> Tracer::run() {
     int status = 0;
-    if (waitpid(process_, &status, 0) != process_ || !WIFSTOPPED(status)) return std::nullopt;
+    if (waitpid(mProcess, &status, 0) != mProcess || !WIFSTOPPED(status)) return std::nullopt;
     constexpr long kOptions = PTRACE_O_TRACESYSGOOD | PTRACE_O_TRACECLONE | PTRACE_O_EXITKILL;
-    ptrace(PTRACE_SETOPTIONS, process_, nullptr, kOptions);
-    ptrace(PTRACE_SYSCALL, process_, nullptr, nullptr);
+    ptrace(PTRACE_SETOPTIONS, mProcess, nullptr, kOptions);
+    ptrace(PTRACE_SYSCALL, mProcess, nullptr, nullptr);
     for (;;) {
         const pid_t thread = waitpid(-1, &status, __WALL);
         if (thread < 0) return std::nullopt;
         if (!WIFSTOPPED(status)) {
-            if (thread != process_) continue;
-            const bool isWhole = WIFEXITED(status) && WEXITSTATUS(status) == 0 && ended_;
-            return isWhole ? std::optional(counts_) : std::nullopt;
+            if (thread != mProcess) continue;
+            const bool isWhole = WIFEXITED(status) && WEXITSTATUS(status) == 0 && mEnded;
+            return isWhole ? std::optional(mCounts) : std::nullopt;
         }
         const int signal = serve(thread, status) ? 0 : WSTOPSIG(status);
         ptrace(PTRACE_SYSCALL, thread, nullptr, signal);
@@ -125,10 +125,10 @@ bool Tracer::serve(pid_t thread, int status) {
             return true;
         }
         case kBegin:
-            begun_ = true;
+            mBegun = true;
             return true;
         case kEnd:
-            ended_ = true;
+            mEnded = true;
             return true;
         case SIGTRAP:  // a thread was made
         case SIGSTOP:  // it begins
@@ -143,25 +143,25 @@ void Tracer::enter(pid_t thread, uint64_t number, const uint64_t* arguments) {
     bool isNode = false;
     if (number == SYS_openat) {
         isNode = isNodePath(thread, arguments[1]);
-        if (isNode) openingNode_.insert(thread);
+        if (isNode) mOpeningNode.insert(thread);
     } else if (number == SYS_write || number == SYS_ioctl || number == SYS_close) {
-        isNode = nodes_.count(descriptor) != 0;
-        if (number == SYS_close) nodes_.erase(descriptor);
+        isNode = mNodes.count(descriptor) != 0;
+        if (number == SYS_close) mNodes.erase(descriptor);
     }
     if (!counts(thread) || number == SYS_tgkill) return;
     if (isNode) {
-        ++counts_.node;
+        ++mCounts.node;
     } else {
-        ++counts_.other[nameOf(static_cast<long>(number))];
+        ++mCounts.other[nameOf(static_cast<long>(number))];
     }
 }
 
 void Tracer::leave(pid_t thread, int64_t result) {
-    if (openingNode_.erase(thread) != 0 && result >= 0)
-        nodes_.insert(static_cast<uint64_t>(result));
+    if (mOpeningNode.erase(thread) != 0 && result >= 0)
+        mNodes.insert(static_cast<uint64_t>(result));
 }
 
-// The driver's files are opened below the working folder, everything else from the root.
+// The driver's files are opened below the working directory, everything else from the root.
 bool Tracer::isNodePath(pid_t thread, uint64_t address) {
     const long word = ptrace(PTRACE_PEEKDATA, thread, address, nullptr);
     char first = '\0';

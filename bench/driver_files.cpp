@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 //
 // The C library's functions as this program has them.
-#include "driver_files.h"
+#include "bench/driver_files.h"
 
 #include <dlfcn.h>
 #include <fcntl.h>
@@ -36,14 +36,14 @@ Function* next(const char* name) {
 
 }  // namespace
 
-void enterPhone(const PhoneFiles& phone, const std::string& folder) {
+void enterPhone(const PhoneFiles& phone, const std::string& directory) {
     for (const auto& [path, text] : phone.files) {
-        const std::string file = folder + path;
+        const std::string file = directory + path;
         std::filesystem::create_directories(std::filesystem::path(file).parent_path());
         std::ofstream(file) << text;
     }
-    std::filesystem::create_directories(folder);
-    std::filesystem::current_path(folder);
+    std::filesystem::create_directories(directory);
+    std::filesystem::current_path(directory);
 }
 
 void joinThreads() {
@@ -60,7 +60,7 @@ int open(const char* path, int flags, ...) {
     va_start(arguments, flags);
     const mode_t mode = (flags & O_CREAT) != 0 ? va_arg(arguments, mode_t) : 0;
     va_end(arguments);
-    // Without its first slash a path begins at the working folder.
+    // Without its first slash a path begins at the working directory.
     return static_cast<int>(syscall(SYS_openat, AT_FDCWD,
                                     bench::isDriverPath(path) ? path + 1 : path, flags, mode));
 }

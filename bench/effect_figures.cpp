@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Prints what a predefined effect costs on each kind of phone: the system calls of one perform()
 // and the user-space instructions that it takes, beside a bare loop that makes the same calls on
 // the same nodes. Both are counted, not timed, so a busy machine prints the same figures as an idle
@@ -10,7 +11,6 @@
 #include <sys/ioctl.h>
 #include <sys/wait.h>
 #include <unistd.h>
-#include <valgrind/callgrind.h>
 
 #include <cstdint>
 #include <cstdio>
@@ -27,13 +27,14 @@
 
 #include <android-base/logging.h>
 #include <fmt/format.h>
+#include <valgrind/callgrind.h>
 
 #include "HwApi.h"
 #include "Vibrator.h"
-#include "counted_calls.h"
-#include "driver_files.h"
-#include "effect_phones.h"
-#include "temporary_work.h"
+#include "bench/counted_calls.h"
+#include "bench/driver_files.h"
+#include "bench/effect_phones.h"
+#include "bench/temporary_work.h"
 
 namespace {
 
@@ -83,21 +84,21 @@ void playBare(const DriverCalls& calls, int motor) {
 // One effect of one phone, played by the service and bare.
 class Player {
   public:
-    Player(const Phone& phone, const std::string& folder) : phone_(phone) {
-        bench::enterPhone(phone.files, folder);
-        service_ = ndk::SharedRefBase::make<Vibrator>(std::make_shared<HwApi>());
-        motor_ = open(kMotor, O_RDWR);
+    Player(const Phone& phone, const std::string& directory) : mPhone(phone) {
+        bench::enterPhone(phone.files, directory);
+        mService = ndk::SharedRefBase::make<Vibrator>(std::make_shared<HwApi>());
+        mMotor = open(kMotor, O_RDWR);
     }
 
     void perform(size_t effect) {
         int32_t milliseconds = 0;
-        if (!service_->perform(kEffects[effect], EffectStrength::STRONG, nullptr, &milliseconds)
+        if (!mService->perform(kEffects[effect], EffectStrength::STRONG, nullptr, &milliseconds)
                      .isOk()) {
             abort();
         }
     }
 
-    void performBare(size_t effect) { playBare(phone_.calls[effect], motor_); }
+    void performBare(size_t effect) { playBare(mPhone.calls[effect], mMotor); }
 
     void warmUp(size_t effect) {
         for (int i = 0; i < kWarmUps; ++i) {
@@ -108,9 +109,9 @@ class Player {
     }
 
   private:
-    const Phone& phone_;
-    std::shared_ptr<Vibrator> service_;
-    int motor_ = -1;
+    const Phone& mPhone;
+    std::shared_ptr<Vibrator> mService;
+    int mMotor = -1;
 };
 
 // Log lines are written, as on a phone, but nobody has to read them.
@@ -128,11 +129,11 @@ struct EffectCalls {
 };
 
 std::optional<EffectCalls> countEffect(const Phone& phone, size_t effect,
-                                       const std::string& folder) {
+                                       const std::string& directory) {
     std::unique_ptr<Player> player;
     const auto prepare = [&] {
         discardLog();
-        player = std::make_unique<Player>(phone, folder + "/" + phone.files.name);
+        player = std::make_unique<Player>(phone, directory + "/" + phone.files.name);
         player->warmUp(effect);
     };
     const auto prepareQuiet = [&] {
@@ -148,7 +149,7 @@ std::optional<EffectCalls> countEffect(const Phone& phone, size_t effect,
     return EffectCalls{*shipped, *quiet, *bare};
 }
 
-bool printCalls(const std::string& folder) {
+bool printCalls(const std::string& directory) {
     fmt::print(
             "System calls of one perform(): those on the driver's nodes beside a bare loop that "
             "makes the same,\nwhat else it takes with the log off, and what the log adds\n\n"
@@ -157,7 +158,7 @@ bool printCalls(const std::string& folder) {
     std::map<std::string, int> others;
     for (const Phone& phone : effectPhones()) {
         for (size_t effect = 0; effect < std::size(kEffects); ++effect) {
-            const auto calls = countEffect(phone, effect, folder);
+            const auto calls = countEffect(phone, effect, directory);
             if (!calls) {
                 fmt::print(stderr,
                            "effect_figures: {} {}: the request failed, or a process may not be "
@@ -190,14 +191,14 @@ void countInstructions(const std::function<void()>& request) {
 }
 
 // The second run: plays every effect of every phone in each way, one dump of Valgrind's each.
-int playAll(const std::string& folder) {
+int playAll(const std::string& directory) {
     discardLog();
     // A process that has had a thread takes a longer way through the C library's system calls; the
     // service has from its first double click on, and so have all that is counted here.
     std::thread([] {}).detach();
     bench::joinThreads();
     for (const Phone& phone : effectPhones()) {
-        Player player(phone, folder + "/" + phone.files.name);
+        Player player(phone, directory + "/" + phone.files.name);
         for (size_t effect = 0; effect < std::size(kEffects); ++effect) {
             const auto perform = [&] {
                 player.perform(effect);
@@ -224,13 +225,14 @@ std::optional<uint64_t> readTotal(const std::string& path) {
     return std::nullopt;
 }
 
-bool runUnderValgrind(const std::string& folder, const std::string& dumps) {
+bool runUnderValgrind(const std::string& directory, const std::string& dumps) {
     const std::string self = std::filesystem::read_symlink("/proc/self/exe");
     const std::string output = "--callgrind-out-file=" + dumps;
     // Without --vgdb=no a run that is interrupted leaves valgrind's debugger pipes behind.
     const char* const words[] = {
-            "valgrind",     "-q",         "--tool=callgrind", "--vgdb=no",    "--instr-atstart=no",
-            output.c_str(), self.c_str(), "--play",           folder.c_str(), nullptr};
+            "valgrind",           "-q",           "--tool=callgrind", "--vgdb=no",
+            "--instr-atstart=no", output.c_str(), self.c_str(),       "--play",
+            directory.c_str(),    nullptr};
     pid_t process = 0;
     const int error = posix_spawnp(&process, words[0], nullptr, nullptr,
                                    const_cast<char* const*>(words), environ);
@@ -238,9 +240,9 @@ bool runUnderValgrind(const std::string& folder, const std::string& dumps) {
     return error == 0 && waitpid(process, &status, 0) == process && status == 0;
 }
 
-bool printInstructions(const std::string& folder) {
-    const std::string dumps = folder + "/instructions";
-    if (!runUnderValgrind(folder, dumps)) {
+bool printInstructions(const std::string& directory) {
+    const std::string dumps = directory + "/instructions";
+    if (!runUnderValgrind(directory, dumps)) {
         fmt::print(stderr, "effect_figures: valgrind is missing or failed\n");
         return false;
     }
@@ -278,7 +280,7 @@ int main(int argc, char** argv) {
         fmt::print(stderr, "effect_figures: takes no arguments\n");
         return 2;
     }
-    return bench::runInTemporaryFolder([](const std::string& folder) {
-        return printCalls(folder) && printInstructions(folder) ? 0 : 1;
+    return bench::runInTemporaryDirectory([](const std::string& directory) {
+        return printCalls(directory) && printInstructions(directory) ? 0 : 1;
     });
 }

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 //
 // The phones and their effects' calls.
-#include "effect_phones.h"
+#include "bench/effect_phones.h"
 
 namespace bench {
 namespace {
@@ -19,33 +19,33 @@ DriverCalls operator+(DriverCalls first, const DriverCalls& second) {
 }
 
 // Switching the motor on, on either class.
-DriverCalls start(const std::string& folder, const std::string& milliseconds) {
-    if (folder == kTimedOutput) return {node(folder + "enable", milliseconds + "\n")};
-    return {node(folder + "state", "1\n"), node(folder + "duration", milliseconds + "\n"),
-            node(folder + "activate", "1\n")};
+DriverCalls start(const std::string& directory, const std::string& milliseconds) {
+    if (directory == kTimedOutput) return {node(directory + "enable", milliseconds + "\n")};
+    return {node(directory + "state", "1\n"), node(directory + "duration", milliseconds + "\n"),
+            node(directory + "activate", "1\n")};
 }
 
-DriverCalls intensity(const std::string& folder) {
-    return {node(folder + "intensity", "10000\n")};
+DriverCalls intensity(const std::string& directory) {
+    return {node(directory + "intensity", "10000\n")};
 }
 
-DriverCalls pattern(const std::string& folder, const std::string& index) {
-    return intensity(folder) + DriverCalls{node(folder + "cp_trigger_index", index + "\n")} +
-           start(folder, "1000");
+DriverCalls pattern(const std::string& directory, const std::string& index) {
+    return intensity(directory) + DriverCalls{node(directory + "cp_trigger_index", index + "\n")} +
+           start(directory, "1000");
 }
 
-DriverCalls packet(const std::string& folder, const std::string& text) {
-    return DriverCalls{node(folder + "haptic_engine", text)} + start(folder, "1");
+DriverCalls packet(const std::string& directory, const std::string& text) {
+    return DriverCalls{node(directory + "haptic_engine", text)} + start(directory, "1");
 }
 
-DriverCalls pulse(const std::string& folder) {
-    return intensity(folder) + start(folder, "7");
+DriverCalls pulse(const std::string& directory) {
+    return intensity(directory) + start(directory, "7");
 }
 
-DriverCalls doubleClick(const std::string& folder) {
-    const std::string stop = folder == kTimedOutput ? "enable" : "activate";
-    return intensity(folder) + DriverCalls{node(folder + stop, "0\n")} + start(folder, "10") +
-           start(folder, "15");
+DriverCalls doubleClick(const std::string& directory) {
+    const std::string stop = directory == kTimedOutput ? "enable" : "activate";
+    return intensity(directory) + DriverCalls{node(directory + stop, "0\n")} +
+           start(directory, "10") + start(directory, "15");
 }
 
 DriverCalls storedEffect() {
@@ -55,14 +55,14 @@ DriverCalls storedEffect() {
             {DriverCall::Kind::kEvent, "", ""}};
 }
 
-PhoneFiles sysfsFiles(const char* name, const std::string& folder,
+PhoneFiles sysfsFiles(const char* name, const std::string& directory,
                       const std::vector<std::string>& leaves) {
     PhoneFiles files = {name, {}};
     const std::vector<std::string> start =
-            folder == kTimedOutput ? std::vector<std::string>{"enable"}
-                                   : std::vector<std::string>{"state", "duration", "activate"};
-    for (const std::string& leaf : start) files.files.emplace_back(folder + leaf, "");
-    for (const std::string& leaf : leaves) files.files.emplace_back(folder + leaf, "");
+            directory == kTimedOutput ? std::vector<std::string>{"enable"}
+                                      : std::vector<std::string>{"state", "duration", "activate"};
+    for (const std::string& leaf : start) files.files.emplace_back(directory + leaf, "");
+    for (const std::string& leaf : leaves) files.files.emplace_back(directory + leaf, "");
     return files;
 }
 
@@ -70,19 +70,21 @@ PhoneFiles sysfsFiles(const char* name, const std::string& folder,
 
 std::vector<Phone> effectPhones() {
     std::vector<Phone> all;
-    for (const std::string& folder : {kTimedOutput, kLeds}) {
-        const bool isLegacy = folder == kTimedOutput;
+    for (const std::string& directory : {kTimedOutput, kLeds}) {
+        const bool isLegacy = directory == kTimedOutput;
         all.push_back({sysfsFiles(isLegacy ? "legacy-prebaked-index" : "leds-prebaked-index",
-                                  folder, {"intensity", "cp_trigger_index"}),
-                       {pattern(folder, "10"), pattern(folder, "14"), pattern(folder, "50"),
-                        pattern(folder, "23")}});
-        all.push_back({sysfsFiles(isLegacy ? "legacy-haptic-engine" : "leds-haptic-engine", folder,
-                                  {"intensity", "haptic_engine"}),
-                       {pulse(folder), doubleClick(folder), packet(folder, "4 7 10000 2050 0\n"),
-                        packet(folder, "4 7 10000 2000 1\n")}});
-        all.push_back({sysfsFiles(isLegacy ? "legacy-amplitude" : "leds-amplitude", folder,
-                                  {"intensity"}),
-                       {pulse(folder), doubleClick(folder), pulse(folder), pulse(folder)}});
+                                  directory, {"intensity", "cp_trigger_index"}),
+                       {pattern(directory, "10"), pattern(directory, "14"),
+                        pattern(directory, "50"), pattern(directory, "23")}});
+        all.push_back(
+                {sysfsFiles(isLegacy ? "legacy-haptic-engine" : "leds-haptic-engine", directory,
+                            {"intensity", "haptic_engine"}),
+                 {pulse(directory), doubleClick(directory), packet(directory, "4 7 10000 2050 0\n"),
+                  packet(directory, "4 7 10000 2000 1\n")}});
+        all.push_back(
+                {sysfsFiles(isLegacy ? "legacy-amplitude" : "leds-amplitude", directory,
+                            {"intensity"}),
+                 {pulse(directory), doubleClick(directory), pulse(directory), pulse(directory)}});
     }
     all.push_back({{"ff",
                     {{"/proc/bus/input/devices",

@@ -7,7 +7,7 @@
 #include <string>
 #include <vector>
 
-#include "driver_files.h"
+#include "bench/driver_files.h"
 
 namespace bench {
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 //
 // The work is a child; this process only waits, forwards the end and tidies up.
-#include "temporary_work.h"
+#include "bench/temporary_work.h"
 
 #include <signal.h>
 #include <sys/wait.h>
@@ -27,10 +27,10 @@ void endGroup(int signal) {
 
 }  // namespace
 
-int runInTemporaryFolder(const std::function<int(const std::string& folder)>& work) {
-    std::string folder = std::filesystem::temp_directory_path() / "figures.XXXXXX";
-    if (mkdtemp(folder.data()) == nullptr) {
-        perror("no temporary folder");
+int runInTemporaryDirectory(const std::function<int(const std::string& directory)>& work) {
+    std::string directory = std::filesystem::temp_directory_path() / "figures.XXXXXX";
+    if (mkdtemp(directory.data()) == nullptr) {
+        perror("no temporary directory");
         return 1;
     }
     // Held back until there is a group to end.
@@ -43,7 +43,7 @@ int runInTemporaryFolder(const std::function<int(const std::string& folder)>& wo
     if (child == 0) {
         setpgid(0, 0);
         sigprocmask(SIG_SETMASK, &before, nullptr);
-        exit(work(folder));  // flushes what was printed
+        exit(work(directory));  // flushes what was printed
     }
     int status = 1 << 8;
     if (child > 0) {
@@ -55,7 +55,7 @@ int runInTemporaryFolder(const std::function<int(const std::string& folder)>& wo
         }
     }
     std::error_code ignored;
-    std::filesystem::remove_all(folder, ignored);
+    std::filesystem::remove_all(directory, ignored);
     return WIFSIGNALED(status) ? 128 + WTERMSIG(status) : WEXITSTATUS(status);
 }
 

@@ -8,9 +8,9 @@
 
 namespace bench {
 
-// Runs `work` with a new folder, in a process group of its own. The folder is removed at the end,
+// Runs `work` with a new directory, in a process group of its own. The directory is removed at the end,
 // and the group ended when this process is told to end (SIGHUP, SIGINT, SIGTERM). The work's
 // result, which is an exit status; 128 and the signal's number when a signal ended it.
-int runInTemporaryFolder(const std::function<int(const std::string& folder)>& work);
+int runInTemporaryDirectory(const std::function<int(const std::string& directory)>& work);
 
 }  // namespace bench

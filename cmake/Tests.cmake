@@ -17,8 +17,16 @@
 #       the service through binder and the journal alone, so a build that takes another one's handset
 #       takes the program from there too.
 #
-#   qvx_add_python_test(SUITE FILE [LABEL label] [TIMEOUT seconds] [ENVIRONMENT NAME=VALUE ...])
-#       The unittest file FILE.py of the folder as the test SUITE.FILE. The default label is "unit".
+#   qvx_add_python_test(SUITE FILE [LABEL labels] [TIMEOUT seconds] [ENVIRONMENT NAME=VALUE ...])
+#       The unittest file FILE.py of the directory as the test SUITE.FILE. The default label is
+#       "unit".
+
+# Including this file also sets how the including directory's tests are compiled: at the level that
+# the binder headers are read at, the same everywhere, so that one set of precompiled headers serves
+# every test; and for the time they take to compile, while what they test is optimised as elsewhere.
+add_compile_definitions(__ANDROID_API__=31)
+add_compile_options(-O0)
+qvx_without_hardening()
 
 find_package(GTest REQUIRED)
 find_package(nlohmann_json REQUIRED)
@@ -26,7 +34,7 @@ include(GoogleTest)
 
 set(QVX_GUEST_TESTS "all" CACHE STRING
     "Guest test programs of this build: \"all\", or their names. Emulated Arm is slow, so its build
-    runs the whole road of a request, and leaves the rest to the others")
+    runs the whole request path, and leaves the rest to the others")
 
 set(QVX_HANDSET_BUILD "${CMAKE_BINARY_DIR}" CACHE PATH
     "Build whose handset and client the guest tests use. A sanitizer's build takes the release one's,
@@ -36,10 +44,10 @@ set(QVX_HANDSET_BUILD "${CMAKE_BINARY_DIR}" CACHE PATH
 # emulating Arm takes about three times as long as emulating the machine's own kind.
 if(CMAKE_SYSTEM_PROCESSOR STREQUAL "aarch64")
     set(guest_architecture arm64)
-    set(guest_patience 3)
+    set(timeout_factor 3)
 else()
     set(guest_architecture amd64)
-    set(guest_patience 1)
+    set(timeout_factor 1)
 endif()
 
 # The headers that cost most of a test's compile time, compiled once a build.
@@ -79,13 +87,14 @@ function(qvx_add_guest_test name)
     if(NOT arg_TIMEOUT)
         set(arg_TIMEOUT 300)
     endif()
-    math(EXPR timeout "${arg_TIMEOUT} * ${guest_patience}")
+    math(EXPR timeout "${arg_TIMEOUT} * ${timeout_factor}")
     math(EXPR ctest_timeout "${timeout} + 60")
     add_executable(${name} ${arg_SOURCES})
     target_link_libraries(${name} PRIVATE ${arg_LIBRARIES} guest_main)
     target_precompile_headers(${name} REUSE_FROM test_headers)
-    # Only a build that holds the handset can boot one.
-    if(NOT (TARGET handset-agent OR NOT QVX_HANDSET_BUILD STREQUAL CMAKE_BINARY_DIR)
+    # Only a build that holds the handset can boot one; which target it has is not known yet where a
+    # component that comes before it declares its tests.
+    if(NOT ("handset" IN_LIST QVX_COMPONENTS OR NOT QVX_HANDSET_BUILD STREQUAL CMAKE_BINARY_DIR)
        OR NOT (QVX_GUEST_TESTS STREQUAL "all" OR name IN_LIST QVX_GUEST_TESTS))
         set_target_properties(${name} PROPERTIES EXCLUDE_FROM_ALL ON)
         return()
@@ -117,9 +126,9 @@ function(qvx_add_python_test suite file)
     set(name ${QVX_TEST_PREFIX}${suite}.${file})
     add_test(NAME ${name} COMMAND /usr/bin/python3 -B -m unittest -v ${file}
              WORKING_DIRECTORY ${CMAKE_CURRENT_SOURCE_DIR})
-    set_tests_properties(${name} PROPERTIES LABELS ${arg_LABEL} TIMEOUT ${arg_TIMEOUT}
+    set_tests_properties(${name} PROPERTIES LABELS "${arg_LABEL}" TIMEOUT ${arg_TIMEOUT}
                          ENVIRONMENT "${arg_ENVIRONMENT}")
-    if(arg_LABEL STREQUAL guest)
+    if("guest" IN_LIST arg_LABEL)
         set_tests_properties(${name} PROPERTIES COST ${arg_TIMEOUT})
     endif()
 endfunction()

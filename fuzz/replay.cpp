@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Runs a fuzzer's harness once for each file of a folder, where there is no fuzzer to drive it:
+//
+// Runs a fuzzer's harness once for each file of a directory, where there is no fuzzer to drive it:
 // every build replays the inputs that are kept, with whatever compiler and sanitizers it has.
 #include <cstdint>
 #include <cstdio>
@@ -13,7 +14,7 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size);
 
 int main(int argc, char** argv) {
     if (argc != 2 || !std::filesystem::is_directory(argv[1])) {
-        std::fprintf(stderr, "usage: %s FOLDER\n", argv[0]);
+        std::fprintf(stderr, "usage: %s DIRECTORY\n", argv[0]);
         return 2;
     }
     LLVMFuzzerInitialize(&argc, &argv);

@@ -4,7 +4,6 @@
 // fields are joined by commas.
 #pragma once
 
-#include <array>
 #include <cstdint>
 #include <limits>
 #include <optional>
@@ -14,72 +13,70 @@
 #include <type_traits>
 #include <vector>
 
+#include <android-base/strings.h>
 #include <android/binder_enums.h>
 
 namespace vibctl {
 
-/// What is wrong with a piece of the command line, as one line; nothing when all is well.
+// What is wrong with a piece of the command line, as one line; nothing when all is well.
 using Problem = std::optional<std::string>;
 
-/// How a value of type T is written. A specialisation has
-///
-///     static Problem parse(std::string_view name, std::string_view word, T& value);
-///     static std::string accepted();    // what parse() takes, for help texts
-///
-/// `name` is the parameter's, for the problem's text. On a problem `value` is left as it was.
+// How a value of type T is written. A specialisation has
+//
+//     static Problem parse(const std::string& name, const std::string& word, T& value);
+//     static std::string accepted();    // what parse() takes, for help texts
+//
+// `name` is the parameter's, for the problem's text. On a problem `value` is left as it was.
 template <typename T>
 struct Argument;
 
-/// A whole number in decimal, with or without sign.
-Problem parseInteger(std::string_view name, std::string_view word, int64_t lowest, int64_t highest,
-                     int64_t& value);
+// A whole number in decimal, with or without sign.
+Problem parseInteger(const std::string& name, const std::string& word, int64_t lowest,
+                     int64_t highest, int64_t& value);
 
-/// One name of an enumeration.
+// One name of an enumeration.
 struct Enumerator {
     std::string name;
     int64_t value;
 };
 
-/// A name in any case, or any number of the backing type whether it has a name or not.
-Problem parseEnumerator(std::string_view name, std::string_view word,
+// A name in any case, or any number of the backing type whether it has a name or not.
+Problem parseEnumerator(const std::string& name, const std::string& word,
                         std::span<const Enumerator> enumerators, int64_t lowest, int64_t highest,
                         int64_t& value);
 
-/// "NAME 0, OTHER 1".
+// "NAME 0, OTHER 1".
 std::string listEnumerators(std::span<const Enumerator> enumerators);
 
-/// The pieces between commas; always at least one.
-std::vector<std::string_view> splitAtCommas(std::string_view text);
-
-/// True when the texts differ at most in the case of their letters.
-bool equalIgnoringCase(std::string_view left, std::string_view right);
+// A word as messages show it: in quotes, with everything but printable ASCII escaped.
+std::string inQuotes(std::string_view word);
 
 template <>
 struct Argument<int32_t> {
-    static Problem parse(std::string_view name, std::string_view word, int32_t& value);
+    static Problem parse(const std::string& name, const std::string& word, int32_t& value);
     static std::string accepted() { return "an integer"; }
 };
 
-/// `nan`, `inf` and `-inf` included.
+// `nan`, `inf` and `-inf` included.
 template <>
 struct Argument<float> {
-    static Problem parse(std::string_view name, std::string_view word, float& value);
+    static Problem parse(const std::string& name, const std::string& word, float& value);
     static std::string accepted() { return "a number, nan, inf or -inf"; }
 };
 
 template <>
 struct Argument<bool> {
-    static Problem parse(std::string_view name, std::string_view word, bool& value);
+    static Problem parse(const std::string& name, const std::string& word, bool& value);
     static std::string accepted() { return "true or false"; }
 };
 
 template <>
 struct Argument<std::string> {
-    static Problem parse(std::string_view, std::string_view word, std::string& value) {
+    static Problem parse(const std::string&, const std::string& word, std::string& value) {
         value = word;
         return std::nullopt;
     }
-    static std::string accepted() { return "a text"; }
+    static std::string accepted() { return "a string"; }
 };
 
 template <typename T>
@@ -95,7 +92,7 @@ struct Argument<T> {
         return all;
     }
 
-    static Problem parse(std::string_view name, std::string_view word, T& value) {
+    static Problem parse(const std::string& name, const std::string& word, T& value) {
         int64_t number = 0;
         Problem problem =
                 parseEnumerator(name, word, enumerators(), std::numeric_limits<Backing>::min(),
@@ -107,33 +104,31 @@ struct Argument<T> {
     static std::string accepted() { return listEnumerators(enumerators()) + ", or any number"; }
 };
 
-/// How many commas separate the names of a form like "DELAY_MS,PRIMITIVE,SCALE", plus one.
-Problem checkFieldCount(std::string_view form, std::span<const std::string_view> fields);
+// Checks that there are as many fields as names.
+Problem checkFieldCount(const std::vector<std::string>& names, std::span<const std::string> fields);
 
-/// Puts the packet in front of what is wrong with one of its fields.
+// Puts the packet in front of what is wrong with one of its fields.
 Problem inPacket(std::string_view packet, Problem problem);
 
-/// Parses `fields`, named by `form`, into `values`.
+// Parses `fields`, named by a form like "DELAY_MS,PRIMITIVE,SCALE", into `values`.
 template <typename... T>
-Problem parseFields(std::string_view form, std::span<const std::string_view> fields, T&... values) {
-    Problem problem = checkFieldCount(form, fields);
-    if (problem) return problem;
-    const std::vector<std::string_view> names = splitAtCommas(form);
+Problem parseFields(const std::string& form, std::span<const std::string> fields, T&... values) {
+    const std::vector<std::string> names = android::base::Split(form, ",");
+    Problem problem = checkFieldCount(names, fields);
     size_t index = 0;
     const auto parseNext = [&](auto& value) {
         using Value = std::remove_reference_t<decltype(value)>;
-        problem = Argument<Value>::parse(names[index], fields[index], value);
+        if (!problem) problem = Argument<Value>::parse(names[index], fields[index], value);
         ++index;
-        return !problem;
     };
-    static_cast<void>((parseNext(values) && ...));
+    (parseNext(values), ...);
     return problem;
 }
 
-/// Parses the packet `word`, whose fields are named by `form`, into `values`.
+// Parses the packet `word`, whose fields are named by `form`, into `values`.
 template <typename... T>
-Problem parsePacket(std::string_view form, std::string_view word, T&... values) {
-    const std::vector<std::string_view> fields = splitAtCommas(word);
+Problem parsePacket(const std::string& form, const std::string& word, T&... values) {
+    const std::vector<std::string> fields = android::base::Split(word, ",");
     return inPacket(word, parseFields(form, fields, values...));
 }
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 //
-// The methods of the maker's extension interface, and how its packets are written.
-#include "methods.h"
+// The methods of the vendor extension interface, and how its packets are written.
+#include "vibctl/methods.h"
 
 namespace vibctl {
 
@@ -12,7 +12,7 @@ using aidl::vendor::quorvan::hardware::vibrator::ZelPlaybackPacket;
 
 template <>
 struct Argument<ZelHapticEnginePacket> {
-    static Problem parse(std::string_view name, std::string_view word,
+    static Problem parse(const std::string& name, const std::string& word,
                          ZelHapticEnginePacket& value) {
         return parsePacket(name, word, value.time, value.intensity, value.frequency,
                            value.overdrive);
@@ -23,7 +23,7 @@ struct Argument<ZelHapticEnginePacket> {
 
 template <>
 struct Argument<ZelHybridHapticEnginePacket> {
-    static Problem parse(std::string_view name, std::string_view word,
+    static Problem parse(const std::string& name, const std::string& word,
                          ZelHybridHapticEnginePacket& value) {
         return parsePacket(name, word, value.time, value.intensity, value.type, value.value,
                            value.frequency);
@@ -37,7 +37,8 @@ struct Argument<ZelHybridHapticEnginePacket> {
 
 template <>
 struct Argument<ZelPlaybackPacket> {
-    static Problem parse(std::string_view name, std::string_view word, ZelPlaybackPacket& value) {
+    static Problem parse(const std::string& name, const std::string& word,
+                         ZelPlaybackPacket& value) {
         return parsePacket(name, word, value.patternIndex, value.level, value.option);
     }
 
@@ -49,7 +50,7 @@ namespace {
 constexpr Traits kMilliseconds{.show = Show::kMilliseconds};
 
 // clang-format off
-constexpr Method<IZelVibrator> kMethods[] = {
+constexpr Method kMethods[] = {
         row<&IZelVibrator::supportsAmplitudeControl>("supportsAmplitudeControl"),
         row<&IZelVibrator::supportsForceTouchAmplitudeControl>("supportsForceTouchAmplitudeControl"),
         row<&IZelVibrator::supportsFrequencyControl>("supportsFrequencyControl"),
@@ -83,7 +84,7 @@ constexpr Method<IZelVibrator> kMethods[] = {
 
 }  // namespace
 
-std::span<const Method<IZelVibrator>> extensionMethods() {
+std::span<const Method> extensionMethods() {
     return kMethods;
 }
 

@@ -1,120 +1,235 @@
 // SPDX-License-Identifier: Apache-2.0
 //
 // vibctl: calls any method of the vibrator service from the command line. `vibctl help` says how.
+#include <unistd.h>
+
+#include <algorithm>
 #include <cstdio>
 #include <exception>
 #include <string>
 #include <vector>
 
-#include <unistd.h>
-
-#include <android/binder_process.h>
+#include <android-base/file.h>
 #include <android/log.h>
 #include <fmt/format.h>
 
-#include "binder_client.h"
-#include "command_line.h"
-#include "doctor/binder_questions.h"
-#include "doctor/doctor.h"
-#include "outcome.h"
-#include "usage.h"
+#include "vibctl/binder_client.h"
+#include "vibctl/call_record.h"
+#include "vibctl/command_line.h"
+#include "vibctl/doctor/binder_questions.h"
+#include "vibctl/doctor/doctor.h"
+#include "vibctl/find_method.h"
+#include "vibctl/info.h"
+#include "vibctl/outcome.h"
+#include "vibctl/play/player.h"
+#include "vibctl/raw_call.h"
+#include "vibctl/service_call.h"
+#include "vibctl/usage.h"
+
+#define VIBCTL_QUOTED(version) #version
+#define VIBCTL_STRING(version) VIBCTL_QUOTED(version)
 
 namespace vibctl {
 namespace {
-
-Exit fail(const std::string& why, Exit status) {
-    fmt::print(stderr, "vibctl: {}\n", why);
-    return status;
-}
 
 Exit print(const std::string& text) {
     fmt::print("{}", text);
     return Exit::kOk;
 }
 
+// Prints what a call of the method came to.
 Exit report(const CommandLine& line, const std::string& iface, const std::string& method,
             const Outcome& outcome) {
-    fmt::print("{}\n", line.json ? jsonLine(iface, method, outcome) : humanLine(method, outcome));
+    if (line.json) {
+        fmt::print("{}\n", jsonLine(iface, method, outcome));
+    } else if (outcome.reached == Outcome::Reached::kCalled) {
+        fmt::print("{}\n", humanLine(method, outcome));
+    } else {
+        fmt::print(stderr, "{}\n", humanLine("vibctl", outcome));
+    }
     return exitStatusOf(outcome);
 }
 
-/// Makes the call and, where a completion is to come, waits for it. The service may call back as
-/// soon as it has the callback, hence a thread pool from the start.
-template <typename Interface>
-Outcome callWithCallback(Interface& service, const Method<Interface>& method,
-                         const typename Method<Interface>::Call& call,
-                         std::chrono::milliseconds limit) {
-    ABinderProcess_startThreadPool();
-    const auto callback = ndk::SharedRefBase::make<CompletionCallback>();
-    const auto before = CompletionCallback::Clock::now();
-    Outcome outcome = call(service, callback);
-    if (outcome.exception != EX_NONE || !method.traits.awaitsCompletion) return outcome;
-    using Milliseconds = std::chrono::milliseconds;
-    if (const auto when = callback->waitFor(limit)) {
-        outcome.completion = {Completion::Kind::kCompleted,
-                              std::chrono::duration_cast<Milliseconds>(*when - before).count()};
-    } else {
-        outcome.completion = {Completion::Kind::kTimedOut, limit.count()};
-    }
-    return outcome;
+Exit fail(const CommandLine& line, const std::string& problem) {
+    return report(line, line.command, line.method, wrongUsage(problem));
 }
 
-template <typename Interface>
-Exit runMethod(const CommandLine& line) {
-    const Method<Interface>* method = nullptr;
-    if (line.method == "help" || (line.method.empty() && line.help)) {
-        return print(helpOfInterface<Interface>());
+// Prints an outcome whose text is the answer itself, in lines of its own.
+Exit reportText(const CommandLine& line, const std::string& iface, const Outcome& outcome) {
+    if (line.json || outcome.exception != EX_NONE) {
+        return report(line, iface, line.command, outcome);
     }
-    if (const Problem problem = findMethod(line, method)) return fail(*problem, Exit::kUsage);
-    if (line.help) return print(helpOf(*method));
-    typename Method<Interface>::Call call;
-    if (const Problem problem = prepareCall(line, *method, call)) {
-        return fail(*problem, Exit::kUsage);
-    }
+    return print(outcome.text);
+}
 
-    Problem problem = checkBinder();
-    if (problem) return fail(*problem, Exit::kNoService);
-    const auto service = connect(static_cast<Interface*>(nullptr), problem);
-    if (problem) return fail(*problem, Exit::kNoService);
-    const Outcome outcome = line.callback ? callWithCallback(*service, *method, call, line.wait)
-                                          : call(*service, nullptr);
-    return report(line, ifaceOf<Interface>(), method->name, outcome);
+Exit runMethod(const CommandLine& line) {
+    if (line.help && line.method.empty()) return print(helpOfInterface(line.command));
+    const Method* method = nullptr;
+    if (const Problem problem = findMethod(line, method)) return fail(line, *problem);
+    if (line.help) return print(helpOf(line.command, *method));
+    Call call;
+    if (const Problem problem = prepareCall(line, *method, call)) return fail(line, *problem);
+    if (line.offOnInterrupt) turnOffOnInterrupt();
+    const Outcome outcome = callMethod(line, *method, call);
+    recordCall(line, method->name, outcome);
+    return report(line, line.command, method->name, outcome);
+}
+
+// "help std on" and "std help" are other spellings of "std on --help" and "std --help".
+Exit runHelp(CommandLine line) {
+    if (line.command == "help") {
+        line.command = line.method;
+        line.method = line.arguments.empty() ? "" : line.arguments.front();
+    } else {
+        line.method.clear();
+    }
+    line.help = true;
+    if (line.command == "std" || line.command == "ext") return runMethod(line);
+    return print(programHelp());
 }
 
 Exit runList(const CommandLine& line) {
-    if (!line.method.empty()) {
-        return fail("list takes no arguments; usage: vibctl [--json] list", Exit::kUsage);
+    const Problem problem = checkBinder(line.timeout);
+    return reportText(line, "manager", problem ? noService(*problem) : listServices());
+}
+
+Exit runInfo(const CommandLine& line) {
+    const Ask ask = [&line](const std::string& iface, const Call& call) {
+        return askService(iface, line.timeout,
+                          [call](const Service& service) { return call(*service, nullptr); });
+    };
+    return reportText(line, "", askEverything(ask));
+}
+
+// The interface that a command is to go to.
+Problem checkInterface(const CommandLine& line, const std::string& iface) {
+    if (iface == "std" || iface == "ext") return std::nullopt;
+    return fmt::format("{}: interface {} is neither std nor ext", line.command, inQuotes(iface));
+}
+
+Exit runDump(const CommandLine& line) {
+    const std::string iface = line.method.empty() ? "std" : line.method;
+    if (const Problem problem = checkInterface(line, iface)) return fail(line, *problem);
+    return reportText(line, iface, askService(iface, line.timeout, dump));
+}
+
+Exit runRaw(const CommandLine& line) {
+    RawCall call;
+    Problem problem = checkInterface(line, line.method);
+    if (!problem) problem = parseRawCall(line.arguments, call);
+    if (problem) return fail(line, *problem);
+    const auto send = [call](const Service& service) { return sendRaw(service, call); };
+    return report(line, line.method, "raw", askService(line.method, line.timeout, send));
+}
+
+// What is to be played: the steps of a pattern, or a file, "-" for standard input.
+Problem makePlan(const CommandLine& line, const std::string& text, const Offers& offers,
+                 Plan& plan) {
+    if (line.method.empty()) return "play needs steps or a file; see vibctl help";
+    if (isdigit(static_cast<unsigned char>(line.method[0])) != 0) {
+        Pattern pattern{{line.method}, line.amplitudes, line.repeat};
+        pattern.durations.insert(pattern.durations.end(), line.arguments.begin(),
+                                 line.arguments.end());
+        const Problem problem = planPattern(pattern, offers, plan);
+        return problem ? "play: " + *problem : problem;
     }
-    if (const Problem problem = checkBinder()) return fail(*problem, Exit::kNoService);
-    const Outcome outcome = listServices();
-    if (line.json || outcome.exception != EX_NONE) return report(line, "manager", "list", outcome);
-    for (const auto& name : outcome.result) fmt::print("{}\n", name.get<std::string>());
-    return Exit::kOk;
+    if (!line.arguments.empty()) return "play takes one file; see vibctl help";
+    if (!line.amplitudes.empty() || line.repeat != 1) {
+        return "play: --amplitudes and --repeat go with steps, not with a file";
+    }
+    const bool asAhap = line.method.ends_with(".ahap") || isAhap(text);
+    const Problem problem = asAhap ? planAhap(text, offers, plan) : planSequence(text, plan);
+    return problem ? line.method + ": " + *problem : problem;
+}
+
+Exit runPlay(const CommandLine& line) {
+    std::string text;
+    if (line.method == "-") {
+        android::base::ReadFdToString(STDIN_FILENO, &text);
+    } else if (!line.method.empty() && isdigit(static_cast<unsigned char>(line.method[0])) == 0 &&
+               !android::base::ReadFileToString(line.method, &text)) {
+        return fail(line, "play: cannot read " + inQuotes(line.method));
+    }
+    // What is wrong is said before anybody is asked or anything is played.
+    Plan plan;
+    if (const Problem problem = makePlan(line, text, {}, plan)) return fail(line, *problem);
+    turnOffOnInterrupt();
+    Outcome outcome;
+    const Offers offers = askOffers(line, outcome);
+    if (outcome.exception != EX_NONE) return report(line, "std", "play", outcome);
+    plan = {};
+    makePlan(line, text, offers, plan);
+    if (line.explain && !line.json) {
+        for (const std::string& note : plan.notes) fmt::print("{}\n", note);
+    }
+    std::string results;
+    outcome = playPlan(plan, line, [&](const TimedCall& call, const Outcome& one, int64_t late) {
+        const double at = static_cast<double>(call.at.count()) / 1000;
+        results += fmt::format(R"({}{{"at":{},"late_us":{},"exception":{}}})",
+                               results.empty() ? "" : ",", at, late, one.exception);
+        if (line.json) return;
+        fmt::print("{} ms, {:.1f} ms late: {} {}\n", at, static_cast<double>(late) / 1000,
+                   call.iface, humanLine(fmt::format("{}", fmt::join(call.words, " ")), one));
+    });
+    if (line.json) {
+        outcome.result = "[" + results + "]";
+        return report(line, "", "play", outcome);
+    }
+    return outcome.reached == Outcome::Reached::kCalled ? exitStatusOf(outcome)
+                                                        : report(line, "", "play", outcome);
 }
 
 Exit runDoctor(const CommandLine& line) {
-    if (!line.method.empty()) {
-        return fail("doctor takes no arguments; usage: vibctl [--json] doctor", Exit::kUsage);
-    }
     const std::vector<Finding> findings = diagnose(askOverBinder(), "/");
+    const bool coloured = isatty(STDOUT_FILENO) != 0;
     for (const Finding& finding : findings) {
-        fmt::print("{}\n", line.json ? jsonLine(finding) : humanLine(finding));
+        fmt::print("{}\n", line.json ? jsonLine(finding) : humanLine(finding, coloured));
     }
+    if (!line.json) fmt::print("{}\n", closingLine(findings));
     return allIsWell(findings) ? Exit::kOk : Exit::kException;
 }
 
-Exit run(const std::vector<std::string>& words) {
+constexpr size_t kAnyCount = SIZE_MAX;
+
+struct Command {
+    const char* name;
+    size_t mostWords;   // after the name
+    const char* words;  // as the usage shows them
+    Exit (*run)(const CommandLine& line);
+};
+
+// clang-format off
+constexpr Command kCommands[] = {
+        {"std", kAnyCount, "", runMethod},
+        {"ext", kAnyCount, "", runMethod},
+        {"info", 0, "", runInfo},
+        {"dump", 1, " [std|ext]", runDump},
+        {"raw", kAnyCount, "", runRaw},
+        {"play", kAnyCount, "", runPlay},
+        {"list", 0, "", runList},
+        {"doctor", 0, "", runDoctor},
+};
+// clang-format on
+
+Exit run(const std::vector<std::string>& all) {
     CommandLine line;
-    if (const Problem problem = parseCommandLine(words, line)) {
-        return fail(*problem, Exit::kUsage);
+    if (const Problem problem = parseCommandLine(all, line)) return fail(line, *problem);
+    if (line.version) return print("vibctl " VIBCTL_STRING(VIBCTL_VERSION) "\n");
+    if (line.command == "help" || line.method == "help") return runHelp(line);
+    const auto* const command =
+            std::find_if(std::begin(kCommands), std::end(kCommands),
+                         [&line](const Command& one) { return line.command == one.name; });
+    if (command == std::end(kCommands)) {
+        return line.help ? print(programHelp()) : fail(line, unknownCommand(line.command));
     }
-    if (line.version) return print("vibctl " VIBCTL_VERSION "\n");
-    if (line.command == "std") return runMethod<IVibrator>(line);
-    if (line.command == "ext") return runMethod<IZelVibrator>(line);
-    if (line.help || line.command == "help") return print(programHelp());
-    if (line.command == "list") return runList(line);
-    if (line.command == "doctor") return runDoctor(line);
-    return fail(unknownCommand(line.command), Exit::kUsage);
+    if (line.help && command->run != runMethod) return print(programHelp());
+    const size_t words = line.arguments.size() + (line.method.empty() ? 0 : 1);
+    if (words > command->mostWords) {
+        return fail(line, fmt::format("{} takes {} arguments; usage: vibctl [--json] {}{}",
+                                      command->name, command->mostWords == 0 ? "no" : "fewer",
+                                      command->name, command->words));
+    }
+    return command->run(line);
 }
 
 }  // namespace

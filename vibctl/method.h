@@ -10,46 +10,52 @@
 #include <memory>
 #include <span>
 #include <string>
-#include <string_view>
 #include <tuple>
 #include <type_traits>
 #include <utility>
 #include <vector>
 
 #include <aidl/android/hardware/vibrator/IVibratorCallback.h>
+#include <android-base/strings.h>
 #include <fmt/format.h>
 
-#include "arguments.h"
-#include "outcome.h"
+#include "vibctl/arguments.h"
+#include "vibctl/outcome.h"
 
 namespace vibctl {
 
 using Callback = std::shared_ptr<aidl::android::hardware::vibrator::IVibratorCallback>;
 using Words = std::span<const std::string>;
 
-/// What a row adds to the signature.
+// Makes a call of a service's interface, with the callback or null, and waits for its answer. The
+// service is of the interface whose method it is.
+using Call = std::function<Outcome(ndk::ICInterface& service, const Callback& callback)>;
+
+// What a row adds to the signature.
 struct Traits {
     Show show = Show::kPlain;
-    bool awaitsCompletion = false;  ///< a callback given with the call will hear onComplete()
+    bool awaitsCompletion = false;  // a callback given with the call will hear onComplete()
 };
 
-/// A method of `Interface`. Parameters stand on the command line in the order of declaration, but
-/// for a list of packets, which always comes last and takes all remaining words.
-template <typename Interface>
+// A method. Parameters stand on the command line in the order of declaration, but for a list of
+// packets, which always comes last and takes all remaining words.
 struct Method {
-    /// Makes the call, with the callback or null, and waits for its answer.
-    using Call = std::function<Outcome(Interface& service, const Callback& callback)>;
-
     const char* name;
-    const char* parameters;  ///< names as the usage shows them, separated by blanks
+    const char* parameters;  // names as the usage shows them, separated by spaces
     bool takesCallback;
+    bool hasResult;
     Traits traits;
 
-    /// Parses the arguments. On success `call` makes the call with them.
+    // Parses the arguments. On success `call` makes the call with them.
     Problem (*parse)(const Method& method, Words arguments, Call& call);
 
-    /// Per parameter what it accepts, in the order of `parameters`.
+    // Per parameter what it accepts, in the order of `parameters`.
     std::vector<std::string> (*accepted)();
+
+    std::vector<std::string> parameterNames() const {
+        if (*parameters == '\0') return {};
+        return android::base::Split(parameters, " ");
+    }
 };
 
 namespace internal {
@@ -59,7 +65,7 @@ constexpr bool kIsList = false;
 template <typename T>
 constexpr bool kIsList<std::vector<T>> = true;
 
-/// What a parameter of type P is to a caller.
+// What a parameter of type P is to a caller.
 template <typename P>
 struct Parameter {
     using Value = std::remove_cvref_t<std::remove_pointer_t<P>>;
@@ -70,61 +76,43 @@ struct Parameter {
     static constexpr bool kSingle = !kOut && !kCallback && !kList;
 };
 
-inline std::vector<std::string_view> splitAtBlanks(std::string_view text) {
-    std::vector<std::string_view> pieces;
-    while (!text.empty()) {
-        const size_t blank = text.find(' ');
-        pieces.push_back(text.substr(0, blank));
-        text.remove_prefix(blank == std::string_view::npos ? text.size() : blank + 1);
-    }
-    return pieces;
-}
-
-/// "PACKET..." without the dots.
-inline std::string_view withoutDots(std::string_view name) {
-    if (name.ends_with("...")) name.remove_suffix(3);
-    return name;
-}
-
 template <auto kMember>
 struct Binding;
 
 template <typename I, typename... P, ndk::ScopedAStatus (I::*kMember)(P...)>
 struct Binding<kMember> {
-    using Interface = I;
     using Values = std::tuple<typename Parameter<P>::Value...>;
 
     static constexpr size_t kSingles = (size_t{0} + ... + (Parameter<P>::kSingle ? 1 : 0));
     static constexpr bool kHasList = (false || ... || Parameter<P>::kList);
     static constexpr bool kTakesCallback = (false || ... || Parameter<P>::kCallback);
+    static constexpr bool kHasResult = (false || ... || Parameter<P>::kOut);
 
-    static Problem parse(const Method<I>& method, Words words, typename Method<I>::Call& call) {
+    static Problem parse(const Method& method, Words words, Call& call) {
         if (words.size() < kSingles || (!kHasList && words.size() > kSingles)) {
             return fmt::format("takes {}{} argument{}, got {}", kHasList ? "at least " : "",
                                kSingles, kSingles == 1 ? "" : "s", words.size());
         }
-        const std::vector<std::string_view> names = splitAtBlanks(method.parameters);
+        const std::vector<std::string> names = method.parameterNames();
         Values values{};
         Problem problem;
         size_t nextSingle = 0;
         [[maybe_unused]] const auto parseParameter = [&]<typename One>(std::type_identity<One>,
                                                                        auto& value) {
+            if (problem) return;
             if constexpr (Parameter<One>::kSingle) {
                 problem = parseOne(names[nextSingle], words[nextSingle], value);
                 ++nextSingle;
             } else if constexpr (Parameter<One>::kList) {
-                problem = parseList(withoutDots(names.back()), words.subspan(kSingles), value);
+                problem = parseList(names.back(), words.subspan(kSingles), value);
             }
-            return !problem;
         };
-        std::apply(
-                [&](auto&... value) {
-                    static_cast<void>((parseParameter(std::type_identity<P>(), value) && ...));
-                },
-                values);
+        std::apply([&](auto&... value) { (parseParameter(std::type_identity<P>(), value), ...); },
+                   values);
         if (problem) return problem;
-        call = [values, show = method.traits.show](I& service, const Callback& callback) mutable {
-            return makeCall(service, values, callback, show);
+        call = [values, show = method.traits.show](ndk::ICInterface& service,
+                                                   const Callback& callback) mutable {
+            return makeCall(static_cast<I&>(service), values, callback, show);
         };
         return std::nullopt;
     }
@@ -147,21 +135,23 @@ struct Binding<kMember> {
 
   private:
     template <typename T>
-    static Problem parseOne(std::string_view name, const std::string& word, T& value) {
+    static Problem parseOne(const std::string& name, const std::string& word, T& value) {
         return Argument<T>::parse(name, word, value);
     }
 
+    // `name` is the packet's form with three dots behind it.
     template <typename T>
-    static Problem parseList(std::string_view name, Words words, std::vector<T>& values) {
+    static Problem parseList(const std::string& name, Words words, std::vector<T>& values) {
+        const std::string form = name.substr(0, name.size() - 3);
         for (const std::string& word : words) {
             T value{};
-            if (Problem problem = Argument<T>::parse(name, word, value)) return problem;
+            if (Problem problem = Argument<T>::parse(form, word, value)) return problem;
             values.push_back(std::move(value));
         }
         return std::nullopt;
     }
 
-    /// A value as the method's parameter takes it.
+    // A value as the method's parameter takes it.
     template <typename One, typename Value>
     static decltype(auto) passOn(Value& value, const Callback& callback) {
         if constexpr (Parameter<One>::kOut) {
@@ -182,7 +172,9 @@ struct Binding<kMember> {
         const Clock::duration taken = Clock::now() - before;
 
         Outcome outcome = outcomeOf(status);
-        outcome.microseconds = std::chrono::duration_cast<std::chrono::microseconds>(taken).count();
+        using std::chrono::duration_cast, std::chrono::microseconds;
+        outcome.microseconds = duration_cast<microseconds>(taken).count();
+        outcome.sentMicroseconds = duration_cast<microseconds>(before.time_since_epoch()).count();
         if (!status.isOk()) return outcome;
         [[maybe_unused]] const auto report = [&]<typename One>(std::type_identity<One>,
                                                                const auto& value) {
@@ -198,12 +190,12 @@ struct Binding<kMember> {
 
 }  // namespace internal
 
-/// A row: `row<&IVibrator::on>("on", "TIMEOUT_MS")`.
+// A row: `row<&IVibrator::on>("on", "TIMEOUT_MS")`.
 template <auto kMember>
-constexpr auto row(const char* name, const char* parameters = "", Traits traits = {}) {
+constexpr Method row(const char* name, const char* parameters = "", Traits traits = {}) {
     using Binding = internal::Binding<kMember>;
-    return Method<typename Binding::Interface>{name,   parameters,      Binding::kTakesCallback,
-                                               traits, &Binding::parse, &Binding::accepted};
+    return {name,   parameters,      Binding::kTakesCallback, Binding::kHasResult,
+            traits, &Binding::parse, &Binding::accepted};
 }
 
 }  // namespace vibctl

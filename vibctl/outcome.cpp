@@ -1,20 +1,22 @@
 // SPDX-License-Identifier: Apache-2.0
 //
 // What a call came to, and how it is printed: see outcome.h.
-#include "outcome.h"
+#include "vibctl/outcome.h"
 
 #include <algorithm>
+#include <cmath>
 #include <iterator>
 
 #include <aidl/android/hardware/vibrator/IVibrator.h>
 #include <fmt/format.h>
+
+#include "vibctl/arguments.h"
 
 namespace vibctl {
 
 namespace {
 
 using aidl::android::hardware::vibrator::IVibrator;
-using nlohmann::ordered_json;
 
 struct NamedNumber {
     int32_t number;
@@ -78,7 +80,7 @@ std::string nameIn(const NamedNumber (&table)[count], int32_t number) {
     return row == std::end(table) ? std::to_string(number) : row->name;
 }
 
-/// "36 (AMPLITUDE_CONTROL COMPOSE_EFFECTS)"; bits without a name as one number at the end.
+// "36 (AMPLITUDE_CONTROL COMPOSE_EFFECTS)"; bits without a name as one number at the end.
 std::string capabilitiesText(int32_t capabilities) {
     std::string names;
     auto rest = static_cast<uint32_t>(capabilities);
@@ -105,16 +107,16 @@ const char* unitOf(Show show) {
     return "";
 }
 
-ordered_json jsonOf(const Completion& completion) {
+std::string jsonOf(const Completion& completion) {
     switch (completion.kind) {
         case Completion::Kind::kCompleted:
-            return completion.milliseconds;
+            return std::to_string(completion.milliseconds);
         case Completion::Kind::kTimedOut:
-            return "timeout";
+            return R"("timeout")";
         case Completion::Kind::kNotAwaited:
             break;
     }
-    return nullptr;
+    return "null";
 }
 
 std::string textOf(const Completion& completion) {
@@ -129,6 +131,41 @@ std::string textOf(const Completion& completion) {
     return "";
 }
 
+// What a failure means and where to look next; empty where its name says it all.
+std::string hintFor(const Outcome& outcome) {
+    switch (outcome.exception) {
+        case EX_SECURITY:
+            return "the caller may not; the extension answers users 0 and 1000";
+        case EX_ILLEGAL_ARGUMENT:
+            return "an argument was refused: see phone log, on a board logcat";
+        case EX_ILLEGAL_STATE:
+            return "the driver refused: see phone log, on a board logcat";
+        case EX_UNSUPPORTED_OPERATION:
+            return "this phone does not offer it: see vibctl info";
+        case EX_TRANSACTION_FAILED:
+            return "see vibctl doctor";
+        default:
+            return "";
+    }
+}
+
+// What people are shown, but for the method's name.
+std::string sentenceFor(const Outcome& outcome) {
+    using Reached = Outcome::Reached;
+    if (outcome.reached == Reached::kWrongUsage) return outcome.message;
+    if (outcome.reached == Reached::kNoService) return outcome.message + "; see vibctl doctor";
+    if (outcome.exception == EX_NONE) {
+        return fmt::format("ok{}{}{}", outcome.text.empty() ? "" : ", ", outcome.text,
+                           textOf(outcome.completion));
+    }
+    std::string line = exceptionName(outcome.exception);
+    if (outcome.exception == EX_TRANSACTION_FAILED) line += " " + statusName(outcome.status);
+    if (outcome.exception == EX_SERVICE_SPECIFIC) line += fmt::format(" {}", outcome.serviceError);
+    if (!outcome.message.empty()) line += ": " + outcome.message;
+    const std::string hint = hintFor(outcome);
+    return hint.empty() ? line : line + "; " + hint;
+}
+
 }  // namespace
 
 Outcome outcomeOf(const ndk::ScopedAStatus& status) {
@@ -140,35 +177,59 @@ Outcome outcomeOf(const ndk::ScopedAStatus& status) {
     return outcome;
 }
 
+Outcome wrongUsage(const std::string& message) {
+    Outcome outcome;
+    outcome.reached = Outcome::Reached::kWrongUsage;
+    outcome.message = message;
+    return outcome;
+}
+
+Outcome noService(const std::string& message) {
+    Outcome outcome = transportFailure(STATUS_NAME_NOT_FOUND, message);
+    outcome.reached = Outcome::Reached::kNoService;
+    return outcome;
+}
+
+Outcome transportFailure(binder_status_t status, const std::string& message) {
+    Outcome outcome;
+    outcome.exception = EX_TRANSACTION_FAILED;
+    outcome.status = status;
+    outcome.message = message;
+    return outcome;
+}
+
+Outcome noAnswer(std::chrono::milliseconds limit) {
+    return transportFailure(
+            STATUS_TIMED_OUT,
+            fmt::format("no answer within {} s", static_cast<double>(limit.count()) / 1000));
+}
+
 std::string jsonLine(const std::string& iface, const std::string& method, const Outcome& outcome) {
-    ordered_json line;
-    line["iface"] = iface;
-    line["method"] = method;
-    line["exception"] = outcome.exception;
-    line["status"] = outcome.status;
-    line["message"] = outcome.message;
-    line["result"] = outcome.result;
-    line["callback"] = jsonOf(outcome.completion);
-    line["us"] = outcome.microseconds;
-    return line.dump(-1, ' ', false, ordered_json::error_handler_t::replace);
+    const auto orNull = [](const std::string& word) {
+        return word.empty() ? "null" : jsonOf(word);
+    };
+    const bool called = outcome.reached != Outcome::Reached::kWrongUsage;
+    constexpr const char* kForm =
+            R"({{"iface":{},"method":{},"exception":{},"status":{},"message":{},"result":{},)"
+            R"("callback":{},"us":{},"name":{},"text":{}}})";
+    return fmt::format(kForm, orNull(iface), orNull(method),
+                       called ? std::to_string(outcome.exception) : "null",
+                       called ? std::to_string(outcome.status) : "null", jsonOf(outcome.message),
+                       outcome.result, jsonOf(outcome.completion), outcome.microseconds,
+                       called ? jsonOf(exceptionName(outcome.exception)) : "null",
+                       jsonOf(sentenceFor(outcome)));
 }
 
 std::string humanLine(const std::string& method, const Outcome& outcome) {
-    if (outcome.exception == EX_NONE) {
-        return fmt::format("{}: ok{}{}{}", method, outcome.text.empty() ? "" : ", ", outcome.text,
-                           textOf(outcome.completion));
-    }
-    std::string line = fmt::format("{}: {}", method, exceptionName(outcome.exception));
-    if (outcome.exception == EX_TRANSACTION_FAILED) line += " " + statusName(outcome.status);
-    if (outcome.exception == EX_SERVICE_SPECIFIC) line += fmt::format(" {}", outcome.serviceError);
-    if (!outcome.message.empty()) line += ": " + outcome.message;
-    return line;
+    return (method.empty() ? "" : method + ": ") + sentenceFor(outcome);
 }
 
 Exit exitStatusOf(const Outcome& outcome) {
+    if (outcome.reached == Outcome::Reached::kWrongUsage) return Exit::kUsage;
     switch (outcome.exception) {
         case EX_NONE:
-            return Exit::kOk;
+            return outcome.completion.kind == Completion::Kind::kTimedOut ? Exit::kNoCallback
+                                                                          : Exit::kOk;
         case EX_TRANSACTION_FAILED:
             return Exit::kNoService;
         default:
@@ -184,11 +245,23 @@ std::string statusName(binder_status_t status) {
     return nameIn(kStatuses, status);
 }
 
-ordered_json jsonOf(float value) {
+std::string jsonOf(bool value) {
+    return value ? "true" : "false";
+}
+
+std::string jsonOf(int32_t value) {
+    return std::to_string(value);
+}
+
+std::string jsonOf(float value) {
     const std::string shortest = fmt::format("{}", value);
-    if (!std::isfinite(value)) return shortest;
-    // Through the text, so that 0.1f prints as 0.1 and not as the double next to the float.
-    return std::stod(shortest);
+    if (!std::isfinite(value)) return jsonOf(shortest);
+    // Programs tell a float from an integer by its point.
+    return shortest.find_first_of(".e") == std::string::npos ? shortest + ".0" : shortest;
+}
+
+std::string jsonOf(const std::string& value) {
+    return inQuotes(value);
 }
 
 std::string textOf(bool value, Show) {

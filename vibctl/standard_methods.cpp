@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 //
 // The methods of the standard interface, and how the entries of its compositions are written.
-#include "methods.h"
+#include "vibctl/methods.h"
 
 namespace vibctl {
 
@@ -12,7 +12,7 @@ using aidl::android::hardware::vibrator::PrimitivePwle;
 
 template <>
 struct Argument<CompositeEffect> {
-    static Problem parse(std::string_view name, std::string_view word, CompositeEffect& value) {
+    static Problem parse(const std::string& name, const std::string& word, CompositeEffect& value) {
         return parsePacket(name, word, value.delayMs, value.primitive, value.scale);
     }
 
@@ -24,14 +24,14 @@ struct Argument<CompositeEffect> {
 
 template <>
 struct Argument<PrimitivePwle> {
-    static constexpr std::string_view kActive =
+    static constexpr const char* kActive =
             "START_AMPLITUDE,START_FREQUENCY,END_AMPLITUDE,END_FREQUENCY,DURATION_MS";
-    static constexpr std::string_view kBraking = "BRAKING,DURATION_MS";
+    static constexpr const char* kBraking = "BRAKING,DURATION_MS";
 
-    static Problem parse(std::string_view, std::string_view word, PrimitivePwle& value) {
-        const std::vector<std::string_view> fields = splitAtCommas(word);
+    static Problem parse(const std::string&, const std::string& word, PrimitivePwle& value) {
+        const std::vector<std::string> fields = android::base::Split(word, ",");
         const auto rest = std::span(fields).subspan(1);
-        if (equalIgnoringCase(fields[0], "active")) {
+        if (android::base::EqualsIgnoreCase(fields[0], "active")) {
             ActivePwle active;
             Problem problem =
                     parseFields(kActive, rest, active.startAmplitude, active.startFrequency,
@@ -39,7 +39,7 @@ struct Argument<PrimitivePwle> {
             value = active;
             return inPacket(word, problem);
         }
-        if (equalIgnoringCase(fields[0], "brake")) {
+        if (android::base::EqualsIgnoreCase(fields[0], "brake")) {
             BrakingPwle braking;
             Problem problem = parseFields(kBraking, rest, braking.braking, braking.duration);
             value = braking;
@@ -62,7 +62,7 @@ constexpr Traits kCapabilities{.show = Show::kCapabilities};
 constexpr Traits kComposition{.awaitsCompletion = true};
 
 // clang-format off
-constexpr Method<IVibrator> kMethods[] = {
+constexpr Method kMethods[] = {
         row<&IVibrator::getCapabilities>("getCapabilities", "", kCapabilities),
         row<&IVibrator::off>("off"),
         row<&IVibrator::on>("on", "TIMEOUT_MS"),
@@ -94,7 +94,7 @@ constexpr Method<IVibrator> kMethods[] = {
 
 }  // namespace
 
-std::span<const Method<IVibrator>> standardMethods() {
+std::span<const Method> standardMethods() {
     return kMethods;
 }
 

@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The socket through which a running driver is asked for things: a line in, a line out.
 #pragma once
 
@@ -8,47 +9,48 @@
 #include <string>
 #include <string_view>
 
-#include "common/unique_fd.h"
-#include "driver/result.h"
+#include <android-base/result.h>
+#include <android-base/unique_fd.h>
 
 namespace handset {
 
-/// Serves any number of clients from one thread; a client that says nothing holds nobody up.
+// Serves any number of clients from one thread; a client that says nothing holds nobody up.
 class ControlSocket {
   public:
-    /// Turns a request (a line without its end) into the line that answers it.
+    // Turns a request (a line without its end) into the line that answers it.
     using Answer = std::function<std::string(std::string_view request)>;
 
-    /// Listens at `path`, which only root may open; a socket left there by a driver that died is
-    /// replaced. The path is removed with this object.
-    static Result<std::unique_ptr<ControlSocket>> listenAt(const std::string& path, Answer answer);
+    // Listens at `path`, which only root may open; a socket left there by a driver that died is
+    // replaced. The path is removed with this object.
+    static android::base::Result<std::unique_ptr<ControlSocket>> listenAt(const std::string& path,
+                                                                          Answer answer);
 
     ~ControlSocket();
     ControlSocket(const ControlSocket&) = delete;
     ControlSocket& operator=(const ControlSocket&) = delete;
 
-    /// Becomes readable when serve() has something to do.
-    int descriptor() const { return events_.get(); }
+    // Becomes readable when serve() has something to do.
+    int descriptor() const { return mEvents.get(); }
 
-    /// Answers what has come in; never waits.
+    // Answers what has come in; never waits.
     void serve();
 
   private:
     struct Client {
-        UniqueFd socket;
+        android::base::unique_fd socket;
         std::string received;
     };
 
-    explicit ControlSocket(Answer answer) : answer_(std::move(answer)) {}
+    explicit ControlSocket(Answer answer) : mAnswer(std::move(answer)) {}
 
     void accept();
     bool serveClient(Client& client);
 
-    std::string path_;  ///< empty until the socket is there
-    Answer answer_;
-    UniqueFd listener_;
-    UniqueFd events_;
-    std::map<int, Client> clients_;
+    std::string mPath;  // empty until the socket is there
+    Answer mAnswer;
+    android::base::unique_fd mListener;
+    android::base::unique_fd mEvents;
+    std::map<int, Client> mClients;
 };
 
 }  // namespace handset

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The force-feedback effects a motor holds.
-#include "driver/effect_slots.h"
+#include "handset/driver/effect_slots.h"
 
 #include <cerrno>
 
@@ -10,7 +11,7 @@ namespace {
 // The period, in milliseconds, of the sine the core turns a rumble into.
 constexpr uint16_t kRumblePeriod = 50;
 
-/// The kinds the motor announces. Rumble is there wherever periodic effects are.
+// The kinds the motor announces. Rumble is there wherever periodic effects are.
 bool isKindKnown(const ff_effect& effect) {
     if (effect.type == FF_RUMBLE) return true;
     return effect.type == FF_PERIODIC && effect.u.periodic.waveform == FF_CUSTOM;
@@ -32,8 +33,8 @@ ff_effect asDriverSees(const ff_effect& effect) {
 }
 
 int EffectSlots::checkAccess(Owner owner, int id) const {
-    if (id < 0 || static_cast<size_t>(id) >= slots_.size()) return -EINVAL;
-    const Slot& slot = slots_[static_cast<size_t>(id)];
+    if (id < 0 || static_cast<size_t>(id) >= mSlots.size()) return -EINVAL;
+    const Slot& slot = mSlots[static_cast<size_t>(id)];
     if (!slot.owner) return -EINVAL;
     return *slot.owner == owner ? 0 : -EACCES;
 }
@@ -41,14 +42,14 @@ int EffectSlots::checkAccess(Owner owner, int id) const {
 int EffectSlots::check(Owner owner, const ff_effect& given) const {
     if (!isKindKnown(given)) return -EINVAL;
     if (given.id == -1) {
-        for (size_t id = 0; id < slots_.size(); ++id) {
-            if (!slots_[id].owner) return static_cast<int>(id);
+        for (size_t id = 0; id < mSlots.size(); ++id) {
+            if (!mSlots[id].owner) return static_cast<int>(id);
         }
         return -ENOSPC;
     }
     if (const int error = checkAccess(owner, given.id); error != 0) return error;
     const ff_effect effect = asDriverSees(given);
-    const Slot& slot = slots_[static_cast<size_t>(given.id)];
+    const Slot& slot = mSlots[static_cast<size_t>(given.id)];
     const bool same = slot.type == effect.type && slot.waveform == effect.u.periodic.waveform;
     return same ? given.id : -EINVAL;
 }
@@ -57,7 +58,7 @@ int EffectSlots::upload(Owner owner, const ff_effect& given) {
     const int id = check(owner, given);
     if (id < 0) return id;
     const ff_effect effect = asDriverSees(given);
-    slots_[static_cast<size_t>(id)] = {owner, effect.type, effect.u.periodic.waveform};
+    mSlots[static_cast<size_t>(id)] = {owner, effect.type, effect.u.periodic.waveform};
     return id;
 }
 
@@ -67,15 +68,15 @@ int EffectSlots::checkErase(Owner owner, int id) const {
 
 int EffectSlots::erase(Owner owner, int id) {
     const int error = checkAccess(owner, id);
-    if (error == 0) slots_[static_cast<size_t>(id)].owner.reset();
+    if (error == 0) mSlots[static_cast<size_t>(id)].owner.reset();
     return error;
 }
 
 std::vector<int> EffectSlots::eraseAllOf(Owner owner) {
     std::vector<int> erased;
-    for (size_t id = 0; id < slots_.size(); ++id) {
-        if (slots_[id].owner != owner) continue;
-        slots_[id].owner.reset();
+    for (size_t id = 0; id < mSlots.size(); ++id) {
+        if (mSlots[id].owner != owner) continue;
+        mSlots[id].owner.reset();
         erased.push_back(static_cast<int>(id));
     }
     return erased;

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Error numbers and their names, from the C library's own table.
-#include "driver/error_names.h"
+#include "handset/driver/error_names.h"
 
 #include <cerrno>
 #include <cstring>

@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Error numbers and their names ("EIO"), both ways.
 #pragma once
 
@@ -8,10 +9,10 @@
 
 namespace handset {
 
-/// The error number of a name from <errno.h> such as "EINTR", in capitals; nothing for any other.
+// The error number of a name from <errno.h> such as "EINTR", in capitals; nothing for any other.
 std::optional<int> errorNumber(std::string_view name);
 
-/// The name of an error number (positive), or the number as text where it has none.
+// The name of an error number (positive), or the number as text where it has none.
 std::string errorName(int number);
 
 }  // namespace handset

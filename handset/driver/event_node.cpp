@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // /dev/input/eventN.
-#include "driver/event_node.h"
+#include "handset/driver/event_node.h"
 
-#include <fmt/format.h>
 #include <sys/stat.h>
 #include <sys/sysmacros.h>
 #include <unistd.h>
@@ -12,8 +12,14 @@
 #include <cstring>
 #include <fstream>
 
+#include <fmt/format.h>
+
 namespace handset {
 namespace {
+
+using android::base::ErrnoError;
+using android::base::Error;
+using android::base::Result;
 
 constexpr unsigned kEventLimit = 1024;
 constexpr uid_t kSystemUser = 1000;
@@ -24,20 +30,20 @@ bool exists(const std::string& path) {
     return lstat(path.c_str(), &attributes) == 0;
 }
 
-/// Makes the node by the number sysfs gives for the device: not every /dev is the kernel's own.
-Failure makeNode(unsigned event, const std::string& path) {
+// Makes the node by the number sysfs gives for the device: not every /dev is the kernel's own.
+Result<void> makeNode(unsigned event, const std::string& path) {
     std::ifstream file(fmt::format("/sys/devices/virtual/cuse/input!event{}/dev", event));
     unsigned major = 0;
     unsigned minor = 0;
     char colon = 0;
     if (!(file >> major >> colon >> minor)) {
-        return Error{fmt::format("{}: the kernel did not make the device", path)};
+        return Error() << fmt::format("{}: the kernel did not make the device", path);
     }
     if ((mkdir("/dev/input", 0755) != 0 && errno != EEXIST) ||
         mknod(path.c_str(), S_IFCHR | 0600, makedev(major, minor)) != 0) {
-        return Error{fmt::format("{}: {}", path, strerror(errno))};
+        return ErrnoError() << path;
     }
-    return std::nullopt;
+    return {};
 }
 
 }  // namespace
@@ -46,31 +52,32 @@ std::string eventNodePath(unsigned event) {
     return fmt::format("/dev/input/event{}", event);
 }
 
-Result<unsigned> chooseEvent(const MotorSpec& motor) {
+Result<unsigned> chooseEvent(const MotorProfile& motor) {
     if (motor.event) {
         if (!exists(eventNodePath(*motor.event))) return *motor.event;
-        return Error{fmt::format("motor.event: {} exists already", eventNodePath(*motor.event))};
+        return Error() << fmt::format("motor.event: {} exists already",
+                                      eventNodePath(*motor.event));
     }
     for (unsigned event = 1; event < kEventLimit; ++event) {
         if (!exists(eventNodePath(event))) return event;
     }
-    return Error{"no free number below /dev/input"};
+    return Error() << "no free number below /dev/input";
 }
 
 EventNode::~EventNode() {
-    if (!made_.empty()) unlink(made_.c_str());
+    if (!mMade.empty()) unlink(mMade.c_str());
 }
 
-Failure EventNode::handOver(unsigned event) {
+Result<void> EventNode::handOver(unsigned event) {
     const std::string path = eventNodePath(event);
     if (!exists(path)) {
-        if (auto failure = makeNode(event, path)) return failure;
-        made_ = path;
+        if (auto done = makeNode(event, path); !done) return done;
+        mMade = path;
     }
     if (chown(path.c_str(), kSystemUser, kInputGroup) != 0 || chmod(path.c_str(), 0660) != 0) {
-        return Error{fmt::format("{}: {}", path, strerror(errno))};
+        return ErrnoError() << path;
     }
-    return std::nullopt;
+    return {};
 }
 
 }  // namespace handset

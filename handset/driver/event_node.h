@@ -1,24 +1,26 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // /dev/input/eventN: choosing N, and giving the node to those who may open it on a phone.
 #pragma once
 
 #include <string>
 
-#include "driver/profile.h"
-#include "driver/result.h"
+#include <android-base/result.h>
+
+#include "handset/driver/profile.h"
 
 namespace handset {
 
-/// "/dev/input/event7".
+// "/dev/input/event7".
 std::string eventNodePath(unsigned event);
 
-/// The number the profile asks for, or else the lowest free one. 0 is not chosen: the list of
-/// input devices has the keyboard there.
-Result<unsigned> chooseEvent(const MotorSpec& motor);
+// The number the profile asks for, or else the lowest free one. 0 is not chosen: the list of
+// input devices has the keyboard there.
+android::base::Result<unsigned> chooseEvent(const MotorProfile& motor);
 
-/// The node of a device the kernel has just made: makes it where the kernel did not, and hands it
-/// to the system user and the input group, mode 0660. The kernel removes what it made; a node made
-/// here goes away with this object.
+// The node of a device the kernel has just made: makes it where the kernel did not, and hands it
+// to the system user and the input group, mode 0660. The kernel removes what it made; a node made
+// here goes away with this object.
 class EventNode {
   public:
     EventNode() = default;
@@ -26,10 +28,10 @@ class EventNode {
     EventNode& operator=(const EventNode&) = delete;
     ~EventNode();
 
-    Failure handOver(unsigned event);
+    android::base::Result<void> handOver(unsigned event);
 
   private:
-    std::string made_;
+    std::string mMade;
 };
 
 }  // namespace handset

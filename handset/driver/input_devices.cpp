@@ -1,14 +1,24 @@
 // SPDX-License-Identifier: Apache-2.0
-// The list of input devices. Every line is as the kernel prints it, the blank after the last
+//
+// The list of input devices. Every line is as the kernel prints it, the space after the last
 // handler included.
-#include "driver/input_devices.h"
+#include "handset/driver/input_devices.h"
+
+#include <sys/mount.h>
+
+#include <string_view>
+#include <utility>
 
 #include <fmt/format.h>
 
-#include <string_view>
-
 namespace handset {
 namespace {
+
+using android::base::ErrnoError;
+
+using android::base::Result;
+
+constexpr const char* kInputDevices = "/proc/bus/input/devices";
 
 constexpr std::string_view kEventMark = "{event}";
 
@@ -51,11 +61,29 @@ std::string filledIn(std::string text, unsigned event) {
 
 }  // namespace
 
-std::string inputDevicesText(const Profile& profile, unsigned event) {
+std::string inputDevicesText(const Profile& profile, unsigned event, bool plugged) {
     if (profile.inputDevices) return filledIn(*profile.inputDevices, event);
     std::string text(kKeyboard);
-    if (profile.motor) text += fmt::format(kMotor, profile.motor->name, event + 1, event);
+    if (profile.motor && plugged)
+        text += fmt::format(kMotor, profile.motor->name, event + 1, event);
     return text;
+}
+
+Result<void> InputDeviceList::show() {
+    const std::lock_guard lock(mMutex);
+    return bind(true);
+}
+
+Result<void> InputDeviceList::setPlugged(bool plugged) {
+    const std::lock_guard lock(mMutex);
+    if (std::exchange(mPlugged, plugged) == plugged) return {};
+    if (!plugged) return bind(false);
+    if (umount2(kInputDevices, MNT_DETACH) != 0) return ErrnoError() << kInputDevices;
+    return {};
+}
+
+Result<void> InputDeviceList::bind(bool plugged) {
+    return mStaging.bindFile(kInputDevices, inputDevicesText(mProfile, mEvent, plugged), 0, 0444);
 }
 
 }  // namespace handset

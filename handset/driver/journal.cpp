@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// The journal: formatting a line and putting it into the file.
-#include "driver/journal.h"
+//
+// The journal: completing a line and putting it into the file.
+#include "handset/driver/journal.h"
 
 #include <fcntl.h>
 #include <unistd.h>
@@ -8,94 +9,57 @@
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
-#include <ctime>
-#include <iterator>
+#include <utility>
 
-#include "driver/error_names.h"
-#include "driver/json_text.h"
+#include <android-base/file.h>
+#include <fmt/format.h>
+
+#include "handset/driver/error_names.h"
 
 namespace handset {
-namespace {
 
-uint64_t monotonicMicroseconds() {
-    timespec now{};
-    clock_gettime(CLOCK_MONOTONIC, &now);
-    return static_cast<uint64_t>(now.tv_sec) * 1000000U +
-           static_cast<uint64_t>(now.tv_nsec) / 1000U;
-}
+using android::base::ErrnoError;
+using android::base::Result;
+using android::base::unique_fd;
+using std::chrono::microseconds;
+using std::chrono::steady_clock;  // CLOCK_MONOTONIC
 
-bool writeWhole(int fd, const char* data, size_t size) {
-    while (size > 0) {
-        const ssize_t written = write(fd, data, size);
-        if (written < 0 && errno == EINTR) continue;
-        if (written <= 0) return false;
-        data += written;
-        size -= static_cast<size_t>(written);
-    }
-    return true;
-}
-
-}  // namespace
-
-JournalLine::JournalLine(std::string_view op) {
-    text("op", op);
-}
-
-void JournalLine::key(std::string_view key) {
-    content_.push_back(',');
-    appendJsonString(content_, key);
-    content_.push_back(':');
-}
-
-JournalLine& JournalLine::text(std::string_view name, std::string_view text) {
-    key(name);
-    appendJsonString(content_, text);
-    return *this;
-}
-
-JournalLine& JournalLine::bytes(std::string_view name, std::string_view hexName,
-                                std::string_view bytes) {
-    return isUtf8(bytes) ? text(name, bytes) : hex(hexName, bytes);
-}
-
-JournalLine& JournalLine::hex(std::string_view name, std::string_view bytes) {
-    key(name);
-    appendHexString(content_, bytes);
-    return *this;
-}
-
-JournalLine& JournalLine::number(std::string_view name, int64_t value) {
-    key(name);
-    fmt::format_to(std::back_inserter(content_), "{}", value);
-    return *this;
-}
-
-JournalLine& JournalLine::result(std::string_view name, int64_t countOrNegativeError) {
-    if (countOrNegativeError >= 0) return number(name, countOrNegativeError);
-    return text(name, errorName(static_cast<int>(-countOrNegativeError)));
+nlohmann::ordered_json resultOf(int64_t countOrNegativeError) {
+    if (countOrNegativeError >= 0) return countOrNegativeError;
+    return errorName(static_cast<int>(-countOrNegativeError));
 }
 
 Result<std::unique_ptr<Journal>> Journal::create(const std::string& path) {
-    UniqueFd file(open(path.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_APPEND | O_CLOEXEC, 0644));
-    if (!file) return Error{fmt::format("journal {}: {}", path, strerror(errno))};
+    unique_fd file(open(path.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_APPEND | O_CLOEXEC, 0644));
+    if (!file.ok()) return ErrnoError() << "journal " << path;
     return std::unique_ptr<Journal>(new Journal(std::move(file)));
 }
 
-void Journal::record(const Caller& caller, const JournalLine& line) {
-    const std::lock_guard lock(mutex_);
-    fmt::memory_buffer whole;
-    fmt::format_to(std::back_inserter(whole), R"({{"n":{},"us":{},"pid":{},"uid":{}{}}})", ++lines_,
-                   monotonicMicroseconds(), caller.pid, caller.uid, line.content());
-    whole.push_back('\n');
-    if (writeWhole(file_.get(), whole.data(), whole.size()) || complained_) return;
-    complained_ = true;
-    fmt::print(stderr, "handset-driver: journal: line {} lost: {}\n", lines_, strerror(errno));
+void Journal::record(const Caller& caller, const JournalFields& fields) {
+    const std::lock_guard lock(mMutex);
+    const auto now =
+            std::chrono::duration_cast<microseconds>(steady_clock::now().time_since_epoch());
+    const std::string line =
+            fmt::format("{{\"n\":{},\"us\":{},\"pid\":{},\"uid\":{},{}\n", ++mLines, now.count(),
+                        caller.pid, caller.uid, fields.dump().substr(1));
+    if (android::base::WriteFully(mFile, line.data(), line.size()) || mComplained) return;
+    mComplained = true;
+    fmt::print(stderr, "handset-driver: journal: line {} lost: {}\n", mLines, strerror(errno));
+}
+
+void Journal::record(const Caller& caller, JournalFields fields, const Strike& strike) {
+    if (strike.action.strikes()) {
+        fields["fault"] = toJson(strike.action);
+        const auto took = steady_clock::now() - strike.arrival;
+        fields["took"] = std::chrono::duration_cast<microseconds>(took).count();
+    }
+    record(caller, fields);
 }
 
 void Journal::reset() {
-    const std::lock_guard lock(mutex_);
-    lines_ = 0;
-    if (ftruncate(file_.get(), 0) != 0) {
+    const std::lock_guard lock(mMutex);
+    mLines = 0;
+    if (ftruncate(mFile.get(), 0) != 0) {
         fmt::print(stderr, "handset-driver: journal: not emptied: {}\n", strerror(errno));
     }
 }

@@ -1,75 +1,60 @@
 // SPDX-License-Identifier: Apache-2.0
-// The journal: what the driver saw, one JSON object a line, in the order it happened.
 //
-//   {"n":7,"us":81234567,"pid":412,"uid":1000,"op":"write",
-//    "node":"/sys/class/leds/vibrator/duration","data":"500\n","result":4}       (on one line)
-//
-// n counts from 1; us is CLOCK_MONOTONIC in microseconds; pid is the process, not the thread.
-// A line is in the file before the caller gets its answer.
+// What the driver saw: one JSON object a line, in the order in which it happened. A line is in the
+// file before the caller gets its answer. docs/formats.md has the keys.
 #pragma once
 
-#include <fmt/format.h>
-#include <sys/types.h>
-
+#include <chrono>
 #include <cstdint>
 #include <memory>
 #include <mutex>
 #include <string>
-#include <string_view>
 
-#include "common/unique_fd.h"
-#include "driver/caller.h"
-#include "driver/result.h"
+#include <android-base/result.h>
+#include <android-base/thread_annotations.h>
+#include <android-base/unique_fd.h>
+#include <nlohmann/json.hpp>
+
+#include "handset/driver/caller.h"
+#include "handset/driver/fault.h"
 
 namespace handset {
 
-/// The part of a journal line from "op" on, built up key by key.
-class JournalLine {
-  public:
-    explicit JournalLine(std::string_view op);
+// The keys of a line from "op" on.
+using JournalFields = nlohmann::ordered_json;
 
-    /// `"key":"text"`; `text` must be UTF-8.
-    JournalLine& text(std::string_view key, std::string_view text);
+// A count, or for a negative value the name of that error: 4, "EIO".
+nlohmann::ordered_json resultOf(int64_t countOrNegativeError);
 
-    /// `"key":"text"` where `bytes` is UTF-8, otherwise `"hexKey":"0a1b"`.
-    JournalLine& bytes(std::string_view key, std::string_view hexKey, std::string_view bytes);
-
-    /// `"key":"0a1b"`.
-    JournalLine& hex(std::string_view key, std::string_view bytes);
-
-    /// `"key":-5`.
-    JournalLine& number(std::string_view key, int64_t value);
-
-    /// `"key":4`, or for a negative value the name of that error, `"key":"EIO"`.
-    JournalLine& result(std::string_view key, int64_t countOrNegativeError);
-
-    std::string_view content() const { return {content_.data(), content_.size()}; }
-
-  private:
-    void key(std::string_view key);
-
-    fmt::memory_buffer content_;
+// What a fault did to a call, and when that call arrived.
+struct Strike {
+    const FaultAction& action;
+    std::chrono::steady_clock::time_point arrival;
 };
 
-/// The journal's file. All operations may be called from any thread.
+// The journal's file. All operations may be called from any thread.
 class Journal {
   public:
-    /// Creates or empties the file at `path`, mode 0644.
-    static Result<std::unique_ptr<Journal>> create(const std::string& path);
+    // Creates or empties the file at `path`, mode 0644.
+    static android::base::Result<std::unique_ptr<Journal>> create(const std::string& path);
 
-    /// Writes one line. A line that cannot be written is reported on standard error, once.
-    void record(const Caller& caller, const JournalLine& line);
+    // Writes one line. A line that cannot be written is reported on standard error, once.
+    void record(const Caller& caller, const JournalFields& fields);
 
-    /// Empties the file; the next line is number 1 again.
+    // The same for a call that a fault may have struck: if so, the line says how and how long the
+    // call took.
+    void record(const Caller& caller, JournalFields fields, const Strike& strike);
+
+    // Empties the file; the next line is number 1 again.
     void reset();
 
   private:
-    explicit Journal(UniqueFd file) : file_(std::move(file)) {}
+    explicit Journal(android::base::unique_fd file) : mFile(std::move(file)) {}
 
-    std::mutex mutex_;
-    UniqueFd file_;
-    uint64_t lines_ = 0;
-    bool complained_ = false;
+    std::mutex mMutex;
+    android::base::unique_fd mFile GUARDED_BY(mMutex);
+    uint64_t mLines GUARDED_BY(mMutex) = 0;
+    bool mComplained GUARDED_BY(mMutex) = false;
 };
 
 }  // namespace handset

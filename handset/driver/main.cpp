@@ -1,15 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The simulated vibrator driver: shows a profile's nodes, files and motor to whoever enters its
 // mount namespace, and keeps a journal of what they do with them.
 #include <fcntl.h>
-#include <fmt/format.h>
 #include <poll.h>
 #include <sys/eventfd.h>
 #include <sys/prctl.h>
 #include <sys/signalfd.h>
 #include <unistd.h>
 
-#include <CLI/CLI.hpp>
 #include <cerrno>
 #include <csignal>
 #include <cstdio>
@@ -20,29 +19,33 @@
 #include <string>
 #include <utility>
 
-#include "common/unique_fd.h"
-#include "driver/control_requests.h"
-#include "driver/control_socket.h"
-#include "driver/event_node.h"
-#include "driver/fault_book.h"
-#include "driver/input_devices.h"
-#include "driver/journal.h"
-#include "driver/motor_device.h"
-#include "driver/node_tree.h"
-#include "driver/one_line.h"
-#include "driver/placed_files.h"
-#include "driver/private_mounts.h"
-#include "driver/profile_reader.h"
-#include "driver/sysfs_server.h"
+#include <CLI/CLI.hpp>
+#include <android-base/unique_fd.h>
+#include <fmt/format.h>
+
+#include "handset/driver/control_requests.h"
+#include "handset/driver/control_socket.h"
+#include "handset/driver/event_node.h"
+#include "handset/driver/fault_injector.h"
+#include "handset/driver/input_devices.h"
+#include "handset/driver/journal.h"
+#include "handset/driver/motor_device.h"
+#include "handset/driver/node_tree.h"
+#include "handset/driver/placed_files.h"
+#include "handset/driver/printable.h"
+#include "handset/driver/private_mounts.h"
+#include "handset/driver/profile_reader.h"
+#include "handset/driver/sysfs_server.h"
 
 namespace handset {
 namespace {
 
+using android::base::Result;
+using android::base::unique_fd;
+
 constexpr int kStopped = 0;
 constexpr int kFailed = 1;
 constexpr int kBadInput = 2;
-
-constexpr const char* kInputDevices = "/proc/bus/input/devices";
 
 constexpr const char* kHelp = R"(Simulates a phone's vibrator driver.
 
@@ -55,6 +58,8 @@ mounted or made is gone then.
 
 Requests on the control socket, one a line, answered by "ok ..." or "error MESSAGE":
   fault {JSON}      add a fault, as in a profile    clear   forget all faults
+  faults            list them, with how often each has struck
+  unplug NODE [MS]  take a node or "motor" away     plug NODE [MS]  bring it back
   get PATH          what a read of a node returns   reset   empty the journal
   set PATH "TEXT"   change a node's text            stop    end
   settle            wait until the journal has every close so far
@@ -68,20 +73,20 @@ struct Options {
     int readyFd = -1;
 };
 
-/// Prints the one line that says what went wrong, kept to one line whatever it quotes.
+// Prints the one line that says what went wrong, kept to one line whatever it quotes.
 int fail(int status, std::string text) {
-    fmt::print(stderr, "handset-driver: {}\n", oneLine(std::move(text)));
+    fmt::print(stderr, "handset-driver: {}\n", printable(std::move(text)));
     return status;
 }
 
-/// SIGTERM and SIGINT as a descriptor, blocked for every thread that is started from here on.
-UniqueFd stopSignals() {
+// SIGTERM and SIGINT as a descriptor, blocked for every thread that is started from here on.
+unique_fd stopSignals() {
     sigset_t signals;
     sigemptyset(&signals);
     sigaddset(&signals, SIGTERM);
     sigaddset(&signals, SIGINT);
     sigprocmask(SIG_BLOCK, &signals, nullptr);
-    return UniqueFd(signalfd(-1, &signals, SFD_CLOEXEC));
+    return unique_fd(signalfd(-1, &signals, SFD_CLOEXEC));
 }
 
 void announceReady(int fd) {
@@ -93,23 +98,22 @@ void announceReady(int fd) {
     close(fd);
 }
 
-/// Shows the profile's plain files and its list of input devices.
-Failure showFiles(const Profile& profile, unsigned event, PlacedFiles& files) {
-    Result<StagingFolder> staging = StagingFolder::create();
-    if (!staging) return staging.error();
-    for (const FileSpec& file : profile.files) {
-        if (auto failure = files.place(file, *staging)) return failure;
+// Shows the profile's plain files and its list of input devices.
+Result<void> showFiles(const Profile& profile, PlacedFiles& files, StagingDirectory& staging,
+                       InputDeviceList& list) {
+    for (const FileProfile& file : profile.files) {
+        if (auto done = files.place(file, staging); !done) return done;
     }
-    return staging->bindFile(kInputDevices, inputDevicesText(profile, event), 0, 0444);
+    return list.show();
 }
 
-/// Serves until something asks for the end. False when the mount was lost.
-bool serve(int signals, int ended, ControlSocket* control, const ControlRequests& requests) {
+// Serves until something asks for the end. False when the mount was lost.
+bool serve(int signals, int ended, ControlSocket* control, ControlRequests& requests) {
     pollfd polled[] = {{signals, POLLIN, 0},
                        {ended, POLLIN, 0},
                        {control != nullptr ? control->descriptor() : -1, POLLIN, 0}};
     while (!requests.isStopWanted()) {
-        if (poll(polled, std::size(polled), -1) < 0 && errno != EINTR) return false;
+        if (poll(polled, std::size(polled), requests.runDue()) < 0 && errno != EINTR) return false;
         if (polled[0].revents != 0) return true;
         if (polled[1].revents != 0) return false;
         if (polled[2].revents != 0) control->serve();
@@ -118,43 +122,53 @@ bool serve(int signals, int ended, ControlSocket* control, const ControlRequests
 }
 
 int run(const Options& options) {
-    const UniqueFd signals = stopSignals();
+    const unique_fd signals = stopSignals();
     const pid_t parent = getppid();
     prctl(PR_SET_PDEATHSIG, SIGTERM);
     if (getppid() != parent) return kStopped;
 
     const Result<Profile> profile = readProfile(options.profile);
-    if (!profile) return fail(kBadInput, profile.error().text);
+    if (!profile) return fail(kBadInput, profile.error().message());
     if (geteuid() != 0) return fail(kFailed, "mounting the nodes takes root");
     Result<std::unique_ptr<Journal>> journal = Journal::create(options.journal);
-    if (!journal) return fail(kBadInput, journal.error().text);
+    if (!journal) return fail(kBadInput, journal.error().message());
 
     Result<unsigned> event = 0U;
     if (profile->motor) event = chooseEvent(*profile->motor);
-    if (!event) return fail(kFailed, event.error().text);
-    if (auto failure = enterPrivateMounts()) return fail(kFailed, failure->text);
+    if (!event) return fail(kFailed, event.error().message());
+    if (auto done = enterPrivateMounts(); !done) return fail(kFailed, done.error().message());
+    Result<StagingDirectory> staging = StagingDirectory::create();
+    if (!staging) return fail(kFailed, staging.error().message());
+    InputDeviceList list(*profile, *event, *staging);
     PlacedFiles files;
-    if (auto failure = showFiles(*profile, *event, files)) return fail(kFailed, failure->text);
+    if (auto done = showFiles(*profile, files, *staging, list); !done)
+        return fail(kFailed, done.error().message());
 
     const NodeTree tree(kSysfsRoot, profile->nodes);
-    FaultBook faults;
-    for (const FaultSpec& fault : profile->faults) faults.add(fault);
-    const UniqueFd ended(eventfd(0, EFD_CLOEXEC));
+    FaultInjector faults;
+    for (const Fault& fault : profile->faults) faults.add(fault);
+    const unique_fd ended(eventfd(0, EFD_CLOEXEC));
     Result<std::unique_ptr<MotorDevice>> motor = std::unique_ptr<MotorDevice>();
     if (profile->motor) {
         motor = MotorDevice::start(*profile->motor, *event, faults, **journal, ended.get());
     }
-    if (!motor) return fail(kFailed, motor.error().text);
+    if (!motor) return fail(kFailed, motor.error().message());
+    faults.setOnPlug([&](std::string_view node, bool plugged) {
+        (*journal)->record({}, {{"op", plugged ? "plug" : "unplug"}, {"node", node}});
+        if (node != kMotorNode) return;
+        if (!plugged) (*motor)->forgetEffects();
+        if (auto done = list.setPlugged(plugged); !done) fail(kFailed, done.error().message());
+    });
     const Result<std::unique_ptr<SysfsServer>> server =
             SysfsServer::start(tree, faults, **journal, ended.get());
-    if (!server) return fail(kFailed, server.error().text);
+    if (!server) return fail(kFailed, server.error().message());
 
     ControlRequests requests(*profile, tree, faults, **journal, [&] { (*server)->settle(); });
     std::unique_ptr<ControlSocket> control;
     if (!options.control.empty()) {
         auto listening = ControlSocket::listenAt(
                 options.control, [&](std::string_view line) { return requests.answer(line); });
-        if (!listening) return fail(kBadInput, listening.error().text);
+        if (!listening) return fail(kBadInput, listening.error().message());
         control = std::move(*listening);
     }
     announceReady(options.readyFd);

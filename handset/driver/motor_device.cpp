@@ -1,10 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The force-feedback motor: the request handlers and the device.
-#include "driver/motor_device.h"
+#include "handset/driver/motor_device.h"
 
-#include <cuse_lowlevel.h>
 #include <fcntl.h>
-#include <fmt/format.h>
 #include <linux/input.h>
 #include <poll.h>
 #include <sys/ioctl.h>
@@ -14,62 +13,57 @@
 #include <atomic>
 #include <cerrno>
 #include <chrono>
-#include <condition_variable>
 #include <cstddef>
 #include <cstring>
 #include <mutex>
+#include <semaphore>
 #include <string>
 #include <string_view>
 #include <utility>
 
-#include "common/unique_fd.h"
-#include "driver/caller.h"
-#include "driver/effect_line.h"
-#include "driver/effect_slots.h"
-#include "driver/handle_table.h"
-#include "driver/motor_queries.h"
-#include "driver/open_flags.h"
-#include "driver/request_delay.h"
+#include <android-base/thread_annotations.h>
+#include <android-base/unique_fd.h>
+#include <cuse_lowlevel.h>
+#include <fmt/format.h>
+
+#include "handset/driver/caller.h"
+#include "handset/driver/effect_line.h"
+#include "handset/driver/effect_slots.h"
+#include "handset/driver/handle_table.h"
+#include "handset/driver/motor_queries.h"
+#include "handset/driver/open_flags.h"
+#include "handset/driver/printable.h"
+#include "handset/driver/request_delay.h"
 
 namespace handset {
 namespace {
 
+using android::base::Error;
+using android::base::Result;
+using android::base::unique_fd;
+
 // More than any waveform memory holds; beyond it the kernel could not carry the data either.
 constexpr uint32_t kMostCustomValues = 32768;
 
-constexpr std::chrono::seconds kInitPatience{10};
+constexpr std::chrono::seconds kInitTimeout{10};
 
-/// Somebody who waits until the kernel has made the device.
-class Announcement {
-  public:
-    void make() {
-        const std::lock_guard lock(mutex_);
-        made_ = true;
-        changed_.notify_all();
-    }
-
-    bool await(std::chrono::seconds patience) {
-        std::unique_lock lock(mutex_);
-        return changed_.wait_for(lock, patience, [this] { return made_; });
-    }
-
-  private:
-    std::mutex mutex_;
-    std::condition_variable changed_;
-    bool made_ = false;
+// A file that is open, and how often the motor had been unplugged when it was opened.
+struct OpenMotor {
+    Opener opener;
+    uint64_t unplugs;
 };
 
 }  // namespace
 
 struct MotorDevice::State {
-    const MotorSpec& motor;
-    FaultBook& faults;
+    const MotorProfile& motor;
+    FaultInjector& faults;
     Journal& journal;
-    EffectSlots slots;
-    std::mutex slotsMutex{};  ///< also keeps the journal in the order of the slots' changes
+    std::mutex slotsMutex{};  // also keeps the journal in the order of the slots' changes
+    EffectSlots slots GUARDED_BY(slotsMutex){motor.effectsMax};
     std::atomic<bool> stopping{false};
-    HandleTable<const Opener> files{};
-    Announcement ready{};
+    HandleTable<const OpenMotor> files{};
+    std::binary_semaphore ready{0};  // released once the kernel has made the device
 };
 
 namespace {
@@ -80,56 +74,62 @@ State& stateOf(fuse_req_t request) {
     return *static_cast<State*>(fuse_req_userdata(request));
 }
 
-bool isUnplugged(const State& state) {
-    return state.faults.isUnplugged(kMotorNode);
+// True where the motor is gone, or is another one than the file's.
+bool isGone(State& state, const fuse_file_info* info) {
+    return state.faults.isUnplugged(kMotorNode) ||
+           state.faults.unplugsOf(kMotorNode) != state.files.get(info->fh).unplugs;
 }
 
-/// Meets the fault that is due, if any: its error, or EINTR where its delay was cut short, or 0.
+// Meets the fault that is due, if any: its error, or EINTR where its delay was cut short, or 0.
 int meetFault(fuse_req_t request, State& state, const FaultAction& fault) {
     return delayRequest(request, fault.delay, state.stopping) ? fault.error : EINTR;
 }
 
 void onInitDone(void* data) {
-    static_cast<State*>(data)->ready.make();
+    static_cast<State*>(data)->ready.release();
 }
 
 void onOpen(fuse_req_t request, fuse_file_info* info) {
     State& state = stateOf(request);
     const Opener opener(request);
-    const int error = meetFault(request, state, state.faults.next(kMotorNode, FaultOp::kOpen));
-    state.journal.record(opener.caller(), JournalLine("open")
-                                                  .text("node", kMotorNode)
-                                                  .text("flags", openFlagsText(info->flags))
-                                                  .result("error", -error));
+    const auto arrival = std::chrono::steady_clock::now();
+    const uint64_t unplugs = state.faults.unplugsOf(kMotorNode);
+    const FaultAction fault = state.faults.next(kMotorNode, FaultOp::kOpen);
+    const int error = meetFault(request, state, fault);
+    state.journal.record(opener.caller(),
+                         {{"op", "open"},
+                          {"node", kMotorNode},
+                          {"flags", openFlagsText(info->flags)},
+                          {"error", resultOf(-error)}},
+                         {fault, arrival});
     if (error != 0) {
         fuse_reply_err(request, error);
         return;
     }
-    info->fh = state.files.add(std::make_unique<const Opener>(opener));
+    info->fh = state.files.add(std::make_unique<const OpenMotor>(OpenMotor{opener, unplugs}));
     if (fuse_reply_open(request, info) == -ENOENT) state.files.remove(info->fh);
 }
 
 void onRelease(fuse_req_t request, fuse_file_info* info) {
     State& state = stateOf(request);
-    if (const std::unique_ptr<const Opener> opener = state.files.remove(info->fh)) {
+    if (const std::unique_ptr<const OpenMotor> file = state.files.remove(info->fh)) {
+        const Caller& caller = file->opener.caller();
         const std::lock_guard lock(state.slotsMutex);
         for (const int id : state.slots.eraseAllOf(info->fh)) {
-            state.journal.record(opener->caller(), JournalLine("erase")
-                                                           .text("node", kMotorNode)
-                                                           .number("id", id)
-                                                           .result("result", 0));
+            state.journal.record(
+                    caller, {{"op", "erase"}, {"node", kMotorNode}, {"id", id}, {"result", 0}});
         }
-        state.journal.record(opener->caller(), JournalLine("close").text("node", kMotorNode));
+        state.journal.record(caller, {{"op", "close"}, {"node", kMotorNode}});
     }
     fuse_reply_err(request, 0);
 }
 
-/// The motor sends no events: a reader waits until it is interrupted or the device is gone.
+// The motor sends no events: a reader waits until it is interrupted or the device is gone.
 void onRead(fuse_req_t request, size_t size, off_t, fuse_file_info* info) {
     State& state = stateOf(request);
     if (size < sizeof(input_event)) {
         fuse_reply_err(request, EINVAL);
-    } else if (isUnplugged(state)) {
+    } else if (isGone(state, info)) {
         fuse_reply_err(request, ENODEV);
     } else if ((info->flags & O_NONBLOCK) != 0) {
         fuse_reply_err(request, EAGAIN);
@@ -139,46 +139,50 @@ void onRead(fuse_req_t request, size_t size, off_t, fuse_file_info* info) {
     }
 }
 
-void onPoll(fuse_req_t request, fuse_file_info*, fuse_pollhandle* handle) {
-    fuse_reply_poll(request,
-                    isUnplugged(stateOf(request)) ? POLLERR | POLLHUP : POLLOUT | POLLWRNORM);
+void onPoll(fuse_req_t request, fuse_file_info* info, fuse_pollhandle* handle) {
+    const bool gone = isGone(stateOf(request), info);
+    fuse_reply_poll(request, gone ? POLLERR | POLLHUP : POLLOUT | POLLWRNORM);
     if (handle != nullptr) fuse_pollhandle_destroy(handle);
 }
 
-/// Records the events of one write, each with how many of its bytes were taken.
+// Records the events of one write, each with how many of its bytes were taken.
 void recordEvents(State& state, const Caller& caller, std::string_view events, size_t taken,
-                  int error) {
+                  int error, const Strike& strike) {
     for (size_t at = 0; at < events.size(); at += sizeof(input_event)) {
         input_event event;
         memcpy(&event, events.data() + at, sizeof event);
         const size_t own = std::min(sizeof event, taken - std::min(taken, at));
         state.journal.record(
-                caller, JournalLine("event")
-                                .text("node", kMotorNode)
-                                .number("type", event.type)
-                                .number("code", event.code)
-                                .number("value", event.value)
-                                .result("result", error != 0 ? -error : static_cast<int64_t>(own)));
+                caller,
+                {{"op", "event"},
+                 {"node", kMotorNode},
+                 {"type", event.type},
+                 {"code", event.code},
+                 {"value", event.value},
+                 {"result", resultOf(error != 0 ? -error : static_cast<int64_t>(own))}},
+                strike);
     }
 }
 
 void onWrite(fuse_req_t request, const char* data, size_t size, off_t, fuse_file_info* info) {
     State& state = stateOf(request);
-    const Caller caller = state.files.get(info->fh).callerOf(request);
+    const OpenMotor& file = state.files.get(info->fh);
+    const Caller caller = file.opener.callerOf(request);
     if (size < sizeof(input_event)) {
-        state.journal.record(caller, JournalLine("write")
-                                             .text("node", kMotorNode)
-                                             .bytes("data", "hex", std::string_view(data, size))
-                                             .result("result", -EINVAL));
+        JournalFields line{{"op", "write"}, {"node", kMotorNode}};
+        putBytes(line, "data", "hex", std::string_view(data, size));
+        line["result"] = resultOf(-EINVAL);
+        state.journal.record(caller, line);
         fuse_reply_err(request, EINVAL);
         return;
     }
     // A last piece that is no whole event is left over, as evdev does.
     const std::string_view events(data, size - size % sizeof(input_event));
-    const FaultAction fault = state.faults.next(kMotorNode, FaultOp::kWrite);
+    const auto arrival = std::chrono::steady_clock::now();
+    const FaultAction fault = state.faults.nextOf(kMotorNode, FaultOp::kWrite, file.unplugs);
     const int error = meetFault(request, state, fault);
     const size_t taken = std::min(events.size(), fault.shortCount.value_or(events.size()));
-    recordEvents(state, caller, events, taken, error);
+    recordEvents(state, caller, events, taken, error, {fault, arrival});
     if (error != 0) {
         fuse_reply_err(request, error);
     } else {
@@ -186,9 +190,9 @@ void onWrite(fuse_req_t request, const char* data, size_t size, off_t, fuse_file
     }
 }
 
-/// What the kernel still has to fetch from the caller before an upload can be judged, or nothing.
-/// It copies exactly what it is asked for, so a bad pointer fails there and never reaches the
-/// driver.
+// What the kernel still has to fetch from the caller before an upload can be judged, or nothing.
+// It copies exactly what it is asked for, so a bad pointer fails there and never reaches the
+// driver.
 size_t customBytes(const ff_effect& effect) {
     const bool custom = effect.type == FF_PERIODIC && effect.u.periodic.waveform == FF_CUSTOM;
     return custom ? effect.u.periodic.custom_len * sizeof(int16_t) : 0;
@@ -206,21 +210,21 @@ void fetchUpload(fuse_req_t request, char* record, const ff_effect* known) {
     fuse_reply_ioctl_retry(request, in, count, &out, 1);
 }
 
-/// Whether the slots would take an upload: 0, or why not (negative).
+// Whether the slots would take an upload: 0, or why not (negative).
 int checkUpload(State& state, uint64_t file, const ff_effect& effect) {
     const std::lock_guard lock(state.slotsMutex);
     return std::min(state.slots.check(file, effect), 0);
 }
 
-/// Takes an upload unless it has failed already (`result` negative), notes it and answers.
+// Takes an upload unless it has failed already (`result` negative), notes it and answers.
 void finishUpload(fuse_req_t request, uint64_t file, const ff_effect& effect,
-                  std::string_view custom, int result) {
+                  std::string_view custom, int result, const Strike& strike) {
     State& state = stateOf(request);
     {
         const std::lock_guard lock(state.slotsMutex);
         if (result == 0) result = state.slots.upload(file, effect);
-        state.journal.record(state.files.get(file).callerOf(request),
-                             uploadLine(asDriverSees(effect), custom, result));
+        state.journal.record(state.files.get(file).opener.callerOf(request),
+                             uploadLine(asDriverSees(effect), custom, result), strike);
     }
     if (result < 0) {
         fuse_reply_err(request, -result);
@@ -230,8 +234,8 @@ void finishUpload(fuse_req_t request, uint64_t file, const ff_effect& effect,
     fuse_reply_ioctl(request, 0, &id, sizeof id);
 }
 
-/// Comes up to three times for one upload: with nothing, with the record, and with its data, which
-/// are asked for only when the input core would have the driver fetch them.
+// Comes up to three times for one upload: with nothing, with the record, and with its data, which
+// are asked for only when the input core would have the driver fetch them.
 void onUpload(fuse_req_t request, char* record, const fuse_file_info* info, const void* buffer,
               size_t size) {
     State& state = stateOf(request);
@@ -247,12 +251,16 @@ void onUpload(fuse_req_t request, char* record, const fuse_file_info* info, cons
         fetchUpload(request, record, &effect);
         return;
     }
+    const auto arrival = std::chrono::steady_clock::now();
+    FaultAction fault;
     if (result == 0) {
-        result = -meetFault(request, state, state.faults.next(kMotorNode, FaultOp::kUpload));
+        fault = state.faults.nextOf(kMotorNode, FaultOp::kUpload,
+                                    state.files.get(info->fh).unplugs);
+        result = -meetFault(request, state, fault);
     }
     const std::string_view custom(static_cast<const char*>(buffer) + sizeof effect,
                                   size - sizeof effect);
-    finishUpload(request, info->fh, effect, custom, result);
+    finishUpload(request, info->fh, effect, custom, result, {fault, arrival});
 }
 
 void onErase(fuse_req_t request, int id, const fuse_file_info* info) {
@@ -262,17 +270,20 @@ void onErase(fuse_req_t request, int id, const fuse_file_info* info) {
         const std::lock_guard lock(state.slotsMutex);
         result = state.slots.checkErase(info->fh, id);
     }
+    const OpenMotor& file = state.files.get(info->fh);
+    const auto arrival = std::chrono::steady_clock::now();
+    FaultAction fault;
     if (result == 0) {
-        result = -meetFault(request, state, state.faults.next(kMotorNode, FaultOp::kErase));
+        fault = state.faults.nextOf(kMotorNode, FaultOp::kErase, file.unplugs);
+        result = -meetFault(request, state, fault);
     }
     {
         const std::lock_guard lock(state.slotsMutex);
         if (result == 0) result = state.slots.erase(info->fh, id);
-        state.journal.record(state.files.get(info->fh).callerOf(request),
-                             JournalLine("erase")
-                                     .text("node", kMotorNode)
-                                     .number("id", id)
-                                     .result("result", result));
+        state.journal.record(
+                file.opener.callerOf(request),
+                {{"op", "erase"}, {"node", kMotorNode}, {"id", id}, {"result", resultOf(result)}},
+                {fault, arrival});
     }
     if (result < 0) {
         fuse_reply_err(request, -result);
@@ -293,8 +304,8 @@ void onQuery(fuse_req_t request, unsigned command, void* memory, size_t room) {
     }
 }
 
-/// The kernel takes the size in a request's number for part of its argument, and a record of
-/// another size for one it cannot reach.
+// The kernel takes the size in a request's number for part of its argument, and a record of
+// another size for one it cannot reach.
 bool isUploadOfAnotherSize(unsigned command) {
     return command != EVIOCSFF && _IOC_DIR(command) == _IOC_DIR(EVIOCSFF) &&
            _IOC_TYPE(command) == _IOC_TYPE(EVIOCSFF) && _IOC_NR(command) == _IOC_NR(EVIOCSFF);
@@ -303,7 +314,7 @@ bool isUploadOfAnotherSize(unsigned command) {
 void onIoctl(fuse_req_t request, int number, void* argument, fuse_file_info* info, unsigned flags,
              const void* input, size_t inputSize, size_t outputSize) {
     const auto command = static_cast<unsigned>(number);
-    if (isUnplugged(stateOf(request))) {
+    if (isGone(stateOf(request), info)) {
         fuse_reply_err(request, ENODEV);
     } else if ((flags & FUSE_IOCTL_COMPAT) != 0) {
         fuse_reply_err(request, EINVAL);  // 32-bit clients have another layout
@@ -333,18 +344,17 @@ cuse_lowlevel_ops operations() {
 
 }  // namespace
 
-Result<std::unique_ptr<MotorDevice>> MotorDevice::start(const MotorSpec& motor, unsigned event,
-                                                        FaultBook& faults, Journal& journal,
+Result<std::unique_ptr<MotorDevice>> MotorDevice::start(const MotorProfile& motor, unsigned event,
+                                                        FaultInjector& faults, Journal& journal,
                                                         int ended) {
-    UniqueFd device(open("/dev/cuse", O_RDWR | O_CLOEXEC | O_NONBLOCK));
-    if (!device) {
-        return Error{fmt::format("/dev/cuse: {}; a motor needs the kernel's cuse module",
-                                 strerror(errno))};
+    unique_fd device(open("/dev/cuse", O_RDWR | O_CLOEXEC | O_NONBLOCK));
+    if (!device.ok()) {
+        return Error() << fmt::format("/dev/cuse: {}; a motor needs the kernel's cuse module",
+                                      strerror(errno));
     }
     std::unique_ptr<MotorDevice> started(new MotorDevice);
-    started->state_ = std::unique_ptr<State>(
-            new State{motor, faults, journal, EffectSlots(motor.effectsMax)});
-    State& state = *started->state_;
+    started->mState = std::unique_ptr<State>(new State{motor, faults, journal});
+    State& state = *started->mState;
 
     char name[] = "handset-driver";
     char* arguments[] = {name, nullptr};
@@ -353,24 +363,30 @@ Result<std::unique_ptr<MotorDevice>> MotorDevice::start(const MotorSpec& motor, 
     const char* deviceInfo[] = {deviceName.c_str()};
     const cuse_info info{0, 0, 1, deviceInfo, CUSE_UNRESTRICTED_IOCTL};
     const cuse_lowlevel_ops ops = operations();
-    started->session_ = cuse_lowlevel_new(&args, &info, &ops, &state);
+    started->mSession = cuse_lowlevel_new(&args, &info, &ops, &state);
     fuse_opt_free_args(&args);
-    if (started->session_ == nullptr) return Error{"no CUSE session"};
+    if (started->mSession == nullptr) return Error() << "no CUSE session";
 
     const int fd = device.release();  // the session closes it
-    fuse_session_mount(started->session_, fmt::format("/dev/fd/{}", fd).c_str());
-    started->loop_ = std::make_unique<SessionLoop>(started->session_, fd, ended);
-    if (!state.ready.await(kInitPatience)) {
-        return Error{fmt::format("{}: the kernel did not make the device", eventNodePath(event))};
+    fuse_session_mount(started->mSession, fmt::format("/dev/fd/{}", fd).c_str());
+    started->mLoop = std::make_unique<SessionLoop>(started->mSession, fd, ended);
+    if (!state.ready.try_acquire_for(kInitTimeout)) {
+        return Error() << fmt::format("{}: the kernel did not make the device",
+                                      eventNodePath(event));
     }
-    if (auto failure = started->node_.handOver(event)) return *failure;
+    if (auto done = started->mNode.handOver(event); !done) return done.error();
     return started;
 }
 
+void MotorDevice::forgetEffects() {
+    const std::lock_guard lock(mState->slotsMutex);
+    mState->slots = EffectSlots(mState->motor.effectsMax);
+}
+
 MotorDevice::~MotorDevice() {
-    if (state_) state_->stopping = true;
-    loop_.reset();
-    if (session_ != nullptr) fuse_session_destroy(session_);
+    if (mState) mState->stopping = true;
+    mLoop.reset();
+    if (mSession != nullptr) fuse_session_destroy(mSession);
 }
 
 }  // namespace handset

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The questions an evdev device answers.
-#include "driver/motor_queries.h"
+#include "handset/driver/motor_queries.h"
 
 #include <linux/input.h>
 #include <sys/ioctl.h>
@@ -44,7 +45,7 @@ constexpr std::array kStates = {
         State{_IOC_NR(EVIOCGSW(0)), SW_MAX},
 };
 
-/// A bit map of whole longs for codes up to `largest`.
+// A bit map of whole longs for codes up to `largest`.
 std::string bitMap(unsigned largest, std::initializer_list<unsigned> bits) {
     std::string map((largest + kLongBits - 1) / kLongBits * sizeof(uint64_t), '\0');
     for (const unsigned bit : bits) {
@@ -71,7 +72,7 @@ std::optional<std::string> presentState(unsigned number) {
     return bitMap(known->largestCode, {});
 }
 
-/// An answer of whatever fits; its length is the result.
+// An answer of whatever fits; its length is the result.
 QueryAnswer cutTo(size_t room, std::string data) {
     data.resize(std::min(room, data.size()));
     return {static_cast<int>(data.size()), std::move(data)};
@@ -84,7 +85,7 @@ QueryAnswer whole(const Value& value) {
 
 }  // namespace
 
-std::optional<QueryAnswer> answerQuery(const MotorSpec& motor, unsigned command) {
+std::optional<QueryAnswer> answerQuery(const MotorProfile& motor, unsigned command) {
     switch (command) {
         case EVIOCGVERSION:
             return whole(kProtocolVersion);

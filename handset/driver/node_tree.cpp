@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// The driver's nodes and the folders they lie in.
-#include "driver/node_tree.h"
+//
+// The driver's nodes and the directories they lie in.
+#include "handset/driver/node_tree.h"
 
 #include <algorithm>
 
@@ -26,39 +27,39 @@ mode_t modeOf(Access access) {
 
 }  // namespace
 
-Node::Node(NodeSpec spec)
-    : spec_(std::move(spec)),
-      text_(spec_.text),
-      attributes_{modeOf(spec_.access), kSystemUser, kSystemUser} {}
+Node::Node(NodeProfile spec)
+    : mSpec(std::move(spec)),
+      mText(mSpec.text),
+      mAttributes{modeOf(mSpec.access), kSystemUser, kSystemUser} {}
 
 std::string Node::text() const {
-    const std::lock_guard lock(mutex_);
-    return text_;
+    const std::lock_guard lock(mMutex);
+    return mText;
 }
 
 void Node::store(std::string_view text) {
-    if (!spec_.hold) setText(text);
+    if (!mSpec.hold) setText(text);
 }
 
 void Node::setText(std::string_view text) {
-    const std::lock_guard lock(mutex_);
-    text_ = text;
+    const std::lock_guard lock(mMutex);
+    mText = text;
 }
 
 Attributes Node::attributes() const {
-    const std::lock_guard lock(mutex_);
-    return attributes_;
+    const std::lock_guard lock(mMutex);
+    return mAttributes;
 }
 
 void Node::setAttributes(const Attributes& attributes) {
-    const std::lock_guard lock(mutex_);
-    attributes_ = attributes;
+    const std::lock_guard lock(mMutex);
+    mAttributes = attributes;
 }
 
-NodeTree::NodeTree(std::string_view root, const std::vector<NodeSpec>& nodes) : root_(root) {
-    entries_.emplace_back();
-    entries_.back().inode = entries_.back().parent = kRootInode;
-    for (const NodeSpec& spec : nodes) {
+NodeTree::NodeTree(std::string_view root, const std::vector<NodeProfile>& nodes) : mRoot(root) {
+    mEntries.emplace_back();
+    mEntries.back().inode = mEntries.back().parent = kRootInode;
+    for (const NodeProfile& spec : nodes) {
         uint64_t at = kRootInode;
         const std::string_view path = std::string_view(spec.path).substr(root.size());
         for (size_t slash = 0; slash < path.size();) {
@@ -66,49 +67,49 @@ NodeTree::NodeTree(std::string_view root, const std::vector<NodeSpec>& nodes) : 
             at = addChild(at, path.substr(slash + 1, end - slash - 1));
             slash = end;
         }
-        entries_[at - kRootInode].node = std::make_unique<Node>(spec);
+        mEntries[at - kRootInode].node = std::make_unique<Node>(spec);
     }
 }
 
-uint64_t NodeTree::addChild(uint64_t folder, std::string_view name) {
-    if (const TreeEntry* existing = child(folder, name)) return existing->inode;
+uint64_t NodeTree::addChild(uint64_t directory, std::string_view name) {
+    if (const TreeEntry* existing = child(directory, name)) return existing->inode;
     TreeEntry entry;
     entry.name = name;
-    entry.inode = entries_.size() + kRootInode;
-    entry.parent = folder;
-    entries_[folder - kRootInode].children.emplace(name, entry.inode);
-    entries_.push_back(std::move(entry));
-    return entries_.back().inode;
+    entry.inode = mEntries.size() + kRootInode;
+    entry.parent = directory;
+    mEntries[directory - kRootInode].children.emplace(name, entry.inode);
+    mEntries.push_back(std::move(entry));
+    return mEntries.back().inode;
 }
 
 const TreeEntry* NodeTree::find(uint64_t inode) const {
     const uint64_t index = inode - kRootInode;
-    return index < entries_.size() ? &entries_[index] : nullptr;
+    return index < mEntries.size() ? &mEntries[index] : nullptr;
 }
 
-const TreeEntry* NodeTree::child(uint64_t folder, std::string_view name) const {
-    const TreeEntry* entry = find(folder);
+const TreeEntry* NodeTree::child(uint64_t directory, std::string_view name) const {
+    const TreeEntry* entry = find(directory);
     if (entry == nullptr) return nullptr;
     const auto found = entry->children.find(name);
     return found != entry->children.end() ? find(found->second) : nullptr;
 }
 
 Node* NodeTree::nodeAt(std::string_view path) const {
-    const auto found = std::find_if(entries_.begin(), entries_.end(), [&](const TreeEntry& entry) {
+    const auto found = std::find_if(mEntries.begin(), mEntries.end(), [&](const TreeEntry& entry) {
         return entry.node && entry.node->path() == path;
     });
-    return found != entries_.end() ? found->node.get() : nullptr;
+    return found != mEntries.end() ? found->node.get() : nullptr;
 }
 
-std::string NodeTree::pathOf(uint64_t folder, std::string_view name) const {
+std::string NodeTree::pathOf(uint64_t directory, std::string_view name) const {
     std::string path = "/" + std::string(name);
-    for (uint64_t at = folder; at != kRootInode;) {
+    for (uint64_t at = directory; at != kRootInode;) {
         const TreeEntry* entry = find(at);
         if (entry == nullptr) break;
         path.insert(0, "/" + entry->name);
         at = entry->parent;
     }
-    return root_ + path;
+    return mRoot + path;
 }
 
 }  // namespace handset

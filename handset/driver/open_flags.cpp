@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The flags of an open(2), as text.
-#include "driver/open_flags.h"
+#include "handset/driver/open_flags.h"
 
 #include <fcntl.h>
 

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Permission bits.
-#include "driver/permission.h"
+#include "handset/driver/permission.h"
 
 #include <fcntl.h>
 

@@ -1,20 +1,22 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // A profile's plain files at their fixed paths.
 #pragma once
 
 #include <string>
 #include <vector>
 
-#include "driver/private_mounts.h"
-#include "driver/profile.h"
-#include "driver/result.h"
+#include <android-base/result.h>
+
+#include "handset/driver/private_mounts.h"
+#include "handset/driver/profile.h"
 
 namespace handset {
 
-/// Places files inside the private mount namespace, owned by the platform's system user. A file
-/// that exists is covered, not changed. Where a folder is missing, its topmost missing parent is
-/// made and covered with a memory file system; that empty folder, or an empty file where only the
-/// last name is missing, is all that shows outside, and it goes away with this object.
+// Places files inside the private mount namespace, owned by the platform's system user. A file
+// that exists is covered, not changed. Where a directory is missing, its topmost missing parent is
+// made and covered with a memory file system; that empty directory, or an empty file where only the
+// last name is missing, is all that shows outside, and it goes away with this object.
 class PlacedFiles {
   public:
     PlacedFiles() = default;
@@ -22,17 +24,17 @@ class PlacedFiles {
     PlacedFiles& operator=(const PlacedFiles&) = delete;
     ~PlacedFiles();
 
-    Failure place(const FileSpec& file, StagingFolder& staging);
+    android::base::Result<void> place(const FileProfile& file, StagingDirectory& staging);
 
   private:
     struct Made {
         std::string path;
-        bool folder = false;
+        bool directory = false;
     };
 
-    Failure placeBelow(const std::string& missing, const FileSpec& file);
+    android::base::Result<void> placeBelow(const std::string& missing, const FileProfile& file);
 
-    std::vector<Made> made_;
+    std::vector<Made> mMade;
 };
 
 }  // namespace handset

@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The mount namespace in which a phone's files exist.
-#include "driver/private_mounts.h"
+#include "handset/driver/private_mounts.h"
 
 #include <fcntl.h>
-#include <fmt/format.h>
 #include <sched.h>
 #include <sys/mount.h>
 #include <sys/stat.h>
@@ -14,69 +14,71 @@
 #include <cstring>
 #include <utility>
 
-#include "common/unique_fd.h"
+#include <android-base/unique_fd.h>
+#include <fmt/format.h>
 
 namespace handset {
 namespace {
 
-Error systemError(std::string_view what) {
-    return Error{fmt::format("{}: {}", what, strerror(errno))};
-}
+using android::base::ErrnoError;
+using android::base::Error;
+using android::base::Result;
+using android::base::unique_fd;
 
 }  // namespace
 
-Failure enterPrivateMounts() {
-    if (unshare(CLONE_NEWNS) != 0) return systemError("private mount namespace");
+Result<void> enterPrivateMounts() {
+    if (unshare(CLONE_NEWNS) != 0) return ErrnoError() << "private mount namespace";
     if (mount(nullptr, "/", nullptr, MS_REC | MS_PRIVATE, nullptr) != 0) {
-        return systemError("private mounts");
+        return ErrnoError() << "private mounts";
     }
-    return std::nullopt;
+    return {};
 }
 
-Result<StagingFolder> StagingFolder::create() {
+Result<StagingDirectory> StagingDirectory::create() {
     std::string path = "/tmp/handset-XXXXXX";
-    if (mkdtemp(path.data()) == nullptr) return systemError("temporary folder");
+    if (mkdtemp(path.data()) == nullptr) return ErrnoError() << "temporary directory";
     if (mount("handset", path.c_str(), "tmpfs", MS_NOSUID | MS_NODEV, "mode=0755") != 0) {
-        const Error error = systemError("mount on " + path);
+        const int error = errno;
         rmdir(path.c_str());
-        return error;
+        return Error(error) << "mount on " << path;
     }
-    return StagingFolder(std::move(path));
+    return StagingDirectory(std::move(path));
 }
 
-StagingFolder::StagingFolder(StagingFolder&& other) noexcept
-    : path_(std::exchange(other.path_, {})), files_(other.files_) {}
+StagingDirectory::StagingDirectory(StagingDirectory&& other) noexcept
+    : mPath(std::exchange(other.mPath, {})), mFiles(other.mFiles) {}
 
-StagingFolder::~StagingFolder() {
-    if (path_.empty()) return;
-    umount2(path_.c_str(), MNT_DETACH);
-    rmdir(path_.c_str());
+StagingDirectory::~StagingDirectory() {
+    if (mPath.empty()) return;
+    umount2(mPath.c_str(), MNT_DETACH);
+    rmdir(mPath.c_str());
 }
 
-Failure StagingFolder::bindFile(const std::string& target, const std::string& content, uid_t owner,
-                                mode_t mode) {
-    const std::string source = fmt::format("{}/{}", path_, ++files_);
-    if (auto failure = writeNewFile(source, content, owner, mode)) return failure;
+Result<void> StagingDirectory::bindFile(const std::string& target, const std::string& content,
+                                        uid_t owner, mode_t mode) {
+    const std::string source = fmt::format("{}/{}", mPath, ++mFiles);
+    if (auto done = writeNewFile(source, content, owner, mode); !done) return done;
     if (mount(source.c_str(), target.c_str(), nullptr, MS_BIND, nullptr) != 0) {
-        return systemError("mount on " + target);
+        return ErrnoError() << "mount on " + target;
     }
-    return std::nullopt;
+    return {};
 }
 
-Failure writeNewFile(const std::string& path, const std::string& content, uid_t owner,
-                     mode_t mode) {
-    const UniqueFd file(open(path.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600));
-    if (!file) return systemError(path);
+Result<void> writeNewFile(const std::string& path, const std::string& content, uid_t owner,
+                          mode_t mode) {
+    const unique_fd file(open(path.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600));
+    if (!file.ok()) return ErrnoError() << path;
     for (size_t done = 0; done < content.size();) {
         const ssize_t size = write(file.get(), content.data() + done, content.size() - done);
         if (size < 0 && errno == EINTR) continue;
-        if (size <= 0) return systemError(path);
+        if (size <= 0) return ErrnoError() << path;
         done += static_cast<size_t>(size);
     }
     if (fchown(file.get(), owner, owner) != 0 || fchmod(file.get(), mode) != 0) {
-        return systemError(path);
+        return ErrnoError() << path;
     }
-    return std::nullopt;
+    return {};
 }
 
 }  // namespace handset

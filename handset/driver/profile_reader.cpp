@@ -1,24 +1,26 @@
 // SPDX-License-Identifier: Apache-2.0
-// Reading a profile from JSON.
-#include "driver/profile_reader.h"
+//
+// A profile's keys, table by table, and what its parts have to agree on.
+#include "handset/driver/profile_reader.h"
 
-#include <fcntl.h>
-#include <fmt/format.h>
 #include <linux/input.h>
-#include <unistd.h>
 
 #include <algorithm>
-#include <array>
 #include <cerrno>
 #include <climits>
 #include <cstring>
+#include <fstream>
 
-#include "common/unique_fd.h"
-#include "driver/error_names.h"
-#include "driver/json_fields.h"
+#include <fmt/format.h>
+
+#include "handset/driver/error_names.h"
 
 namespace handset {
 namespace {
+
+using android::base::ErrnoError;
+using android::base::Error;
+using android::base::Result;
 
 constexpr size_t kLargestProfile = 1 << 20;
 constexpr uint64_t kLongestDelay = 600000;  // ten minutes: longer is a slip of the pen
@@ -27,23 +29,63 @@ constexpr unsigned kLargestEvent = 1023;
 constexpr std::string_view kNodeRoot = "/sys/class/";
 constexpr std::string_view kEventMark = "{event}";
 
-struct NamedAccess {
-    std::string_view name;
-    Access access;
+std::string stringOf(const Json& value) {
+    return value.get<std::string>();
+}
+
+std::string bytesOf(const Json& digits) {
+    return *decodeHex(stringOf(digits));
+}
+
+Access accessOf(std::string_view mode) {
+    if (mode == "ro") return Access::kReadOnly;
+    return mode == "wo" ? Access::kWriteOnly : Access::kReadWrite;
+}
+
+FaultOp faultOpOf(std::string_view name) {
+    for (const FaultOp op : {FaultOp::kOpen, FaultOp::kRead, FaultOp::kWrite, FaultOp::kUpload}) {
+        if (faultOpName(op) == name) return op;
+    }
+    return FaultOp::kErase;
+}
+
+// clang-format off
+const std::vector<Field<NodeProfile>> kNodeFields = {
+        {"mode", Accepted::name({"rw", "ro", "wo"}), [](auto& node, auto& value) { node.access = accessOf(stringOf(value)); }, true},
+        {"text", Accepted::string(),                 [](auto& node, auto& value) { node.text = stringOf(value); }},
+        {"hex",  Accepted::hex(),                    [](auto& node, auto& value) { node.text = bytesOf(value); }},
+        {"hold", Accepted::boolean(),                [](auto& node, auto& value) { node.hold = value; }},
 };
 
-constexpr std::array kAccesses = {
-        NamedAccess{"rw", Access::kReadWrite},
-        NamedAccess{"ro", Access::kReadOnly},
-        NamedAccess{"wo", Access::kWriteOnly},
+const std::vector<Field<FileProfile>> kFileFields = {
+        {"text", Accepted::string(), [](auto& file, auto& value) { file.text = stringOf(value); }},
+        {"hex",  Accepted::hex(),    [](auto& file, auto& value) { file.text = bytesOf(value); }},
 };
 
-constexpr std::array kNodeOps = {FaultOp::kOpen, FaultOp::kRead, FaultOp::kWrite};
-constexpr std::array kMotorOps = {FaultOp::kOpen, FaultOp::kWrite, FaultOp::kUpload,
-                                  FaultOp::kErase};
+const std::vector<Field<MotorProfile>> kMotorFields = {
+        {"name",        Accepted::string(),                   [](auto& motor, auto& value) { motor.name = stringOf(value); }},
+        {"event",       Accepted::integer(0, kLargestEvent),  [](auto& motor, auto& value) { motor.event = value.template get<unsigned>(); }},
+        {"effects_max", Accepted::integer(1, FF_MAX_EFFECTS), [](auto& motor, auto& value) { motor.effectsMax = value; }},
+};
 
-/// An absolute path of plain components, as a profile has to spell it: there is one spelling for
-/// each file, so that two entries cannot mean the same one.
+const std::vector<Field<Fault>> kFaultFields = {
+        {"node",   Accepted::node(),                       [](auto& fault, auto& value) { fault.node = stringOf(value); }, true},
+        {"op",     Accepted::name({"open", "read", "write", "upload", "erase"}),
+                                                           [](auto& fault, auto& value) { fault.op = faultOpOf(stringOf(value)); }, true},
+        {"errno",  Accepted::errorName(),                  [](auto& fault, auto& value) { fault.action.error = *errorNumber(stringOf(value)); }},
+        {"short",  Accepted::integer(0, INT_MAX, "bytes"),  [](auto& fault, auto& value) { fault.action.shortCount = value.template get<size_t>(); }},
+        {"delay",  Accepted::integer(0, kLongestDelay, "milliseconds"),  [](auto& fault, auto& value) { fault.action.delay = std::chrono::milliseconds(value); }},
+        {"unplug", Accepted::boolean(),                    [](auto& fault, auto& value) { fault.action.unplug = value; }},
+        {"text",   Accepted::string(),                     [](auto& fault, auto& value) { fault.action.text = stringOf(value); }},
+        {"hex",    Accepted::hex(),                        [](auto& fault, auto& value) { fault.action.text = bytesOf(value); }},
+        {"after",  Accepted::integer(0, UINT32_MAX, "calls"),  [](auto& fault, auto& value) { fault.after = value; }},
+        {"times",  Accepted::integer(0, UINT32_MAX, "calls"),  [](auto& fault, auto& value) { fault.times = value; }},
+        {"every",  Accepted::integer(1, UINT32_MAX, "calls"),  [](auto& fault, auto& value) { fault.every = value; }},
+};
+// clang-format on
+
+// An absolute path of plain components, as a profile has to spell it: there is one spelling for
+// each file, so that two entries cannot mean the same one.
 bool isPlainPath(std::string_view path) {
     if (path.size() < 2 || path.size() >= PATH_MAX || path.front() != '/') return false;
     if (path.find('\0') != std::string_view::npos) return false;
@@ -57,258 +99,193 @@ bool isPlainPath(std::string_view path) {
     return true;
 }
 
-bool isBelow(std::string_view path, std::string_view folder) {
-    return path.size() > folder.size() && path.starts_with(folder) && path[folder.size()] == '/';
+bool isBelow(std::string_view path, std::string_view directory) {
+    return path.size() > directory.size() && path.starts_with(directory) &&
+           path[directory.size()] == '/';
 }
 
-Failure checkPlainPath(const std::string& where, std::string_view path) {
-    if (isPlainPath(path)) return std::nullopt;
-    return Error{fmt::format("{}: an absolute path without empty, \".\" or \"..\" parts expected",
-                             where)};
+Result<void> checkPlainPath(const std::string& where, std::string_view path) {
+    if (isPlainPath(path)) return {};
+    return Error() << fmt::format(
+                   "{}: an absolute path without empty, \".\" or \"..\" parts expected", where);
 }
 
-/// Fails where one entry is a folder on another's path: a file cannot be both.
+Result<void> checkOneContent(const Json& value, const std::string& where) {
+    if (!value.is_object() || !value.contains("text") || !value.contains("hex")) return {};
+    return Error() << fmt::format("{}: text and hex exclude each other", where);
+}
+
+// Fails where one entry is a directory on another's path: a file cannot be both.
 template <typename Entry>
-Failure checkNested(const std::vector<Entry>& entries, const char* table) {
+Result<void> checkNested(const std::vector<Entry>& entries, const char* table) {
     for (const Entry& outer : entries) {
         for (const Entry& inner : entries) {
             if (!isBelow(inner.path, outer.path)) continue;
-            return Error{fmt::format("{}: \"{}\" is a file, so \"{}\" cannot lie below it", table,
-                                     outer.path, inner.path)};
+            return Error() << fmt::format("{}: \"{}\" is a file, so \"{}\" cannot lie below it",
+                                          table, outer.path, inner.path);
         }
     }
-    return std::nullopt;
+    return {};
 }
 
-Failure readNode(const std::string& path, const Json& value, Profile& profile) {
+Result<void> readNode(const std::string& path, const Json& value, Profile& profile) {
     const std::string where = fmt::format("nodes[\"{}\"]", path);
-    NodeSpec node;
-    node.path = path;
-    if (auto failure = checkPlainPath(where, path)) return failure;
+    if (auto done = checkPlainPath(where, path); !done) return done;
     if (!path.starts_with(kNodeRoot)) {
-        return Error{fmt::format("{}: nodes lie below {}; plain files go under \"files\"", where,
-                                 kNodeRoot)};
+        return Error() << fmt::format("{}: nodes lie below {}; plain files go under \"files\"",
+                                      where, kNodeRoot);
     }
-    if (auto failure = checkObject(value, where, {"mode", "text", "hex", "hold"})) return failure;
-    std::string mode;
-    if (auto failure = readText(value, where, "mode", mode)) return failure;
-    const auto* access = std::find_if(kAccesses.begin(), kAccesses.end(),
-                                      [&](const NamedAccess& named) { return named.name == mode; });
-    if (access == kAccesses.end()) {
-        const std::string given = value.contains("mode") ? fmt::format("\"{}\" unknown", mode)
-                                                         : std::string("missing");
-        return Error{fmt::format("{}.mode: {}; accepted: rw, ro, wo", where, given)};
-    }
-    node.access = access->access;
-    if (auto failure = readBytes(value, where, node.text)) return failure;
-    if (auto failure = readTruth(value, where, "hold", node.hold)) return failure;
+    NodeProfile node;
+    node.path = path;
+    if (auto done = checkOneContent(value, where); !done) return done;
+    if (auto done = readFields(value, where, kNodeFields, node); !done) return done;
     profile.nodes.push_back(std::move(node));
-    return std::nullopt;
+    return {};
 }
 
-Failure readFile(const std::string& path, const Json& value, Profile& profile) {
+Result<void> readFile(const std::string& path, const Json& value, Profile& profile) {
     const std::string where = fmt::format("files[\"{}\"]", path);
-    if (auto failure = checkPlainPath(where, path)) return failure;
-    for (const std::string_view folder : {"/proc", "/sys", "/dev"}) {
-        if (path != folder && !isBelow(path, folder)) continue;
-        return Error{fmt::format("{}: plain files do not lie below {}", where, folder)};
+    if (auto done = checkPlainPath(where, path); !done) return done;
+    for (const std::string_view directory : {"/proc", "/sys", "/dev"}) {
+        if (path != directory && !isBelow(path, directory)) continue;
+        return Error() << fmt::format("{}: plain files do not lie below {}", where, directory);
     }
-    FileSpec file{path, ""};
+    FileProfile file{path, ""};
     if (value.is_string()) {
         file.text = value.get<std::string>();
     } else if (!value.is_object()) {
-        return Error{fmt::format("{}: a text, or an object with text or hex, expected, not {}",
-                                 where, kindOf(value))};
+        return Error() << fmt::format(
+                       "{}: a string, or an object with text or hex, expected, not {}", where,
+                       kindOf(value));
     } else {
-        if (auto failure = checkObject(value, where, {"text", "hex"})) return failure;
-        if (auto failure = readBytes(value, where, file.text)) return failure;
+        if (auto done = checkOneContent(value, where); !done) return done;
+        if (auto done = readFields(value, where, kFileFields, file); !done) return done;
     }
     profile.files.push_back(std::move(file));
-    return std::nullopt;
+    return {};
 }
 
-Failure readMotor(const Json& value, Profile& profile) {
-    if (value.is_null()) return std::nullopt;
-    if (auto failure = checkObject(value, "motor", {"name", "event", "effects_max"})) {
-        return failure;
+// Reads a fault's keys, then what they have to agree on.
+Result<void> readFault(const Json& value, const std::string& where, const Profile& profile,
+                       Fault& fault) {
+    if (auto done = checkOneContent(value, where); !done) return done;
+    if (auto done = readFields(value, where, kFaultFields, fault); !done) return done;
+    const bool isMotor = fault.node == kMotorNode;
+    if (isMotor && !profile.motor)
+        return Error() << fmt::format("{}.node: the profile has no motor", where);
+    if (!isMotor && profile.findNode(fault.node) == nullptr) {
+        return Error() << fmt::format("{}.node: the profile has no node \"{}\"", where, fault.node);
     }
-    MotorSpec motor;
-    if (auto failure = readText(value, "motor", "name", motor.name)) return failure;
+    const bool isNodes = fault.op == FaultOp::kRead;
+    const bool isMotors = fault.op == FaultOp::kUpload || fault.op == FaultOp::kErase;
+    if (isMotor ? isNodes : isMotors) {
+        return Error() << fmt::format("{}.op: \"{}\" unknown; accepted: {}", where,
+                                      faultOpName(fault.op),
+                                      isMotor ? "open, write, upload, erase" : "open, read, write");
+    }
+    const FaultAction& action = fault.action;
+    if (action.shortCount && fault.op != FaultOp::kRead && fault.op != FaultOp::kWrite) {
+        return Error() << fmt::format("{}.short: only a read or write can be short", where);
+    }
+    if (action.shortCount && action.error != 0) {
+        return Error() << fmt::format("{}: errno and short exclude each other", where);
+    }
+    if (action.text && fault.op != FaultOp::kRead) {
+        return Error() << fmt::format("{}: only a read can show other contents", where);
+    }
+    if (action.text && action.error != 0) {
+        return Error() << fmt::format("{}: errno and other contents exclude each other", where);
+    }
+    if (!action.strikes()) {
+        return Error() << fmt::format(
+                       "{}: nothing goes wrong; give one of errno, short, delay, unplug, text, hex",
+                       where);
+    }
+    return {};
+}
+
+Result<void> readDescription(const Json& value, Profile& profile) {
+    if (auto done = checkValue(value, "", "description", Accepted::string()); !done) return done;
+    profile.description = stringOf(value);
+    return {};
+}
+
+// Reads a table of paths entry by entry.
+template <typename ReadEntry>
+Result<void> readTable(const Json& value, const char* name, Profile& profile, ReadEntry readEntry) {
+    if (!value.is_object()) {
+        return Error() << fmt::format("{}: an object expected, not {}", name, kindOf(value));
+    }
+    for (const auto& [path, entry] : value.items()) {
+        if (auto done = readEntry(path, entry, profile); !done) return done;
+    }
+    return {};
+}
+
+Result<void> readNodes(const Json& value, Profile& profile) {
+    if (auto done = readTable(value, "nodes", profile, readNode); !done) return done;
+    return checkNested(profile.nodes, "nodes");
+}
+
+Result<void> readFiles(const Json& value, Profile& profile) {
+    if (auto done = readTable(value, "files", profile, readFile); !done) return done;
+    return checkNested(profile.files, "files");
+}
+
+Result<void> readMotor(const Json& value, Profile& profile) {
+    MotorProfile motor;
+    if (auto done = readFields(value, "motor", kMotorFields, motor); !done) return done;
     if (motor.name.empty() || motor.name.find_first_of({"\n\0", 2}) != std::string::npos) {
-        return Error{"motor.name: a text of one line expected"};
+        return Error() << "motor.name: a string of one line expected";
     }
-    uint64_t event = 0;
-    if (auto failure = readNumber(value, "motor", "event", 0, kLargestEvent, event)) {
-        return failure;
-    }
-    if (value.contains("event")) motor.event = static_cast<unsigned>(event);
-    uint64_t effects = motor.effectsMax;
-    if (auto failure = readNumber(value, "motor", "effects_max", 1, FF_MAX_EFFECTS, effects)) {
-        return failure;
-    }
-    motor.effectsMax = static_cast<unsigned>(effects);
     profile.motor = std::move(motor);
-    return std::nullopt;
+    return {};
 }
 
-Failure readInputDevices(const Json& value, Profile& profile) {
-    if (value.is_null()) return std::nullopt;
+Result<void> readInputDevices(const Json& value, Profile& profile) {
     if (!value.is_string()) {
-        return Error{fmt::format("input_devices: a text or null expected, not {}", kindOf(value))};
+        return Error() << fmt::format("input_devices: a string or null expected, not {}",
+                                      kindOf(value));
     }
     std::string text = value.get<std::string>();
     if (!profile.motor && text.find(kEventMark) != std::string::npos) {
-        return Error{"input_devices: {event} needs a motor, and the profile has none"};
+        return Error() << "input_devices: {event} needs a motor, and the profile has none";
     }
     profile.inputDevices = std::move(text);
-    return std::nullopt;
+    return {};
 }
 
-/// Reads the operation's name; which are accepted depends on what the fault is for.
-template <size_t count>
-Failure readOp(const Json& value, const std::string& where,
-               const std::array<FaultOp, count>& accepted, FaultOp& out) {
-    std::string name;
-    if (auto failure = readText(value, where, "op", name)) return failure;
-    std::vector<std::string_view> names;
-    for (const FaultOp op : accepted) {
-        names.push_back(faultOpName(op));
-        if (names.back() != name) continue;
-        out = op;
-        return std::nullopt;
-    }
-    const std::string given =
-            value.contains("op") ? fmt::format("\"{}\" unknown", name) : std::string("missing");
-    return Error{fmt::format("{}.op: {}; accepted: {}", where, given, joinNames(names))};
-}
-
-Failure readFaultNode(const Json& value, const std::string& where, const Profile& profile,
-                      FaultSpec& fault) {
-    if (!value.contains("node")) {
-        return Error{fmt::format("{}.node: missing; accepted: a node's path, or motor", where)};
-    }
-    if (auto failure = readText(value, where, "node", fault.node)) return failure;
-    if (fault.node == kMotorNode) {
-        if (!profile.motor) {
-            return Error{fmt::format("{}.node: the profile has no motor", where)};
-        }
-        return readOp(value, where, kMotorOps, fault.op);
-    }
-    if (profile.findNode(fault.node) == nullptr) {
-        return Error{fmt::format("{}.node: the profile has no node \"{}\"", where, fault.node)};
-    }
-    return readOp(value, where, kNodeOps, fault.op);
-}
-
-Failure readFaultAction(const Json& value, const std::string& where, FaultSpec& fault) {
-    FaultAction& action = fault.action;
-    std::string error;
-    if (auto failure = readText(value, where, "errno", error)) return failure;
-    if (value.contains("errno")) {
-        const std::optional<int> number = errorNumber(error);
-        if (!number) {
-            return Error{
-                    fmt::format("{}.errno: \"{}\" unknown; accepted: an error's name, such "
-                                "as EIO, EINTR, EACCES",
-                                where, error)};
-        }
-        action.error = *number;
-    }
-    uint64_t count = 0;
-    if (auto failure = readNumber(value, where, "short", 0, INT_MAX, count)) return failure;
-    if (value.contains("short")) {
-        if (fault.op != FaultOp::kRead && fault.op != FaultOp::kWrite) {
-            return Error{fmt::format("{}.short: only a read or write can be short", where)};
-        }
-        if (action.error != 0) {
-            return Error{fmt::format("{}: errno and short exclude each other", where)};
-        }
-        action.shortCount = count;
-    }
-    uint64_t delay = 0;
-    if (auto failure = readNumber(value, where, "delay", 0, kLongestDelay, delay)) return failure;
-    action.delay = std::chrono::milliseconds(delay);
-    if (auto failure = readTruth(value, where, "unplug", action.unplug)) return failure;
-    if (action.error == 0 && !action.shortCount && delay == 0 && !action.unplug) {
-        return Error{fmt::format("{}: nothing goes wrong; give one of errno, short, delay, unplug",
-                                 where)};
-    }
-    return std::nullopt;
-}
-
-Failure readFault(const Json& value, const std::string& where, const Profile& profile,
-                  FaultSpec& fault) {
-    if (auto failure = checkObject(
-                value, where,
-                {"node", "op", "errno", "short", "delay", "unplug", "after", "times"})) {
-        return failure;
-    }
-    if (auto failure = readFaultNode(value, where, profile, fault)) return failure;
-    if (auto failure = readFaultAction(value, where, fault)) return failure;
-    if (auto failure = readNumber(value, where, "after", 0, UINT32_MAX, fault.after)) {
-        return failure;
-    }
-    return readNumber(value, where, "times", 0, UINT32_MAX, fault.times);
-}
-
-Failure readFaults(const Json& value, Profile& profile) {
-    if (value.is_null()) return std::nullopt;
-    if (!value.is_array()) {
-        return Error{fmt::format("faults: an array expected, not {}", kindOf(value))};
-    }
+Result<void> readFaults(const Json& value, Profile& profile) {
+    if (!value.is_array())
+        return Error() << fmt::format("faults: an array expected, not {}", kindOf(value));
     for (const Json& entry : value) {
-        FaultSpec fault;
+        Fault fault;
         const std::string where = fmt::format("faults[{}]", profile.faults.size());
-        if (auto failure = readFault(entry, where, profile, fault)) return failure;
+        if (auto done = readFault(entry, where, profile, fault); !done) return done;
         profile.faults.push_back(std::move(fault));
     }
-    return std::nullopt;
+    return {};
 }
 
-/// Reads a table of paths entry by entry; null stands for an empty one.
-template <typename ReadEntry>
-Failure readTable(const Json& value, const char* name, Profile& profile, ReadEntry readEntry) {
-    if (value.is_null()) return std::nullopt;
-    if (!value.is_object()) {
-        return Error{fmt::format("{}: an object expected, not {}", name, kindOf(value))};
-    }
-    for (const auto& [path, entry] : value.items()) {
-        if (auto failure = readEntry(path, entry, profile)) return failure;
-    }
-    return std::nullopt;
-}
+struct Part {
+    std::string_view key;
+    Result<void> (*read)(const Json& value, Profile& profile);
+};
 
-Failure readWhole(const Json& document, Profile& profile) {
-    if (auto failure = checkObject(
-                document, "",
-                {"description", "nodes", "files", "motor", "input_devices", "faults"})) {
-        return failure;
-    }
-    const auto field = [&](const char* key) { return document.value(key, Json()); };
-    if (auto failure = readText(document, "", "description", profile.description)) return failure;
-    if (auto failure = readTable(field("nodes"), "nodes", profile, readNode)) return failure;
-    if (auto failure = readTable(field("files"), "files", profile, readFile)) return failure;
-    if (auto failure = checkNested(profile.nodes, "nodes")) return failure;
-    if (auto failure = checkNested(profile.files, "files")) return failure;
-    // The motor before what refers to it.
-    if (auto failure = readMotor(field("motor"), profile)) return failure;
-    if (auto failure = readInputDevices(field("input_devices"), profile)) return failure;
-    return readFaults(field("faults"), profile);
-}
+// The motor stands before what refers to it. Null stands for absent.
+constexpr Part kParts[] = {
+        {"description", readDescription},
+        {"nodes", readNodes},
+        {"files", readFiles},
+        {"motor", readMotor},
+        {"input_devices", readInputDevices},
+        {"faults", readFaults},
+};
 
-Result<std::string> readLimited(const std::string& path) {
-    const UniqueFd file(open(path.c_str(), O_RDONLY | O_CLOEXEC));
-    if (!file) return Error{strerror(errno)};
-    std::string text;
-    std::array<char, 16384> part;
-    while (true) {
-        const ssize_t size = read(file.get(), part.data(), part.size());
-        if (size < 0 && errno == EINTR) continue;
-        if (size < 0) return Error{strerror(errno)};
-        if (size == 0) return text;
-        text.append(part.data(), static_cast<size_t>(size));
-        if (text.size() > kLargestProfile) return Error{"larger than 1 MiB"};
-    }
+template <typename Object>
+void addKeys(std::string_view name, const std::vector<Field<Object>>& table,
+             std::vector<KnownKey>& keys) {
+    for (const Field<Object>& field : table) keys.push_back({name, field.key, &field.accepted});
 }
 
 }  // namespace
@@ -316,25 +293,46 @@ Result<std::string> readLimited(const std::string& path) {
 Result<Profile> parseProfile(std::string_view text) {
     Result<Json> document = parseJson(text);
     if (!document) return document.error();
+    std::vector<std::string_view> keys;
+    for (const Part& part : kParts) keys.push_back(part.key);
+    if (auto done = checkKeys(*document, "", keys); !done) return done.error();
     Profile profile;
-    if (auto failure = readWhole(*document, profile)) return *failure;
+    for (const Part& part : kParts) {
+        const auto value = document->find(part.key);
+        if (value == document->end() || value->is_null()) continue;
+        if (auto done = part.read(*value, profile); !done) return done.error();
+    }
     return profile;
 }
 
 Result<Profile> readProfile(const std::string& path) {
-    const Result<std::string> text = readLimited(path);
-    if (!text) return Error{fmt::format("{}: {}", path, text.error().text)};
-    Result<Profile> profile = parseProfile(*text);
-    if (!profile) return Error{fmt::format("{}: {}", path, profile.error().text)};
+    std::ifstream file(path, std::ios::binary);
+    std::string text(kLargestProfile + 1, '\0');
+    file.read(text.data(), static_cast<std::streamsize>(text.size()));
+    if (!file.is_open() || file.bad()) return ErrnoError() << path;
+    text.resize(static_cast<size_t>(file.gcount()));
+    if (text.size() > kLargestProfile) return Error() << fmt::format("{}: larger than 1 MiB", path);
+    Result<Profile> profile = parseProfile(text);
+    if (!profile) return Error() << fmt::format("{}: {}", path, profile.error().message());
     return profile;
 }
 
-Result<FaultSpec> parseFault(std::string_view text, const Profile& profile) {
+Result<Fault> parseFault(std::string_view text, const Profile& profile) {
     Result<Json> document = parseJson(text);
     if (!document) return document.error();
-    FaultSpec fault;
-    if (auto failure = readFault(*document, "fault", profile, fault)) return *failure;
+    Fault fault;
+    if (auto done = readFault(*document, "fault", profile, fault); !done) return done.error();
     return fault;
+}
+
+std::vector<KnownKey> knownKeys() {
+    std::vector<KnownKey> keys;
+    for (const Part& part : kParts) keys.push_back({"profile", part.key});
+    addKeys("node", kNodeFields, keys);
+    addKeys("file", kFileFields, keys);
+    addKeys("motor", kMotorFields, keys);
+    addKeys("fault", kFaultFields, keys);
+    return keys;
 }
 
 }  // namespace handset

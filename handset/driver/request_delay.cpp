@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Keeping a caller waiting.
-#include "driver/request_delay.h"
+#include "handset/driver/request_delay.h"
 
 #include <algorithm>
 #include <condition_variable>

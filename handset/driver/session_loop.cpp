@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The threads that serve one FUSE or CUSE session.
-#include "driver/session_loop.h"
+#include "handset/driver/session_loop.h"
 
 #include <linux/fuse.h>
 #include <poll.h>
@@ -35,19 +36,19 @@ void signalEvent(int event) {
 }  // namespace
 
 SessionLoop::SessionLoop(fuse_session* session, int device, int ended)
-    : session_(session), device_(device), ended_(ended), stop_(eventfd(0, EFD_CLOEXEC)) {
+    : mSession(session), mDevice(device), mEnded(ended), mStop(eventfd(0, EFD_CLOEXEC)) {
     addWorker();
 }
 
 SessionLoop::~SessionLoop() {
-    finished_ = true;
-    fuse_session_exit(session_);
-    signalEvent(stop_.get());
+    mFinished = true;
+    fuse_session_exit(mSession);
+    signalEvent(mStop.get());
     while (true) {
         std::vector<std::thread> workers;
         {
-            const std::lock_guard lock(workersMutex_);
-            workers.swap(workers_);
+            const std::lock_guard lock(mWorkersMutex);
+            workers.swap(mWorkers);
         }
         if (workers.empty()) return;
         for (std::thread& worker : workers) worker.join();
@@ -55,51 +56,51 @@ SessionLoop::~SessionLoop() {
 }
 
 void SessionLoop::addWorker() {
-    const std::lock_guard lock(workersMutex_);
-    if (workers_.size() == kMostWorkers) return;
-    ++idle_;
-    workers_.emplace_back([this] { work(); });
+    const std::lock_guard lock(mWorkersMutex);
+    if (mWorkers.size() == kMostWorkers) return;
+    ++mIdle;
+    mWorkers.emplace_back([this] { work(); });
 }
 
 void SessionLoop::work() {
     fuse_buf buffer{};
     while (takeRequest(buffer)) {
-        fuse_session_process_buf(session_, &buffer);
-        ++idle_;
+        fuse_session_process_buf(mSession, &buffer);
+        ++mIdle;
     }
     free(buffer.mem);
 }
 
 // Takes the next request that may be served beside others. False when the session is over.
 bool SessionLoop::takeRequest(fuse_buf& buffer) {
-    const std::lock_guard lock(taking_);
+    const std::lock_guard lock(mTaking);
     while (waitForRequest()) {
-        releasing_ = true;  // before the request leaves the kernel's queue; see isSettled
-        const int size = fuse_session_receive_buf(session_, &buffer);
+        mReleasing = true;  // before the request leaves the kernel's queue; see isSettled
+        const int size = fuse_session_receive_buf(mSession, &buffer);
         const bool release = size > 0 && isRelease(buffer);
-        if (release) fuse_session_process_buf(session_, &buffer);
-        releasing_ = false;
+        if (release) fuse_session_process_buf(mSession, &buffer);
+        mReleasing = false;
         if (size == -EAGAIN || size == -EINTR) continue;
         if (size <= 0) break;
         if (release) continue;
-        if (--idle_ == 0) addWorker();
+        if (--mIdle == 0) addWorker();
         return true;
     }
-    if (!finished_.exchange(true)) signalEvent(ended_);
+    if (!mFinished.exchange(true)) signalEvent(mEnded);
     return false;
 }
 
 bool SessionLoop::waitForRequest() const {
-    pollfd polled[] = {{device_, POLLIN, 0}, {stop_.get(), POLLIN, 0}};
+    pollfd polled[] = {{mDevice, POLLIN, 0}, {mStop.get(), POLLIN, 0}};
     while (poll(polled, std::size(polled), -1) < 0) {
         if (errno != EINTR) return false;
     }
-    return polled[1].revents == 0 && !fuse_session_exited(session_);
+    return polled[1].revents == 0 && !fuse_session_exited(mSession);
 }
 
-void SessionLoop::settle(std::chrono::milliseconds patience) const {
-    const auto end = std::chrono::steady_clock::now() + patience;
-    while (!finished_ && !isSettled() && std::chrono::steady_clock::now() < end) {
+void SessionLoop::settle(std::chrono::milliseconds timeout) const {
+    const auto end = std::chrono::steady_clock::now() + timeout;
+    while (!mFinished && !isSettled() && std::chrono::steady_clock::now() < end) {
         std::this_thread::sleep_for(kSettlePause);
     }
 }
@@ -107,8 +108,8 @@ void SessionLoop::settle(std::chrono::milliseconds patience) const {
 // A release is in the kernel's queue, or being served, or done: the queue is looked at first, as
 // what has left it unserved has set the mark before it left.
 bool SessionLoop::isSettled() const {
-    pollfd queue{device_, POLLIN, 0};
-    return poll(&queue, 1, 0) == 0 && !releasing_;
+    pollfd queue{mDevice, POLLIN, 0};
+    return poll(&queue, 1, 0) == 0 && !mReleasing;
 }
 
 }  // namespace handset

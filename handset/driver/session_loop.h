@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The threads that serve one FUSE or CUSE session.
 //
 // The library's own loop lets any thread take any request, and the kernel does not wait for the
@@ -6,35 +7,34 @@
 // takes one request at a time from the kernel and serves a release before it takes the next.
 #pragma once
 
-#include <fuse_lowlevel.h>
-
 #include <atomic>
 #include <chrono>
 #include <mutex>
 #include <thread>
 #include <vector>
 
-#include "common/unique_fd.h"
+#include <android-base/unique_fd.h>
+#include <fuse_lowlevel.h>
 
 namespace handset {
 
-/// Serves a session until it is stopped or its mount is gone.
+// Serves a session until it is stopped or its mount is gone.
 class SessionLoop {
   public:
-    /// Starts serving. `session` is attached to `device` (non-blocking) and outlives the loop.
-    /// `ended` is an event descriptor that becomes readable when the loop ends by itself.
+    // Starts serving. `session` is attached to `device` (non-blocking) and outlives the loop.
+    // `ended` is an event descriptor that becomes readable when the loop ends by itself.
     SessionLoop(fuse_session* session, int device, int ended);
 
     SessionLoop(const SessionLoop&) = delete;
     SessionLoop& operator=(const SessionLoop&) = delete;
 
-    /// Stops serving and waits for the threads; what they are busy with is finished first.
+    // Stops serving and waits for the threads; what they are busy with is finished first.
     ~SessionLoop();
 
-    /// Waits until the files closed so far have been released: a close may return before the
-    /// driver is told of it. Gives up when the loop has ended, and after `patience`, as callers
-    /// that are kept waiting may have brought the serving to a halt.
-    void settle(std::chrono::milliseconds patience) const;
+    // Waits until the files closed so far have been released: a close may return before the
+    // driver is told of it. Gives up when the loop has ended, and after `timeout`, as callers
+    // that are kept waiting may have brought the serving to a halt.
+    void settle(std::chrono::milliseconds timeout) const;
 
   private:
     void addWorker();
@@ -43,18 +43,18 @@ class SessionLoop {
     bool waitForRequest() const;
     bool isSettled() const;
 
-    fuse_session* session_;
-    int device_;
-    int ended_;
-    UniqueFd stop_;
+    fuse_session* mSession;
+    int mDevice;
+    int mEnded;
+    android::base::unique_fd mStop;
 
-    std::mutex taking_;  ///< held by the one thread that talks to the kernel
-    std::atomic<bool> releasing_{false};
-    std::atomic<int> idle_{0};
-    std::atomic<bool> finished_{false};
+    std::mutex mTaking;  // held by the one thread that talks to the kernel
+    std::atomic<bool> mReleasing{false};
+    std::atomic<int> mIdle{0};
+    std::atomic<bool> mFinished{false};
 
-    std::mutex workersMutex_;
-    std::vector<std::thread> workers_;
+    std::mutex mWorkersMutex;
+    std::vector<std::thread> mWorkers;
 };
 
 }  // namespace handset

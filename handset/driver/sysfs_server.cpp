@@ -1,10 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The driver's nodes as files: the request handlers and the mount.
-#include "driver/sysfs_server.h"
+#include "handset/driver/sysfs_server.h"
 
 #include <fcntl.h>
-#include <fmt/format.h>
-#include <fuse_lowlevel.h>
 #include <sys/mount.h>
 #include <sys/stat.h>
 
@@ -18,14 +17,25 @@
 #include <utility>
 #include <vector>
 
-#include "driver/caller.h"
-#include "driver/handle_table.h"
-#include "driver/open_flags.h"
-#include "driver/request_delay.h"
-#include "driver/showing.h"
+#include <android-base/thread_annotations.h>
+#include <android-base/unique_fd.h>
+#include <fmt/format.h>
+#include <fuse_lowlevel.h>
+
+#include "handset/driver/caller.h"
+#include "handset/driver/handle_table.h"
+#include "handset/driver/open_flags.h"
+#include "handset/driver/printable.h"
+#include "handset/driver/read_session.h"
+#include "handset/driver/request_delay.h"
 
 namespace handset {
 namespace {
+
+using android::base::ErrnoError;
+using android::base::Error;
+using android::base::Result;
+using android::base::unique_fd;
 
 // Names and attributes change only through this driver, so the kernel may keep them.
 constexpr double kForever = 86400.0;
@@ -33,24 +43,31 @@ constexpr double kForever = 86400.0;
 // What sysfs reports for every attribute, whatever its text.
 constexpr off_t kNodeSize = 4096;
 
-constexpr mode_t kFolderMode = 0755;
+constexpr mode_t kDirectoryMode = 0755;
 
-constexpr std::chrono::seconds kSettlePatience{1};
+constexpr std::chrono::seconds kSettleTimeout{1};
 
 struct OpenNode {
-    OpenNode(Node& opened, Opener by) : node(opened), opener(by) {}
+    OpenNode(Node& opened, Opener by, uint64_t unplugsBefore)
+        : node(opened), opener(by), unplugs(unplugsBefore) {}
 
     Node& node;
     const Opener opener;
+    const uint64_t unplugs;
     std::mutex mutex;
-    Showing showing;
+    ReadSession session GUARDED_BY(mutex);
+
+    bool continuesAt(size_t offset) {
+        const std::lock_guard lock(mutex);
+        return session.continuesAt(offset);
+    }
 };
 
 }  // namespace
 
 struct SysfsServer::State {
     const NodeTree& tree;
-    FaultBook& faults;
+    FaultInjector& faults;
     Journal& journal;
     std::atomic<bool> stopping{false};
     HandleTable<OpenNode> files{};
@@ -84,8 +101,8 @@ bool callerIsGranted(fuse_req_t request, const Node& node, unsigned wanted) {
     return grants(attributes, credentialsOf(request), wanted);
 }
 
-/// As sysfs has it, even root needs at least one permission bit for what it wants. The bits are all
-/// that counts: without the method a read or write fails later.
+// As sysfs has it, even root needs at least one permission bit for what it wants. The bits are all
+// that counts: without the method a read or write fails later.
 bool isOpenable(const Node& node, unsigned wanted) {
     const mode_t mode = node.attributes().mode;
     return ((wanted & kMayRead) == 0 || (mode & 0444) != 0) &&
@@ -97,7 +114,7 @@ struct stat statOf(const State& state, const TreeEntry& entry) {
     attributes.st_ino = entry.inode;
     attributes.st_atime = attributes.st_mtime = attributes.st_ctime = state.started;
     if (!entry.node) {
-        attributes.st_mode = S_IFDIR | kFolderMode;
+        attributes.st_mode = S_IFDIR | kDirectoryMode;
         attributes.st_nlink = 2;
         return attributes;
     }
@@ -141,7 +158,7 @@ void onGetattr(fuse_req_t request, fuse_ino_t inode, fuse_file_info*) {
     fuse_reply_attr(request, &attributes, kForever);
 }
 
-/// The error a change of attributes meets, or 0. A new size changes nothing and is let pass.
+// The error a change of attributes meets, or 0. A new size changes nothing and is let pass.
 int setattrError(fuse_req_t request, const Node& node, int toSet, bool open) {
     const uid_t uid = fuse_req_ctx(request)->uid;
     if ((toSet & (FUSE_SET_ATTR_UID | FUSE_SET_ATTR_GID)) != 0 && uid != 0) return EPERM;
@@ -184,14 +201,14 @@ void onAccess(fuse_req_t request, fuse_ino_t inode, int mask) {
 }
 
 void onReaddir(fuse_req_t request, fuse_ino_t inode, size_t size, off_t offset, fuse_file_info*) {
-    const TreeEntry* folder = stateOf(request).tree.find(inode);
-    if (folder == nullptr) {
+    const TreeEntry* directory = stateOf(request).tree.find(inode);
+    if (directory == nullptr) {
         fuse_reply_err(request, ENOENT);
         return;
     }
-    std::vector<std::pair<std::string_view, uint64_t>> names{{".", folder->inode},
-                                                             {"..", folder->parent}};
-    names.insert(names.end(), folder->children.begin(), folder->children.end());
+    std::vector<std::pair<std::string_view, uint64_t>> names{{".", directory->inode},
+                                                             {"..", directory->parent}};
+    names.insert(names.end(), directory->children.begin(), directory->children.end());
     std::vector<char> listing(size);
     size_t used = 0;
     for (size_t i = static_cast<size_t>(offset); i < names.size(); ++i) {
@@ -206,11 +223,16 @@ void onReaddir(fuse_req_t request, fuse_ino_t inode, size_t size, off_t offset, 
     fuse_reply_buf(request, listing.data(), used);
 }
 
-void recordOpen(State& state, const Caller& caller, const std::string& path, int flags, int error) {
-    state.journal.record(caller, JournalLine("open")
-                                         .text("node", path)
-                                         .text("flags", openFlagsText(flags))
-                                         .result("error", -error));
+JournalFields openLine(const std::string& path, int flags, int error) {
+    return {{"op", "open"},
+            {"node", path},
+            {"flags", openFlagsText(flags)},
+            {"error", resultOf(-error)}};
+}
+
+// Meets the fault that is due: its error, or EINTR where its delay was cut short, or 0.
+int meetFault(fuse_req_t request, const State& state, const FaultAction& fault) {
+    return delayRequest(request, fault.delay, state.stopping) ? fault.error : EINTR;
 }
 
 void onOpen(fuse_req_t request, fuse_ino_t inode, fuse_file_info* info) {
@@ -222,20 +244,22 @@ void onOpen(fuse_req_t request, fuse_ino_t inode, fuse_file_info* info) {
     }
     Node& node = *entry->node;
     const Opener opener(request);
-    int error = 0;
-    if (!isOpenable(node, wantedBy(info->flags)) ||
-        !callerIsGranted(request, node, neededBy(info->flags))) {
-        error = EACCES;
-    } else {
-        const FaultAction fault = state.faults.next(node.path(), FaultOp::kOpen);
-        error = delayRequest(request, fault.delay, state.stopping) ? fault.error : EINTR;
+    const auto arrival = std::chrono::steady_clock::now();
+    FaultAction fault;
+    int error = EACCES;
+    const uint64_t unplugs = state.faults.unplugsOf(node.path());
+    if (isOpenable(node, wantedBy(info->flags)) &&
+        callerIsGranted(request, node, neededBy(info->flags))) {
+        fault = state.faults.next(node.path(), FaultOp::kOpen);
+        error = meetFault(request, state, fault);
     }
-    recordOpen(state, opener.caller(), node.path(), info->flags, error);
+    state.journal.record(opener.caller(), openLine(node.path(), info->flags, error),
+                         {fault, arrival});
     if (error != 0) {
         fuse_reply_err(request, error);
         return;
     }
-    info->fh = state.files.add(std::make_unique<OpenNode>(node, opener));
+    info->fh = state.files.add(std::make_unique<OpenNode>(node, opener, unplugs));
     info->direct_io = 1;
     // A caller killed while it waited never releases what it did not get.
     if (fuse_reply_open(request, info) == -ENOENT) state.files.remove(info->fh);
@@ -244,23 +268,26 @@ void onOpen(fuse_req_t request, fuse_ino_t inode, fuse_file_info* info) {
 void onRead(fuse_req_t request, fuse_ino_t, size_t size, off_t offset, fuse_file_info* info) {
     State& state = stateOf(request);
     OpenNode& file = state.files.get(info->fh);
-    const FaultAction fault = state.faults.next(file.node.path(), FaultOp::kRead);
-    int error = delayRequest(request, fault.delay, state.stopping) ? fault.error : EINTR;
+    const auto arrival = std::chrono::steady_clock::now();
+    const auto at = static_cast<size_t>(offset);
+    const FaultAction fault = state.faults.nextOf(file.node.path(), FaultOp::kRead, file.unplugs,
+                                                  file.continuesAt(at));
+    int error = meetFault(request, state, fault);
     if (!file.node.isReadable()) error = EIO;
 
     std::string part;
     if (error == 0) {
         const std::lock_guard lock(file.mutex);
-        part = file.showing.read(static_cast<size_t>(offset),
-                                 std::min(size, fault.shortCount.value_or(size)),
-                                 [&] { return file.node.text(); });
+        part = file.session.read(at, std::min(size, fault.shortCount.value_or(size)),
+                                 [&] { return fault.text ? *fault.text : file.node.text(); });
     }
     state.journal.record(
             file.opener.callerOf(request),
-            JournalLine("read")
-                    .text("node", file.node.path())
-                    .number("size", static_cast<int64_t>(size))
-                    .result("result", error != 0 ? -error : static_cast<int64_t>(part.size())));
+            {{"op", "read"},
+             {"node", file.node.path()},
+             {"size", size},
+             {"result", resultOf(error != 0 ? -error : static_cast<int64_t>(part.size()))}},
+            {fault, arrival});
     if (error != 0) {
         fuse_reply_err(request, error);
     } else {
@@ -272,19 +299,18 @@ void onWrite(fuse_req_t request, fuse_ino_t, const char* data, size_t size, off_
              fuse_file_info* info) {
     State& state = stateOf(request);
     OpenNode& file = state.files.get(info->fh);
-    const FaultAction fault = state.faults.next(file.node.path(), FaultOp::kWrite);
-    int error = delayRequest(request, fault.delay, state.stopping) ? fault.error : EINTR;
+    const auto arrival = std::chrono::steady_clock::now();
+    const FaultAction fault = state.faults.nextOf(file.node.path(), FaultOp::kWrite, file.unplugs);
+    int error = meetFault(request, state, fault);
     if (!file.node.isWritable()) error = EIO;
     const std::string_view bytes(data, size);
     const std::string_view taken = bytes.substr(0, fault.shortCount.value_or(size));
 
     if (error == 0) file.node.store(taken);
-    state.journal.record(
-            file.opener.callerOf(request),
-            JournalLine("write")
-                    .text("node", file.node.path())
-                    .bytes("data", "hex", bytes)
-                    .result("result", error != 0 ? -error : static_cast<int64_t>(taken.size())));
+    JournalFields line{{"op", "write"}, {"node", file.node.path()}};
+    putBytes(line, "data", "hex", bytes);
+    line["result"] = resultOf(error != 0 ? -error : static_cast<int64_t>(taken.size()));
+    state.journal.record(file.opener.callerOf(request), std::move(line), {fault, arrival});
     if (error != 0) {
         fuse_reply_err(request, error);
     } else {
@@ -295,29 +321,28 @@ void onWrite(fuse_req_t request, fuse_ino_t, const char* data, size_t size, off_
 void onRelease(fuse_req_t request, fuse_ino_t, fuse_file_info* info) {
     State& state = stateOf(request);
     if (const std::unique_ptr<OpenNode> file = state.files.remove(info->fh)) {
-        state.journal.record(file->opener.caller(),
-                             JournalLine("close").text("node", file->node.path()));
+        state.journal.record(file->opener.caller(), {{"op", "close"}, {"node", file->node.path()}});
     }
     fuse_reply_err(request, 0);
 }
 
-/// An open with O_CREAT of a name that does not exist.
+// An open with O_CREAT of a name that does not exist.
 void onCreate(fuse_req_t request, fuse_ino_t parent, const char* name, mode_t,
               fuse_file_info* info) {
     State& state = stateOf(request);
-    recordOpen(state, Opener(request).caller(), state.tree.pathOf(parent, name),
-               info->flags | O_CREAT, EACCES);
+    state.journal.record(Opener(request).caller(),
+                         openLine(state.tree.pathOf(parent, name), info->flags | O_CREAT, EACCES));
     fuse_reply_err(request, EACCES);
 }
 
-/// A plain file is created rather than made, and there is no way to create one.
+// A plain file is created rather than made, and there is no way to create one.
 void onMknod(fuse_req_t request, fuse_ino_t, const char*, mode_t mode, dev_t) {
     const bool mayTry = S_ISREG(mode) || fuse_req_ctx(request)->uid != 0;
     fuse_reply_err(request, mayTry ? EACCES : EPERM);
 }
 
-/// The kernel lets nobody link to what they neither own nor may read and write
-/// (fs.protected_hardlinks), and asks that before it looks at the folder.
+// The kernel lets nobody link to what they neither own nor may read and write
+// (fs.protected_hardlinks), and asks that before it looks at the directory.
 void onLink(fuse_req_t request, fuse_ino_t inode, fuse_ino_t, const char*) {
     const TreeEntry* entry = stateOf(request).tree.find(inode);
     const uid_t uid = fuse_req_ctx(request)->uid;
@@ -327,7 +352,7 @@ void onLink(fuse_req_t request, fuse_ino_t inode, fuse_ino_t, const char*) {
     fuse_reply_err(request, uid != 0 && mayLink ? EACCES : EPERM);
 }
 
-/// Folders and nodes come and go with the device, not by a user's hand.
+// Folders and nodes come and go with the device, not by a user's hand.
 void refuseChange(fuse_req_t request) {
     fuse_reply_err(request, fuse_req_ctx(request)->uid == 0 ? EPERM : EACCES);
 }
@@ -355,51 +380,47 @@ fuse_lowlevel_ops operations() {
     return ops;
 }
 
-Error systemError(std::string_view what) {
-    return Error{fmt::format("{}: {}", what, strerror(errno))};
-}
-
 }  // namespace
 
-Result<std::unique_ptr<SysfsServer>> SysfsServer::start(const NodeTree& tree, FaultBook& faults,
+Result<std::unique_ptr<SysfsServer>> SysfsServer::start(const NodeTree& tree, FaultInjector& faults,
                                                         Journal& journal, int ended) {
-    UniqueFd device(open("/dev/fuse", O_RDWR | O_CLOEXEC | O_NONBLOCK));
-    if (!device) return systemError("/dev/fuse");
+    unique_fd device(open("/dev/fuse", O_RDWR | O_CLOEXEC | O_NONBLOCK));
+    if (!device.ok()) return ErrnoError() << "/dev/fuse";
 
     std::unique_ptr<SysfsServer> server(new SysfsServer);
-    server->state_ = std::unique_ptr<State>(new State{tree, faults, journal});
+    server->mState = std::unique_ptr<State>(new State{tree, faults, journal});
     char name[] = "handset-driver";
     char* arguments[] = {name, nullptr};
     fuse_args args = FUSE_ARGS_INIT(1, arguments);
     const fuse_lowlevel_ops ops = operations();
-    server->session_ = fuse_session_new(&args, &ops, sizeof ops, server->state_.get());
+    server->mSession = fuse_session_new(&args, &ops, sizeof ops, server->mState.get());
     fuse_opt_free_args(&args);
-    if (server->session_ == nullptr) return Error{"no FUSE session"};
+    if (server->mSession == nullptr) return Error() << "no FUSE session";
 
     const std::string root(kSysfsRoot);
     const std::string options =
             fmt::format("fd={},rootmode=40000,user_id=0,group_id=0,allow_other", device.get());
     if (mount("handset", root.c_str(), "fuse", MS_NOSUID | MS_NODEV | MS_NOEXEC, options.c_str()) !=
         0) {
-        return systemError("mount on " + root);
+        return ErrnoError() << "mount on " + root;
     }
-    server->mounted_ = true;
+    server->mMounted = true;
     const int fd = device.release();  // the session closes it
-    fuse_session_mount(server->session_, fmt::format("/dev/fd/{}", fd).c_str());
-    server->loop_ = std::make_unique<SessionLoop>(server->session_, fd, ended);
+    fuse_session_mount(server->mSession, fmt::format("/dev/fd/{}", fd).c_str());
+    server->mLoop = std::make_unique<SessionLoop>(server->mSession, fd, ended);
     return server;
 }
 
 void SysfsServer::settle() const {
-    loop_->settle(kSettlePatience);
+    mLoop->settle(kSettleTimeout);
 }
 
 SysfsServer::~SysfsServer() {
-    if (loop_) settle();
-    if (state_) state_->stopping = true;
-    if (mounted_) umount2(std::string(kSysfsRoot).c_str(), MNT_DETACH);
-    loop_.reset();
-    if (session_ != nullptr) fuse_session_destroy(session_);
+    if (mLoop) settle();
+    if (mState) mState->stopping = true;
+    if (mMounted) umount2(std::string(kSysfsRoot).c_str(), MNT_DETACH);
+    mLoop.reset();
+    if (mSession != nullptr) fuse_session_destroy(mSession);
 }
 
 }  // namespace handset

@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // handset-agent: process 1 of the guest. Sets up the file systems, then runs the commands that the
 // launcher sends over the virtio-serial port, one at a time, and reaps every orphan. When the
 // launcher goes away, or asks for it, the guest powers off.
@@ -15,37 +16,43 @@
 #include <array>
 #include <cerrno>
 #include <cstdio>
+#include <cstdlib>
+#include <exception>
 #include <string>
+#include <string_view>
 
-#include "command.h"
-#include "common/unique_fd.h"
-#include "file_systems.h"
-#include "frames.h"
+#include <android-base/unique_fd.h>
+
+#include "handset/guest/command.h"
+#include "handset/guest/file_systems.h"
+#include "handset/guest/frames.h"
 
 namespace handset {
 namespace {
 
-constexpr const char* kPort = "/dev/vport0p1";
+using android::base::unique_fd;
 
-/// Opens the port once the kernel has made it and the launcher's end is connected, both of which
-/// happen in the background; gives up after ten seconds.
-UniqueFd openPort() {
-    constexpr int kAttempts = 2000;
-    for (int attempt = 0; attempt < kAttempts; ++attempt) {
-        UniqueFd port(open(kPort, O_RDWR | O_CLOEXEC));
+constexpr const char* kPort = "/dev/vport0p1";
+constexpr const char* kJoinPort = "/dev/vport0p2";
+
+// Opens a port once the kernel has made it and the other end is connected, both of which happen in
+// the background; gives up after ten seconds of attempts every `pauseUs` microseconds.
+unique_fd openPort(const char* path, unsigned pauseUs) {
+    for (unsigned attempt = 0; attempt < 10'000'000 / pauseUs; ++attempt) {
+        unique_fd port(open(path, O_RDWR | O_CLOEXEC));
         pollfd state{.fd = port.get(), .events = POLLOUT, .revents = 0};
-        if (port && poll(&state, 1, 0) == 1 && (state.revents & POLLHUP) == 0) return port;
-        usleep(5000);
+        if (port.ok() && poll(&state, 1, 0) == 1 && (state.revents & POLLHUP) == 0) return port;
+        usleep(pauseUs);
     }
-    return UniqueFd();
+    return unique_fd();
 }
 
-/// Serves one launcher.
+// Serves one launcher.
 class Agent {
   public:
     Agent(int port, int childSignals) : mPort(port), mChildSignals(childSignals), mChannel(port) {}
 
-    /// Returns when the launcher has gone or wants the guest to end.
+    // Returns when the launcher has gone or wants the guest to end.
     void serve();
 
   private:
@@ -54,8 +61,8 @@ class Agent {
     bool start();
     bool setTerminal(TerminalSize size);
     bool writeInput();
-    bool forward(UniqueFd& source, Reply kind);
-    bool drain(UniqueFd& source, Reply kind);
+    bool forward(unique_fd& source, Reply kind);
+    bool drain(unique_fd& source, Reply kind);
     bool reapChildren();
     bool finishCommand(int status);
     bool sendKernelLog();
@@ -91,7 +98,7 @@ void Agent::serve() {
     }
 }
 
-/// False when the session is over.
+// False when the session is over.
 bool Agent::handleRequests() {
     if (!mChannel.receive()) return false;
     while (const std::optional<Frame> frame = mChannel.next()) {
@@ -145,8 +152,8 @@ bool Agent::setTerminal(TerminalSize size) {
     return true;
 }
 
-/// Writes what the command's standard input takes now. A command that does not read any more
-/// swallows the rest.
+// Writes what the command's standard input takes now. A command that does not read any more
+// swallows the rest.
 bool Agent::writeInput() {
     std::size_t consumed = mPendingInput.size();
     if (!mPendingInput.empty()) {
@@ -164,8 +171,8 @@ bool Agent::writeInput() {
     return consumed == 0 || mChannel.send(Reply::Consumed, static_cast<std::uint32_t>(consumed));
 }
 
-/// Sends what `source` has to the launcher; closes it at its end.
-bool Agent::forward(UniqueFd& source, Reply kind) {
+// Sends what `source` has to the launcher; closes it at its end.
+bool Agent::forward(unique_fd& source, Reply kind) {
     std::array<char, 32UL * 1024> chunk;
     const ssize_t got = read(source.get(), chunk.data(), chunk.size());
     if (got < 0 && (errno == EAGAIN || errno == EINTR)) return true;
@@ -187,15 +194,15 @@ bool Agent::reapChildren() {
     return true;
 }
 
-/// Sends what an ended command has left in `source`. What runs on in the background may hold the
-/// other end open and go on writing: nobody waits for it, and no more than the largest pipe holds
-/// is taken. A terminal delivers its last bytes a moment late.
-bool Agent::drain(UniqueFd& source, Reply kind) {
+// Sends what an ended command has left in `source`. What runs on in the background may hold the
+// other end open and go on writing: nobody waits for it, and no more than the largest pipe holds
+// is taken. A terminal delivers its last bytes a moment late.
+bool Agent::drain(unique_fd& source, Reply kind) {
     constexpr int kLargestPipeInChunks = 64;
-    const int patienceMs = mCommand.errors ? 0 : 20;
+    const int timeoutMs = mCommand.errors.ok() ? 0 : 20;
     pollfd wait{.fd = source.get(), .events = POLLIN, .revents = 0};
-    for (int chunk = 0; chunk < kLargestPipeInChunks && source; ++chunk) {
-        if (poll(&wait, 1, patienceMs) != 1) break;
+    for (int chunk = 0; chunk < kLargestPipeInChunks && source.ok(); ++chunk) {
+        if (poll(&wait, 1, timeoutMs) != 1) break;
         if (!forward(source, kind)) return false;
     }
     return true;
@@ -223,13 +230,23 @@ bool Agent::sendKernelLog() {
     return mChannel.send(Reply::KernelLog, std::string_view());
 }
 
-/// Makes the end of children readable on a descriptor.
-UniqueFd watchChildren() {
+// Makes the end of children readable on a descriptor.
+unique_fd watchChildren() {
     sigset_t children;
     sigemptyset(&children);
     sigaddset(&children, SIGCHLD);
     sigprocmask(SIG_BLOCK, &children, nullptr);
-    return UniqueFd(signalfd(-1, &children, SFD_CLOEXEC | SFD_NONBLOCK));
+    return unique_fd(signalfd(-1, &children, SFD_CLOEXEC | SFD_NONBLOCK));
+}
+
+// Serves, one after the other, the terminals that join the guest; ends with it.
+[[noreturn]] void serveJoined() {
+    const unique_fd children = watchChildren();
+    for (;;) {
+        constexpr unsigned kPauseUs = 250'000;
+        const unique_fd port = openPort(kJoinPort, kPauseUs);
+        if (port.ok()) Agent(port.get(), children.get()).serve();
+    }
 }
 
 void run() {
@@ -237,9 +254,11 @@ void run() {
         std::fprintf(stderr, "handset-agent: %s\n", failure.c_str());
         return;
     }
-    const UniqueFd children = watchChildren();
-    const UniqueFd port = openPort();
-    if (!port) {
+    const char* joinable = std::getenv("handset_join");
+    if (joinable != nullptr && std::string_view(joinable) == "1" && fork() == 0) serveJoined();
+    const unique_fd children = watchChildren();
+    const unique_fd port = openPort(kPort, 5000);
+    if (!port.ok()) {
         std::fprintf(stderr, "handset-agent: %s did not appear\n", kPort);
         return;
     }
@@ -252,7 +271,12 @@ void run() {
 int main() {
     // A command that stops reading its input must not end process 1.
     signal(SIGPIPE, SIG_IGN);
-    handset::run();
+    try {
+        handset::run();
+    } catch (const std::exception& failure) {
+        // Process 1 must reach the power-off, or the guest stands there until the host's timeout.
+        std::fprintf(stderr, "handset-agent: %s\n", failure.what());
+    }
     sync();
     reboot(RB_POWER_OFF);
 }

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Starting a child process on pipes or on a pseudo-terminal.
-#include "command.h"
+#include "handset/guest/command.h"
 
 #include <fcntl.h>
 #include <signal.h>
@@ -13,20 +14,22 @@
 namespace handset {
 namespace {
 
-/// The child's side: what becomes its descriptors 0, 1 and 2.
+using android::base::unique_fd;
+
+// The child's side: what becomes its descriptors 0, 1 and 2.
 struct ChildEnds {
-    UniqueFd input;
-    UniqueFd output;
-    UniqueFd errors;
+    unique_fd input;
+    unique_fd output;
+    unique_fd errors;
 };
 
-/// The step a child failed at, as it goes through the pipe to its parent.
+// The step a child failed at, as it goes through the pipe to its parent.
 struct ChildFailure {
     enum Step { Setup, Directory, Program } step;
     int error;
 };
 
-bool makePipe(UniqueFd& readEnd, UniqueFd& writeEnd) {
+bool makePipe(unique_fd& readEnd, unique_fd& writeEnd) {
     int ends[2];
     if (pipe2(ends, O_CLOEXEC) != 0) return false;
     readEnd.reset(ends[0]);
@@ -52,7 +55,7 @@ bool openTerminal(TerminalSize size, Command& command, ChildEnds& child) {
     child.input.reset(open(name, O_RDWR | O_NOCTTY | O_CLOEXEC));
     child.output.reset(fcntl(child.input.get(), F_DUPFD_CLOEXEC, 0));
     child.errors.reset(fcntl(child.input.get(), F_DUPFD_CLOEXEC, 0));
-    return command.input && child.errors;
+    return command.input.ok() && child.errors.ok();
 }
 
 std::vector<char*> pointersTo(const std::vector<std::string>& words) {
@@ -63,7 +66,7 @@ std::vector<char*> pointersTo(const std::vector<std::string>& words) {
     return pointers;
 }
 
-/// Becomes the command. Returns only on failure.
+// Becomes the command. Returns only on failure.
 ChildFailure becomeCommand(const CommandDescription& description, const ChildEnds& ends) {
     sigset_t none;
     sigemptyset(&none);
@@ -103,8 +106,8 @@ std::optional<StartFailure> startCommand(const CommandDescription& description, 
     if (description.arguments.empty()) return StartFailure{EINVAL, "no command given"};
     Command started;
     ChildEnds child;
-    UniqueFd failureRead;
-    UniqueFd failureWrite;
+    unique_fd failureRead;
+    unique_fd failureWrite;
     const bool open = description.terminal ? openTerminal(*description.terminal, started, child)
                                            : openPipes(started, child);
     if (!open || !makePipe(failureRead, failureWrite)) {
@@ -125,8 +128,8 @@ std::optional<StartFailure> startCommand(const CommandDescription& description, 
     if (read(failureRead.get(), &failure, sizeof(failure)) == sizeof(failure)) {
         return StartFailure{failure.error, describe(failure.step, description)};
     }
-    for (const UniqueFd* end : {&started.input, &started.output, &started.errors}) {
-        if (*end) fcntl(end->get(), F_SETFL, O_NONBLOCK);
+    for (const unique_fd* end : {&started.input, &started.output, &started.errors}) {
+        if (end->ok()) fcntl(end->get(), F_SETFL, O_NONBLOCK);
     }
     command = std::move(started);
     return std::nullopt;

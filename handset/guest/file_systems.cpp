@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Mounts, as process 1 of a guest without udev or an init system.
-#include "file_systems.h"
+#include "handset/guest/file_systems.h"
 
 #include <fcntl.h>
 #include <sys/mount.h>
@@ -8,6 +9,7 @@
 #include <unistd.h>
 
 #include <cerrno>
+#include <climits>
 #include <cstdlib>
 #include <cstring>
 #include <string_view>
@@ -23,7 +25,7 @@ struct Mount {
     const char* options;
 };
 
-constexpr const char* kOutFolder = "/run/handset/out";
+constexpr const char* kOutDirectory = "/run/handset/out";
 
 // clang-format off
 constexpr Mount kMounts[] = {
@@ -40,12 +42,29 @@ constexpr Mount kMounts[] = {
 // the launcher says that the project, or what it was started with, lies there.
 constexpr Mount kTemporary = {"tmpfs", "tmp", "/tmp", MS_NOSUID | MS_NODEV, "mode=1777"};
 
-constexpr Mount kOutExport = {"9p", "out", kOutFolder, MS_NOSUID | MS_NODEV,
+constexpr Mount kOutExport = {"9p", "out", kOutDirectory, MS_NOSUID | MS_NODEV,
                               "trans=virtio,version=9p2000.L,cache=none,msize=512000"};
 
 bool isSet(const char* variable) {
     const char* value = std::getenv(variable);
     return value != nullptr && std::string_view(value) == "1";
+}
+
+// Lets every user of the guest reach this program and what lies beside it: the phone's service has
+// a user of its own, and outside the directories above may be closed to all but their owner. The
+// root is an overlay, so nothing changes outside.
+void openDirectoriesAboveThisProgram() {
+    char program[PATH_MAX];
+    const ssize_t length = readlink("/proc/self/exe", program, sizeof(program));
+    std::string path(program, static_cast<std::size_t>(length < 0 ? 0 : length));
+    for (std::size_t end = path.rfind('/'); end != std::string::npos && end > 0;
+         end = path.rfind('/')) {
+        path.resize(end);
+        constexpr mode_t kEnter = S_IRGRP | S_IXGRP | S_IROTH | S_IXOTH;
+        struct stat status {};
+        if (stat(path.c_str(), &status) != 0 || (status.st_mode & kEnter) == kEnter) continue;
+        chmod(path.c_str(), (status.st_mode & ALLPERMS) | kEnter);
+    }
 }
 
 std::string mountOne(const Mount& entry) {
@@ -64,11 +83,12 @@ std::string setUpFileSystems() {
         if (std::string failure = mountOne(kTemporary); !failure.empty()) return failure;
     }
     mkdir("/run/handset", 0755);
-    mkdir(kOutFolder, 0755);
+    mkdir(kOutDirectory, 0755);
     if (isSet("handset_out_export")) {
         if (std::string failure = mountOne(kOutExport); !failure.empty()) return failure;
     }
     symlink("/proc/self/fd", "/dev/fd");
+    openDirectoriesAboveThisProgram();
     for (const char* device : {"/dev/binder", "/dev/hwbinder", "/dev/vndbinder"}) {
         if (chmod(device, 0666) != 0) return std::string(device) + ": " + std::strerror(errno);
     }

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Cutting the port's byte stream into frames and writing frames to it.
-#include "frames.h"
+#include "handset/guest/frames.h"
 
 #include <unistd.h>
 

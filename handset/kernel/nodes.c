@@ -23,7 +23,7 @@ struct qvx_node {
 };
 
 /* One device: /sys/class/<class>/<name> and the nodes in it. */
-struct qvx_folder {
+struct qvx_directory {
 	const char *class_name;
 	const char *name;
 	struct qvx_node *nodes;
@@ -92,7 +92,7 @@ static struct qvx_node info_nodes[] = {
 	RO(haptic_intensities, "0,2200,4400,6600,10000\n"),
 };
 
-static struct qvx_folder folders[] = {
+static struct qvx_directory directories[] = {
 	{"timed_output", "vibrator", timed_output_nodes,
 	 ARRAY_SIZE(timed_output_nodes)},
 	{"qvx_vib_inputff", "control", control_nodes,
@@ -101,7 +101,7 @@ static struct qvx_folder folders[] = {
 	 ARRAY_SIZE(info_nodes)},
 };
 
-static struct qvx_folder led_folder = {"leds", "vibrator", led_nodes,
+static struct qvx_directory led_directory = {"leds", "vibrator", led_nodes,
 				       ARRAY_SIZE(led_nodes)};
 
 static struct qvx_node *node_of(struct device_attribute *attribute)
@@ -150,17 +150,17 @@ static ssize_t node_store(struct device *device,
 	return size;
 }
 
-static int add_nodes(struct qvx_folder *folder)
+static int add_nodes(struct qvx_directory *directory)
 {
 	size_t i;
 	int error;
 
-	for (i = 0; i < folder->node_count; i++) {
-		struct qvx_node *node = &folder->nodes[i];
+	for (i = 0; i < directory->node_count; i++) {
+		struct qvx_node *node = &directory->nodes[i];
 
 		node->length = strscpy(node->text, node->first_text,
 				       sizeof(node->text));
-		error = device_create_file(folder->device, &node->attribute);
+		error = device_create_file(directory->device, &node->attribute);
 		if (error)
 			return error;
 	}
@@ -168,26 +168,26 @@ static int add_nodes(struct qvx_folder *folder)
 }
 
 /* The nodes go with their device. */
-static void remove_folder(struct qvx_folder *folder)
+static void remove_directory(struct qvx_directory *directory)
 {
-	if (!IS_ERR_OR_NULL(folder->device))
-		device_unregister(folder->device);
-	if (!IS_ERR_OR_NULL(folder->class))
-		class_destroy(folder->class);
-	folder->device = NULL;
-	folder->class = NULL;
+	if (!IS_ERR_OR_NULL(directory->device))
+		device_unregister(directory->device);
+	if (!IS_ERR_OR_NULL(directory->class))
+		class_destroy(directory->class);
+	directory->device = NULL;
+	directory->class = NULL;
 }
 
-static int add_folder(struct qvx_folder *folder)
+static int add_directory(struct qvx_directory *directory)
 {
-	folder->class = class_create(THIS_MODULE, folder->class_name);
-	if (IS_ERR(folder->class))
-		return PTR_ERR(folder->class);
-	folder->device =
-		device_create(folder->class, NULL, 0, NULL, "%s", folder->name);
-	if (IS_ERR(folder->device))
-		return PTR_ERR(folder->device);
-	return add_nodes(folder);
+	directory->class = class_create(THIS_MODULE, directory->class_name);
+	if (IS_ERR(directory->class))
+		return PTR_ERR(directory->class);
+	directory->device =
+		device_create(directory->class, NULL, 0, NULL, "%s", directory->name);
+	if (IS_ERR(directory->device))
+		return PTR_ERR(directory->device);
+	return add_nodes(directory);
 }
 
 /* The LED class insists on a brightness; a vibrator has none. */
@@ -208,8 +208,8 @@ static int add_led(void)
 
 	if (error)
 		return error;
-	led_folder.device = led.dev;
-	error = add_nodes(&led_folder);
+	led_directory.device = led.dev;
+	error = add_nodes(&led_directory);
 	if (error)
 		led_classdev_unregister(&led);
 	return error;
@@ -220,8 +220,8 @@ int qvx_nodes_init(void)
 	size_t i;
 	int error;
 
-	for (i = 0; i < ARRAY_SIZE(folders); i++) {
-		error = add_folder(&folders[i]);
+	for (i = 0; i < ARRAY_SIZE(directories); i++) {
+		error = add_directory(&directories[i]);
 		if (error)
 			goto failed;
 	}
@@ -231,8 +231,8 @@ int qvx_nodes_init(void)
 	return 0;
 
 failed:
-	for (i = 0; i < ARRAY_SIZE(folders); i++)
-		remove_folder(&folders[i]);
+	for (i = 0; i < ARRAY_SIZE(directories); i++)
+		remove_directory(&directories[i]);
 	return error;
 }
 
@@ -241,6 +241,6 @@ void qvx_nodes_exit(void)
 	size_t i;
 
 	led_classdev_unregister(&led);
-	for (i = 0; i < ARRAY_SIZE(folders); i++)
-		remove_folder(&folders[i]);
+	for (i = 0; i < ARRAY_SIZE(directories); i++)
+		remove_directory(&directories[i]);
 }

@@ -12,6 +12,7 @@ from agent_channel import INPUT_WINDOW, Channel
 from failure import Failure
 
 BOOT_SECONDS = 60  # after which a guest without a word from its agent has failed
+_JOIN_SECONDS = 10
 _TAIL_LINES = 12   # console lines shown for a guest that has failed
 
 
@@ -36,6 +37,15 @@ class Guest:
         self._selector = selectors.PollSelector()  # takes plain files too, for standard input
         self._watch(self._channel, self._read_agent)
         self._watch(machine.console, self._read_console)
+
+    def wait_for_agent(self):
+        """Returns when the agent of a guest that is up has taken notice."""
+        deadline = time.monotonic() + _JOIN_SECONDS
+        while self._alive and not self._frames and time.monotonic() < deadline:
+            self._wait(deadline - time.monotonic())
+        if not self._frames:
+            raise Failure("the guest does not answer; another terminal may have joined it already")
+        self._frames.popleft()
 
     def wait_for_boot(self):
         """Returns when the agent is there."""

@@ -5,10 +5,10 @@ The result lies in the project's untracked build/guest/ARCH/:
 
     kernel       what QEMU boots
     initramfs    busybox, the kernel modules and handset/guest/init
-    stamp        what both were made from; written last, so a folder without it is never used
+    stamp        what both were made from; written last, so a directory without it is never used
 
-Nothing is installed on the machine: packages are downloaded and unpacked in a scratch folder. The
-unpacked kernel and busybox are kept in build/guest/ARCH.parts/, so that a change of init costs no
+Nothing is installed on the machine: packages are downloaded and unpacked in a scratch directory.
+The unpacked kernel and busybox are kept in build/guest/ARCH.parts/, so that a change of init costs no
 download. Runs at the same time wait for each other.
 """
 
@@ -23,7 +23,7 @@ import sys
 import tempfile
 
 import debian_packages
-import made_folder
+import artifact_directory
 from failure import Failure
 
 PROJECT = os.path.dirname(os.path.dirname(os.path.dirname(os.path.realpath(__file__))))
@@ -42,40 +42,41 @@ PARTS_RECIPE = 1
 EMULATORS = {"amd64": [], "arm64": ["qemu-aarch64-static"]}
 
 
-def image_folder(arch):
-    """The folder with the files that boot a guest of `arch`."""
+def image_directory(arch):
+    """The directory with the files that boot a guest of `arch`."""
     return os.path.join(PROJECT, "build", "guest", arch)
 
 
 def prepare(arch, say):
-    """Makes image_folder(arch) unless it is up to date. `say` is called with lines of progress."""
+    """Makes image_directory(arch) unless it is up to date. `say` is called with lines of
+    progress."""
     wanted = _stamp()
-    folder = image_folder(arch)
-    if made_folder.read_stamp(folder) == wanted:
+    directory = image_directory(arch)
+    if artifact_directory.read_stamp(directory) == wanted:
         return
-    with made_folder.lock(folder + ".lock", f"the {arch} guest", say):
-        if made_folder.read_stamp(folder) == wanted:
+    with artifact_directory.lock(directory + ".lock", f"the {arch} guest", say):
+        if artifact_directory.read_stamp(directory) == wanted:
             return
-        parts = _parts_folder(arch)
-        if made_folder.read_stamp(parts) != _parts_stamp():
-            with made_folder.replacing(parts) as scratch:
+        parts = _parts_directory(arch)
+        if artifact_directory.read_stamp(parts) != _parts_stamp():
+            with artifact_directory.replacing(parts) as scratch:
                 _fetch_parts(arch, scratch, say)
-                made_folder.write_stamp(scratch, _parts_stamp())
-        with made_folder.replacing(folder) as scratch:
+                artifact_directory.write_stamp(scratch, _parts_stamp())
+        with artifact_directory.replacing(directory) as scratch:
             _assemble(arch, parts, scratch)
-            made_folder.write_stamp(scratch, wanted)
+            artifact_directory.write_stamp(scratch, wanted)
         say(f"the {arch} guest is ready")
 
 
 def kernel_release(arch):
     """The release of a prepared guest's kernel, "6.1.0-13-amd64": its modules say it."""
-    modules = os.path.join(_parts_folder(arch), "modules")
+    modules = os.path.join(_parts_directory(arch), "modules")
     module = os.path.join(modules, sorted(os.listdir(modules))[0])
     return debian_packages.run(["modinfo", "-F", "vermagic", module]).split()[0]
 
 
-def _parts_folder(arch):
-    return image_folder(arch) + ".parts"
+def _parts_directory(arch):
+    return image_directory(arch) + ".parts"
 
 
 # --- up to date or not ---------------------------------------------------------------------------
@@ -170,7 +171,7 @@ def _assemble(arch, parts, target):
 
 
 def _make_layer(busybox, layer, arch):
-    """The folder that lies over the host's root. Its links are made here: making them at boot
+    """The directory that lies over the host's root. Its links are made here: making them at boot
     would take seconds. /bin and /sbin are links into /usr on a Debian system."""
     emulator = [debian_packages.find_tool(word, "qemu-user-static") for word in EMULATORS[arch]]
     os.makedirs(os.path.join(layer, "usr", "bin"))
@@ -178,16 +179,16 @@ def _make_layer(busybox, layer, arch):
     program = os.path.join(layer, "usr", "bin", "busybox")
     shutil.copy(busybox, program)
     for applet in debian_packages.run([*emulator, program, "--list-full"]).split():
-        folder = "sbin" if os.path.dirname(applet).endswith("sbin") else "bin"
-        link = os.path.join(layer, "usr", folder, os.path.basename(applet))
+        directory = "sbin" if os.path.dirname(applet).endswith("sbin") else "bin"
+        link = os.path.join(layer, "usr", directory, os.path.basename(applet))
         with contextlib.suppress(FileExistsError):
-            os.symlink("../bin/busybox" if folder == "sbin" else "busybox", link)
+            os.symlink("../bin/busybox" if directory == "sbin" else "busybox", link)
 
 
 def _walk(tree):
-    for folder, folders, files in os.walk(tree):
-        for name in folders + files:
-            yield os.path.relpath(os.path.join(folder, name), tree)
+    for directory, directories, files in os.walk(tree):
+        for name in directories + files:
+            yield os.path.relpath(os.path.join(directory, name), tree)
 
 
 def say_on_stderr(line):

@@ -14,10 +14,11 @@ import hashlib
 import os
 import shutil
 import subprocess
+import tempfile
 
 import debian_packages
 import guest_image
-import made_folder
+import artifact_directory
 from failure import Failure
 
 SOURCES = os.path.join(guest_image.PROJECT, "handset", "kernel")
@@ -26,7 +27,7 @@ MODULE = "qvx_vibrator.ko"
 _PREFIXES = {"amd64": "", "arm64": "aarch64-linux-gnu-"}  # of the compiler and its tools
 _COMPILER_PACKAGES = {"amd64": "g++", "arm64": "g++-aarch64-linux-gnu"}
 
-# What make is told beside the folders; the headers name the compiler they want themselves.
+# What make is told beside the directories; the headers name the compiler they want themselves.
 _VARIABLES = {
     "amd64": [],
     "arm64": ["ARCH=arm64", "CROSS_COMPILE=aarch64-linux-gnu-", "DEB_BUILD_ARCH=amd64",
@@ -36,7 +37,7 @@ _VARIABLES = {
 
 def module_path(arch):
     """Where the module for guests of `arch` is put."""
-    return os.path.join(_folder(arch), MODULE)
+    return os.path.join(_directory(arch), MODULE)
 
 
 def build(arch, say):
@@ -44,23 +45,23 @@ def build(arch, say):
     guest_image.prepare(arch, say)
     release = guest_image.kernel_release(arch)
     wanted = _stamp(release)
-    folder = _folder(arch)
-    with made_folder.lock(folder + ".lock", f"the {arch} kernel module", say):
-        if made_folder.read_stamp(folder) == wanted:
+    directory = _directory(arch)
+    with artifact_directory.lock(directory + ".lock", f"the {arch} kernel module", say):
+        if artifact_directory.read_stamp(directory) == wanted:
             return
-        headers = folder + ".headers"
-        if made_folder.read_stamp(headers) != release:
-            with made_folder.replacing(headers) as scratch:
+        headers = directory + ".headers"
+        if artifact_directory.read_stamp(headers) != release:
+            with artifact_directory.replacing(headers) as scratch:
                 _fetch_headers(arch, release, scratch, say)
-                made_folder.write_stamp(scratch, release)
-        with made_folder.replacing(folder) as scratch:
+                artifact_directory.write_stamp(scratch, release)
+        with artifact_directory.replacing(directory) as scratch:
             say(f"building {MODULE} for {release}")
-            _make(arch, os.path.join(headers, "usr", "src", f"linux-headers-{release}"), scratch)
-            made_folder.write_stamp(scratch, wanted)
+            _make(arch, headers, release, scratch)
+            artifact_directory.write_stamp(scratch, wanted)
         say(f"the {arch} kernel module is ready")
 
 
-def _folder(arch):
+def _directory(arch):
     return os.path.join(guest_image.PROJECT, "build", "kernel", arch)
 
 
@@ -87,29 +88,31 @@ def _fetch_headers(arch, release, target, say):
             debian_packages.unpack(package, target, say)
     except Failure as failure:
         raise Failure(f"{failure}; when Debian has replaced the kernel {release}, remove "
-                      f"{guest_image.image_folder(arch)}.parts to fetch its successor") from None
+                      f"{guest_image.image_directory(arch)}.parts to fetch its successor") from None
     # The packages expect to be installed.
     makefile = os.path.join(target, "usr", "src", f"linux-headers-{release}", "Makefile")
     with open(makefile, "w", encoding="ascii") as file:
         file.write(f"include $(dir $(lastword $(MAKEFILE_LIST)))/../{common}/Makefile\n")
 
 
-def _make(arch, headers, target):
-    """Compiles a copy of the sources, so that nothing is left beside them."""
+def _make(arch, headers, release, target):
+    """Compiles copies of sources and headers in a directory whose name make takes for one word,
+    which the project's need not be; nothing is left beside the sources."""
     debian_packages.find_tool("make", "make")
     debian_packages.find_tool(_PREFIXES[arch] + "gcc-12", _COMPILER_PACKAGES[arch])
-    source = os.path.join(target, "source")
-    os.mkdir(source)
-    for name in _source_files():
-        shutil.copy(os.path.join(SOURCES, name), source)
-    done = subprocess.run(["make", "--silent", "-C", headers, f"M={source}", *_VARIABLES[arch],
-                           "modules"],
-                          stdin=subprocess.DEVNULL, capture_output=True, text=True,
-                          errors="replace", check=False)
-    if done.returncode != 0:
-        complaints = [line for line in done.stderr.splitlines() if "error" in line.lower()]
-        raise Failure("\n  ".join(["the kernel module does not build:"] + complaints[:10]))
-    # What a debugger wants is most of the file, which the guest reads through an export.
-    debian_packages.run([_PREFIXES[arch] + "strip", "--strip-debug", MODULE], source)
-    shutil.move(os.path.join(source, MODULE), target)
-    shutil.rmtree(source)
+    with tempfile.TemporaryDirectory(prefix="handset-module.", dir="/var/tmp") as scratch:
+        shutil.copytree(os.path.join(headers, "usr"), os.path.join(scratch, "usr"), symlinks=True)
+        source = os.path.join(scratch, "source")
+        os.mkdir(source)
+        for name in _source_files():
+            shutil.copy(os.path.join(SOURCES, name), source)
+        done = subprocess.run(
+            ["make", "--silent", "-C", f"{scratch}/usr/src/linux-headers-{release}", f"M={source}",
+             *_VARIABLES[arch], "modules"],
+            stdin=subprocess.DEVNULL, capture_output=True, text=True, errors="replace", check=False)
+        if done.returncode != 0:
+            complaints = [line for line in done.stderr.splitlines() if "error" in line.lower()]
+            raise Failure("\n  ".join(["the kernel module does not build:"] + complaints[:10]))
+        # What a debugger wants is most of the file, which the guest reads through an export.
+        debian_packages.run([_PREFIXES[arch] + "strip", "--strip-debug", MODULE], source)
+        shutil.move(os.path.join(source, MODULE), target)

@@ -1,13 +1,19 @@
 # SPDX-License-Identifier: Apache-2.0
 """What handset/run and handset/shell do: options, session, exit status."""
 
+import contextlib
 import os
+import shlex
 import signal
+import subprocess
 import sys
+import tempfile
 
+import join
 import options
 import session
 from failure import Failure
+from guest_image import PROJECT
 from terminal import Terminal
 
 
@@ -30,7 +36,8 @@ def run_command(program, description, words):
     def work():
         chosen = options.parse(program, description, words, takes_command=True)
         streams = _Inherited(None if os.isatty(0) else 0)
-        return session.run(chosen, chosen.command, streams)
+        with _drawn(chosen, shlex.join([program, *words])):
+            return session.run(chosen, chosen.command, streams)
     return _with_one_line(program, work)
 
 
@@ -40,10 +47,44 @@ def run_shell(program, description, words):
         chosen = options.parse(program, description, words, takes_command=False)
         if not os.isatty(0) or not os.isatty(1):
             raise Failure("needs a terminal; for a script use handset/run")
-        with Terminal() as terminal:
-            prompt = ["env", "PS1=handset:\\w# ", "sh"]
-            return session.run(chosen, prompt, _Inherited(0), terminal)
+        if chosen.join is not None:
+            return _join(chosen.join)
+        command = _shell(chosen.arch)
+        joined = {"arguments": session.in_view(chosen, command),
+                  "directory": chosen.directory, "environment": session.environment(chosen)}
+        with join.offered(joined) as join_socket, Terminal() as terminal:
+            return session.run(chosen, command, _Inherited(0), terminal, join_socket)
     return _with_one_line(program, work)
+
+
+def _join(which):
+    guest, description = join.guest(which)
+    session.raise_on_signals()
+    with Terminal() as terminal:
+        return session.exit_status(guest.run(streams=_Inherited(0), terminal=terminal, **description))
+
+
+def _shell(arch):
+    """The command that is the shell. The host's bash runs on a processor of the host's kind alone."""
+    start = os.path.join(PROJECT, "handset", "launcher", "shellrc")
+    variables = ["env", f"HANDSET_PROJECT={PROJECT}"]
+    if arch == "amd64":
+        return [*variables, "bash", "--rcfile", start, "-i"]
+    return [*variables, f"ENV={start}", "sh", "-i"]
+
+
+@contextlib.contextmanager
+def _drawn(chosen, title):
+    """Draws what the session has left, where --picture or --trace asks for it."""
+    wanted = [("picture", chosen.picture, ["--title", title]), ("trace", chosen.trace, [])]
+    wanted = [drawing for drawing in wanted if drawing[1] is not None]
+    with contextlib.ExitStack() as scratch:
+        if wanted and chosen.out is None:
+            chosen.out = scratch.enter_context(tempfile.TemporaryDirectory(prefix="handset-"))
+        yield
+        for tool, file, more in wanted:
+            subprocess.run([os.path.join(PROJECT, "handset", tool), chosen.out, "--out", file,
+                            *more], stdout=subprocess.DEVNULL, check=False)
 
 
 def _with_one_line(program, work):

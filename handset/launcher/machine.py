@@ -9,6 +9,7 @@ import signal
 import socket
 import subprocess
 
+import debian_packages
 import guest_image
 from failure import Failure
 
@@ -19,10 +20,14 @@ from failure import Failure
 _Target = collections.namedtuple("_Target", "program package machine console parameters")
 TARGETS = {
     "amd64": _Target("qemu-system-x86_64", "qemu-system-x86", ["-machine", "q35"], "ttyS0",
-                     "no_timer_check mitigations=off"),
+                     "no_timer_check"),
     "arm64": _Target("qemu-system-aarch64", "qemu-system-arm",
-                     ["-machine", "virt", "-cpu", "cortex-a72"], "ttyAMA0", "mitigations=off"),
+                     ["-machine", "virt", "-cpu", "cortex-a72"], "ttyAMA0", ""),
 }
+
+# What the kernel need not do for a guest like this: defend itself, and test its ciphers, which is a
+# third of an emulated boot.
+_UNGUARDED = "mitigations=off rodata=off cryptomgr.notests"
 
 _LONGEST_COMMAND_LINE = 2047  # bytes of kernel parameters either architecture takes
 _FAULT = re.compile(r"\] (BUG|Oops|general protection fault|Internal error|INFO: task )")
@@ -35,8 +40,7 @@ def find_emulator(arch):
     target = TARGETS[arch]
     program = shutil.which(target.program)
     if program is None:
-        raise Failure(f"{target.program} is not installed: "
-                      f"scripts/install-packages installs {target.package}")
+        raise debian_packages.is_missing(target.program, target.package)
     return program
 
 
@@ -44,21 +48,23 @@ class Machine:
     """One running QEMU. It has no file anywhere: agent and console are connected sockets, and the
     kernel kills it when this process dies, however that happens."""
 
-    def __init__(self, arch, agent_path, memory_mib, processors, host_tmp, out):
-        """Starts the guest. `host_tmp`: whether it sees the host's /tmp; `out`: the folder
-        exported writable, or None."""
-        target = TARGETS[arch]
+    def __init__(self, options, join_socket=None):
+        """Starts the guest that `options` (see options.py) asks for. `join_socket`: where others can
+        join it, or None."""
+        target = TARGETS[options.arch]
+        image = guest_image.image_directory(options.arch)
         self.agent, agent_end = socket.socketpair()
         self.console, console_end = socket.socketpair()
         self._console_text = bytearray()
         with agent_end, console_end:
             command = [
-                "setpriv", "--pdeathsig", "KILL", find_emulator(arch), *target.machine,
-                "-accel", "tcg", "-m", str(memory_mib), "-smp", str(processors),
+                "setpriv", "--pdeathsig", "KILL", find_emulator(options.arch),
+                *target.machine, "-accel", "tcg", "-m", str(options.memory),
+                "-smp", str(options.smp),
                 "-nodefaults", "-no-user-config", "-nic", "none", "-display", "none", "-no-reboot",
-                "-kernel", os.path.join(guest_image.image_folder(arch), "kernel"),
-                "-initrd", os.path.join(guest_image.image_folder(arch), "initramfs"),
-                "-append", _kernel_parameters(target, agent_path, host_tmp, out),
+                "-kernel", os.path.join(image, "kernel"),
+                "-initrd", os.path.join(image, "initramfs"),
+                "-append", _kernel_parameters(target, options, join_socket),
                 "-chardev", f"socket,id=console,fd={console_end.fileno()}",
                 "-serial", "chardev:console",
                 "-device", "virtio-serial-pci",
@@ -67,8 +73,13 @@ class Machine:
                 "-device", "virtio-rng-pci",
                 *_export("host", "/", "readonly=on"),
             ]
-            if out is not None:
-                command += _export("out", out, "readonly=off")
+            if options.counted:
+                command += ["-icount", "shift=0,sleep=on"]
+            if options.out is not None:
+                command += _export("out", options.out, "readonly=off")
+            if join_socket is not None:
+                command += ["-chardev", f"socket,id=join,path={join_socket},server=on,wait=off",
+                            "-device", "virtserialport,nr=2,chardev=join,name=join"]
             self._process = subprocess.Popen(
                 command, stdin=subprocess.DEVNULL, stdout=subprocess.DEVNULL,
                 stderr=console_end, pass_fds=(agent_end.fileno(), console_end.fileno()),
@@ -99,7 +110,7 @@ class Machine:
             pass
 
     def last_words(self, count):
-        """The last `count` lines (None for all) that console and QEMU have said, blank ones
+        """The last `count` lines (None for all) that console and QEMU have said, empty ones
         aside. Of a kernel panic those up to its message: the stack below it tells less than what led there."""
         lines = self._console_text.decode(errors="replace").replace("\r", "").split("\n")
         lines = [line for line in lines if line.strip()]
@@ -126,22 +137,24 @@ class Machine:
             self._process.wait()
 
 
-def _kernel_parameters(target, agent_path, host_tmp, out):
+def _kernel_parameters(target, options, join_socket):
+    agent_path = options.agent
     if '"' in agent_path or "\n" in agent_path:
         raise Failure(f"a guest cannot be told of this path: {agent_path!r}")
     words = [f"console={target.console} quiet loglevel=4 panic=-1 random.trust_cpu=on",
-             target.parameters,
+             target.parameters, _UNGUARDED,
              f'handset_agent="{agent_path}"',
-             f"handset_host_tmp={int(host_tmp)}",
-             f"handset_out_export={int(out is not None)}"]
+             f"handset_host_tmp={int(options.host_tmp)}",
+             f"handset_out_export={int(options.out is not None)}",
+             f"handset_join={int(join_socket is not None)}"]
     line = " ".join(words)
     if len(line.encode()) > _LONGEST_COMMAND_LINE:
-        raise Failure(f"the build folder's path is too long for a guest: {agent_path}")
+        raise Failure(f"the build directory's path is too long for a guest: {agent_path}")
     return line
 
 
 def _export(tag, path, access):
-    """A 9p export of the host's folder `path`. A comma in a QEMU option is doubled."""
+    """A 9p export of the host's directory `path`. A comma in a QEMU option is doubled."""
     escaped = path.replace(",", ",,")
     return ["-fsdev", f"local,id={tag},path={escaped},security_model=none,{access},multidevs=remap",
             "-device", f"virtio-9p-pci,fsdev={tag},mount_tag={tag}"]

@@ -15,7 +15,7 @@ _ELF_MACHINE_OFFSET = 18
 _MEMORY_MIB = 512
 _SANITIZED_MEMORY_MIB = 2048  # shadow memory
 
-# The guest has file systems of its own there, so a folder below is not seen as it is outside.
+# The guest has file systems of its own there, so a directory below is not seen as it is outside.
 _HIDDEN = ("/dev", "/proc", "/run", "/sys")
 
 
@@ -43,6 +43,8 @@ def parse(program, description, words, takes_command):
         agent      the path of handset-agent
         directory  the working directory, here and in the guest
         host_tmp   whether the guest has to see the host's /tmp
+        join       of a shell: the process id given with --join, 0 for none given, None without
+    With --join nothing else is checked or there.
     """
     parser = _Parser(prog=program, description=description, allow_abbrev=False)
     parser.add_argument("--arch", default="amd64", metavar="ARCH", help="amd64 (default) or arm64")
@@ -56,16 +58,27 @@ def parse(program, description, words, takes_command):
                         help="end the guest this long after its boot, with status 124 (default "
                              f"{'300' if takes_command else 'never'})")
     parser.add_argument("--build", metavar="DIR",
-                        help="build folder with the programs (default build/release, for arm64 "
+                        help="build directory with the programs (default build/release, for arm64 "
                              "build/arm64)")
     parser.add_argument("--memory", metavar="MIB", type=_positive(int, "a whole number"),
                         help="the guest's memory (default 512, for a sanitized build 2048)")
     parser.add_argument("--smp", metavar="N", type=_positive(int, "a whole number"), default=1,
                         help="processors (default 1)")
+    parser.add_argument("--counted", action="store_true",
+                        help="let the guest's clock count instructions: 1 ns is one instruction")
     parser.add_argument("--timing", metavar="FILE",
                         help="write the seconds each phase took, as JSON")
+    if takes_command:
+        parser.add_argument("--picture", metavar="FILE",
+                            help="draw what happened into a .svg or .png, see handset/picture")
+        parser.add_argument("--trace", metavar="FILE",
+                            help="write what happened as a trace, see handset/trace")
     parser.add_argument("--verbose", action="store_true", help="tell of each phase")
     command = []
+    if not takes_command:
+        parser.add_argument("--join", metavar="PID", nargs="?", type=_positive(int, "a process id"),
+                            const=0, help="another shell in the guest that a handset/shell (of "
+                            "several: the one with this process id) has booted")
     if takes_command:
         parser.usage = f"{program} [options] -- COMMAND..."
         if "--" in words:
@@ -74,11 +87,17 @@ def parse(program, description, words, takes_command):
             raise Failure("no command given; put it after '--'")
     options = parser.parse_args(words)
     options.command = command
+    if takes_command:
+        options.join = None
+    elif options.join is not None:
+        if len(words) > 2 or not words[0].startswith("--join"):
+            raise Failure("--join takes no other option")
+        return options
     _check_architecture(options)
     _check_profile(options)
     _check_build(options)
-    _check_folders(options)
-    _check_results(options)
+    _check_directories(options)
+    _check_results(options, takes_command)
     if options.memory is None:
         options.memory = _SANITIZED_MEMORY_MIB if _is_sanitized(options.build) else _MEMORY_MIB
     return options
@@ -90,7 +109,7 @@ def _check_architecture(options):
     find_emulator(options.arch)  # before anything is downloaded for it
 
 
-def _check_folders(options):
+def _check_directories(options):
     """What the guest has to see must not lie where it has file systems of its own."""
     try:
         options.directory = os.getcwd()
@@ -105,8 +124,8 @@ def _check_folders(options):
     options.host_tmp = any(_is_below(path, ("/tmp",)) for path in paths)
 
 
-def _is_below(path, folders):
-    return any(path == folder or path.startswith(folder + "/") for folder in folders)
+def _is_below(path, directories):
+    return any(path == directory or path.startswith(directory + "/") for directory in directories)
 
 
 def _check_build(options):
@@ -136,7 +155,8 @@ def _refuse_build(options, machine):
     for arch, number in _ELF_MACHINES.items():
         if number == machine:
             raise Failure(f"{options.build} is built for {arch}, not for {options.arch}: give "
-                          f"--arch {arch}, or with --build the folder of an {options.arch} build")
+                          f"--arch {arch}, or with --build the directory of an "
+                          f"{options.arch} build")
     raise Failure(f"{options.agent} is no program for {options.arch}; {options.how_to_build}")
 
 
@@ -144,9 +164,9 @@ def _check_profile(options):
     if options.profile == "off":
         options.profile = None
         return
-    folder = os.path.join(PROJECT, "handset", "profiles")
-    built_in = sorted(name[:-len(".json")] for name in os.listdir(folder)
-                      if name.endswith(".json")) if os.path.isdir(folder) else []
+    directory = os.path.join(PROJECT, "handset", "profiles")
+    built_in = sorted(name[:-len(".json")] for name in os.listdir(directory)
+                      if name.endswith(".json")) if os.path.isdir(directory) else []
     if options.profile in built_in:
         return
     if not os.path.isfile(options.profile):
@@ -154,7 +174,9 @@ def _check_profile(options):
     options.profile = os.path.abspath(options.profile)
 
 
-def _check_results(options):
+def _check_results(options, takes_command):
+    if takes_command:
+        _check_drawings(options)
     if options.out is not None:
         options.out = os.path.abspath(options.out)
         try:
@@ -162,7 +184,15 @@ def _check_results(options):
         except OSError as error:
             raise Failure(f"--out {options.out}: {error.strerror}") from None
     if options.timing is not None and not os.path.isdir(os.path.dirname(options.timing) or "."):
-        raise Failure(f"--timing {options.timing}: its folder does not exist")
+        raise Failure(f"--timing {options.timing}: its directory does not exist")
+
+
+def _check_drawings(options):
+    for name, path in (("picture", options.picture), ("trace", options.trace)):
+        if path is not None and not os.path.isdir(os.path.dirname(path) or "."):
+            raise Failure(f"--{name} {path}: its directory does not exist")
+    if options.picture is not None and not options.picture.endswith((".svg", ".png")):
+        raise Failure(f"--picture {options.picture}: a picture's name ends in .svg or .png")
 
 
 def _is_sanitized(build):

@@ -10,18 +10,19 @@ import sys
 import time
 
 import guest_image
+from failure import Failure
 from guest import Guest, NotStarted
 from machine import Machine
 
-GUEST_OUT = "/run/handset/out"  # $OUT: the exported folder, or one in the guest's memory
+GUEST_OUT = "/run/handset/out"  # $OUT: the exported directory, or one in the guest's memory
 
 # The caller's variables that reach the command.
 _PASSED_ON = ("ASAN_OPTIONS", "LSAN_OPTIONS", "TSAN_OPTIONS", "UBSAN_OPTIONS", "TERM", "TZ")
 _PASSED_ON_PREFIX = "GTEST_"
 
 # Seconds a guest gets to tell its kernel log, and to power off: as it should, and after a timeout.
-_PATIENCE = 10
-_LITTLE_PATIENCE = 2
+_TIMEOUT = 10
+_SHORT_TIMEOUT = 2
 
 _SYSTEM_PATH = "/usr/local/sbin:/usr/local/bin:/usr/sbin:/usr/bin:/sbin:/bin"
 
@@ -87,23 +88,22 @@ def say(line):
     print(f"handset: {line}", file=sys.stderr, flush=True)
 
 
-def run(options, arguments, streams, terminal=None):
+def run(options, arguments, streams, terminal=None, join_socket=None):
     """Runs `arguments` in a guest of its own as `options` (see options.py) says. Returns the exit
     status of the launcher: the command's, 128 plus the signal that ended it, 124 after a timeout,
     127 or 126 when it could not be started, the phone's when that could not be brought up. Raises
     Failure and Interrupted; the guest is gone in every case."""
     phases = Phases(options)
-    _raise_on_signals()
+    raise_on_signals()
     with phases.measure("preparation"):
         guest_image.prepare(options.arch, say)
-    machine = Machine(options.arch, options.agent, options.memory, options.smp, options.host_tmp,
-                      options.out)
+    machine = Machine(options, join_socket)
     try:
         guest = Guest(machine)
         with phases.measure("boot"):
             guest.wait_for_boot()
         status = _run_in(guest, options, arguments, streams, terminal, phases)
-        guest.power_off(_PATIENCE)
+        guest.power_off(_TIMEOUT)
         for line in machine.complaints():
             say(f"the guest's kernel says: {line}")
         return status
@@ -114,14 +114,13 @@ def run(options, arguments, streams, terminal=None):
 
 
 def _run_in(guest, options, arguments, streams, terminal, phases):
-    patience = _PATIENCE
+    timeout = _TIMEOUT
     try:
         signal.setitimer(signal.ITIMER_REAL, options.timeout or 0)
         with _phone(guest, options, phases), phases.measure("command"):
-            wait_status = guest.run(arguments, options.directory, _environment(options), streams,
-                                    terminal)
-        status = os.waitstatus_to_exitcode(wait_status)
-        status = 128 - status if status < 0 else status
+            wait_status = guest.run(in_view(options, arguments), options.directory,
+                                    environment(options), streams, terminal)
+        status = exit_status(wait_status)
     except NotStarted as failure:
         say(str(failure))
         status = 127 if failure.error == errno.ENOENT else 126
@@ -130,9 +129,12 @@ def _run_in(guest, options, arguments, streams, terminal, phases):
         status = failure.status
     except TimedOut:
         say(f"not finished after {options.timeout:g} s; the guest was ended")
-        status, patience = 124, _LITTLE_PATIENCE
+        status, timeout = 124, _SHORT_TIMEOUT
+    except Interrupted:
+        _leave_results(guest, options)
+        raise
     _ignore_signals()
-    _keep_kernel_log(guest, options, patience)
+    _keep_kernel_log(guest, options, timeout)
     return status
 
 
@@ -149,10 +151,14 @@ def _phone(guest, options, phases):
         _run_phone(guest, options, "down")
 
 
+def _phone_tool(options):
+    return os.path.join(options.build, "bin", "phone")
+
+
 def _run_phone(guest, options, *words):
     streams = Collected()
-    wait_status = guest.run([os.path.join(options.build, "bin", "phone"), *words],
-                            options.directory, _environment(options), streams)
+    wait_status = guest.run([_phone_tool(options), *words], options.directory,
+                            environment(options), streams)
     text = streams.text.decode(errors="replace").strip()
     if wait_status != 0:
         status = os.waitstatus_to_exitcode(wait_status)
@@ -162,13 +168,37 @@ def _run_phone(guest, options, *words):
         say(text)
 
 
-def _environment(options):
-    environment = {"PATH": f"{os.path.join(options.build, 'bin')}:{_SYSTEM_PATH}",
-                   "HOME": "/root", "USER": "root", "OUT": GUEST_OUT, "LANG": "C.UTF-8"}
+def environment(options):
+    variables = {"PATH": f"{os.path.join(options.build, 'bin')}:{_SYSTEM_PATH}",
+                 "HOME": "/root", "USER": "root", "OUT": GUEST_OUT, "LANG": "C.UTF-8"}
     for name, value in os.environ.items():
         if name in _PASSED_ON or name.startswith(_PASSED_ON_PREFIX):
-            environment[name] = value
-    return environment
+            variables[name] = value
+    return variables
+
+
+def in_view(options, arguments):
+    """The command as it is run where the phone's nodes are seen, if there is to be a phone."""
+    if options.profile is None:
+        return arguments
+    return [_phone_tool(options), "exec", "--", *arguments]
+
+
+def exit_status(wait_status):
+    """What a shell would say of a command's end."""
+    status = os.waitstatus_to_exitcode(wait_status)
+    return 128 - status if status < 0 else status
+
+
+def _leave_results(guest, options):
+    """What an interrupted session has to leave. A second signal, or a guest that hangs, ends it."""
+    if options.out is None:
+        return
+    signal.setitimer(signal.ITIMER_REAL, _TIMEOUT)
+    with contextlib.suppress(Failure, NotStarted, PhoneFailed, TimedOut):
+        if options.profile is not None:  # the driver's journal is whole when it has ended
+            _run_phone(guest, options, "down")
+        _keep_kernel_log(guest, options, _SHORT_TIMEOUT)
 
 
 def _keep_kernel_log(guest, options, seconds):
@@ -180,7 +210,7 @@ def _keep_kernel_log(guest, options, seconds):
             file.write(log)
 
 
-def _raise_on_signals():
+def raise_on_signals():
     def interrupt(number, _):
         raise Interrupted(number)
 

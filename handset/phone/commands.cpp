@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The phone tool's commands but for "up".
-#include "phone/commands.h"
+#include "handset/phone/commands.h"
 
 #include <fcntl.h>
-#include <fmt/format.h>
 #include <poll.h>
 #include <sys/syscall.h>
 #include <unistd.h>
@@ -11,58 +11,67 @@
 #include <cerrno>
 #include <chrono>
 #include <csignal>
+#include <cstdlib>
 #include <cstring>
+
+#include <android-base/unique_fd.h>
+#include <fmt/format.h>
 #include <nlohmann/json.hpp>
 
-#include "phone/control_client.h"
-#include "phone/fault_words.h"
-#include "phone/phone_state.h"
-#include "phone/phone_up.h"
-#include "phone/process.h"
-#include "phone/supervisor.h"
-#include "phone/text_file.h"
+#include "handset/driver/printable.h"
+#include "handset/phone/control_client.h"
+#include "handset/phone/fault_arguments.h"
+#include "handset/phone/phone_state.h"
+#include "handset/phone/phone_up.h"
+#include "handset/phone/process.h"
+#include "handset/phone/supervisor.h"
+#include "handset/phone/text_file.h"
 
 namespace handset {
 namespace {
 
+using android::base::Result;
+using android::base::unique_fd;
+
 constexpr int kNotWell = 1;
 constexpr int kRefused = 2;
-constexpr const char* kDownText = "no phone is up; \"phone up\" starts one";
+
+// Sends a request to the driver of the phone that is up and prints its answer, if it has one.
+int request(const std::string& line) {
+    if (!phoneThatIsUp()) return failWith(kRefused, kDownText);
+    const Result<std::string> answer = askDriver(kControlSocket, line);
+    return answer ? 0 : failWith(kRefused, answer.error().message());
+}
+
+// Waits until the process has ended, or `milliseconds` have passed. False when it runs on.
+bool waitForEnd(pid_t pid, int milliseconds) {
+    const unique_fd handle(static_cast<int>(syscall(SYS_pidfd_open, pid, 0)));
+    if (!handle.ok()) return true;
+    pollfd polled{handle.get(), POLLIN, 0};
+    return poll(&polled, 1, milliseconds) > 0;
+}
+
+// One fault with what became of it: "motor upload errno=EIO delay=20 ms: struck 1 of 3 calls".
+std::string faultText(const nlohmann::ordered_json& fault) {
+    std::string text = fmt::format("{} {}", fault.value("node", ""), fault.value("op", ""));
+    for (const auto& [key, value] : fault.items()) {
+        if (key == "node" || key == "op" || key == "seen" || key == "struck") continue;
+        text += fmt::format(" {}={}{}", key,
+                            value.is_string() ? value.get<std::string>() : value.dump(),
+                            key == "delay"   ? " ms"
+                            : key == "short" ? " bytes"
+                                             : "");
+    }
+    return printable(fmt::format("{}: struck {} of {} calls", text, fault.value("struck", 0),
+                                 fault.value("seen", 0)));
+}
+
+}  // namespace
 
 std::optional<PhoneState> phoneThatIsUp() {
     if (!isPhoneLocked()) return std::nullopt;
     return loadState();
 }
-
-/// Sends a request to the driver of the phone that is up and prints its answer, if it has one.
-int request(const std::string& line) {
-    if (!phoneThatIsUp()) return failWith(kRefused, kDownText);
-    const Result<std::string> answer = askDriver(kControlSocket, line);
-    return answer ? 0 : failWith(kRefused, answer.error().text);
-}
-
-int printFile(const std::string& path) {
-    const std::optional<std::string> text = readTextFile(path);
-    if (!text) return failWith(kRefused, fmt::format("{}: {}", path, strerror(errno)));
-    fwrite(text->data(), 1, text->size(), stdout);
-    return 0;
-}
-
-std::string outFolder(const std::string& given) {
-    if (!given.empty()) return given;
-    const std::optional<PhoneState> state = loadState();
-    return state ? state->out : kDefaultOut;
-}
-
-/// Waits until the process has ended, or `milliseconds` have passed. False when it runs on.
-bool waitForEnd(pid_t pid, int milliseconds) {
-    const UniqueFd handle(static_cast<int>(syscall(SYS_pidfd_open, pid, 0)));
-    if (!handle) return true;
-    pollfd polled{handle.get(), POLLIN, 0};
-    return poll(&polled, 1, milliseconds) > 0;
-}
-
-}  // namespace
 
 int phoneDown() {
     if (geteuid() != 0) return failWith(kRefused, "taking a phone down takes root");
@@ -94,31 +103,11 @@ int phoneDown() {
     }
 }
 
-int phoneStatus() {
-    const std::optional<PhoneState> state = phoneThatIsUp();
-    if (!state) {
-        fmt::print("phone is down\n");
-        return kNotWell;
-    }
-    fmt::print("phone is up: profile {}, ", state->profile);
-    if (state->serviceStatus) {
-        fmt::print("{}\n", serviceEndText(*state));
-        return kNotWell;
-    }
-    if (state->service == 0) {
-        fmt::print("no service\n");
-    } else if (state->registered) {
-        fmt::print("service registered, pid {}\n", state->service);
-    } else {
-        fmt::print("service starting, pid {}\n", state->service);
-    }
-    return 0;
-}
-
 int phoneReset() {
     const std::optional<PhoneState> state = phoneThatIsUp();
     if (!state) return failWith(kRefused, kDownText);
-    for (const std::string& log : {state->serviceLog(), state->serviceOutput()}) {
+    (void)askDriver(kSupervisorSocket, "log");
+    for (const std::string& log : {state->serviceLog(), state->serviceOutput(), state->calls()}) {
         if (truncate(log.c_str(), 0) != 0 && errno != ENOENT) {
             return failWith(kRefused, fmt::format("{}: {}", log, strerror(errno)));
         }
@@ -127,13 +116,31 @@ int phoneReset() {
 }
 
 int phoneFault(const std::vector<std::string>& words) {
-    const Result<std::string> fault = faultFromWords(words);
-    if (!fault) return failWith(kRefused, fault.error().text);
+    const Result<std::string> fault = faultFromArguments(words);
+    if (!fault) return failWith(kRefused, fault.error().message());
     return request("fault " + *fault);
 }
 
 int phoneClearFaults() {
     return request("clear");
+}
+
+int phoneListFaults(bool json) {
+    if (!phoneThatIsUp()) return failWith(kRefused, kDownText);
+    const Result<std::string> answer = askDriver(kControlSocket, "faults");
+    if (!answer) return failWith(kRefused, answer.error().message());
+    if (json) {
+        fmt::print("{}\n", *answer);
+        return 0;
+    }
+    for (const auto& fault : nlohmann::ordered_json::parse(*answer, nullptr, false)) {
+        fmt::print("{}\n", faultText(fault));
+    }
+    return 0;
+}
+
+int phonePlug(bool plugIn, const std::string& node, unsigned after) {
+    return request(fmt::format("{} {} {}", plugIn ? "plug" : "unplug", node, after));
 }
 
 int phoneNode(const std::string& path, const std::optional<std::string>& text) {
@@ -145,7 +152,7 @@ int phoneNode(const std::string& path, const std::optional<std::string>& text) {
     }
     if (!phoneThatIsUp()) return failWith(kRefused, kDownText);
     const Result<std::string> answer = askDriver(kControlSocket, "get " + path);
-    if (!answer) return failWith(kRefused, answer.error().text);
+    if (!answer) return failWith(kRefused, answer.error().message());
     const nlohmann::json value = nlohmann::json::parse(*answer, nullptr, false);
     if (!value.is_string()) {
         fmt::print("{}\n", *answer);  // not text: its bytes in hexadecimal
@@ -156,33 +163,26 @@ int phoneNode(const std::string& path, const std::optional<std::string>& text) {
     return 0;
 }
 
-int phonePrintJournal(const std::string& out) {
-    // A phone that is down has settled; one that does not answer still has a journal.
-    if (phoneThatIsUp()) (void)askDriver(kControlSocket, "settle");
-    return printFile(outFolder(out) + "/journal.jsonl");
-}
-
-int phonePrintLog(const std::string& out) {
-    return printFile(outFolder(out) + "/service.log");
-}
-
 int phoneExec(std::optional<unsigned> user, const std::vector<std::string>& command) {
     const std::optional<PhoneState> state = phoneThatIsUp();
     if (!state) return failWith(kRefused, kDownText);
-    const UniqueFd mounts(
+    const unique_fd mounts(
             open(fmt::format("/proc/{}/ns/mnt", state->driver).c_str(), O_RDONLY | O_CLOEXEC));
-    if (!mounts) return failWith(kRefused, fmt::format("the driver: {}", strerror(errno)));
+    if (!mounts.ok()) return failWith(kRefused, fmt::format("the driver: {}", strerror(errno)));
     std::vector<char*> arguments;
     arguments.reserve(command.size() + 1);
     for (const std::string& word : command) arguments.push_back(const_cast<char*>(word.c_str()));
     arguments.push_back(nullptr);
-    // Entering moves to the root folder; a relative path in the command is still meant from here.
-    const UniqueFd here(open(".", O_PATH | O_DIRECTORY | O_CLOEXEC));
+    // Entering moves to the root directory; a relative path in the command is still meant from here.
+    const unique_fd here(open(".", O_PATH | O_DIRECTORY | O_CLOEXEC));
     Launch launch;
     launch.mounts = mounts.get();
     if (user) launch.user = *user;
-    if (auto failure = becomeWhatLaunchAsks(launch)) return failWith(kRefused, failure->text);
-    if (here && fchdir(here.get()) != 0) errno = 0;  // stay at the root
+    if (auto done = becomeWhatLaunchAsks(launch); !done)
+        return failWith(kRefused, done.error().message());
+    if (here.ok() && fchdir(here.get()) != 0) errno = 0;  // stay at the root
+    // Where a client notes its calls, unless whoever runs it has said so.
+    setenv("VIBCTL_CALLS", state->calls().c_str(), 0);
     execvp(arguments[0], arguments.data());
     return failWith(errno == ENOENT ? 127 : 126,
                     fmt::format("{}: {}", command[0], strerror(errno)));

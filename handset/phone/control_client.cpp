@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Asking the running driver for something.
-#include "phone/control_client.h"
+#include "handset/phone/control_client.h"
 
-#include <fmt/format.h>
 #include <sys/socket.h>
 #include <sys/time.h>
 #include <sys/un.h>
@@ -11,28 +11,34 @@
 #include <cerrno>
 #include <cstring>
 
-#include "common/unique_fd.h"
+#include <android-base/unique_fd.h>
+#include <fmt/format.h>
 
 namespace handset {
 namespace {
 
-constexpr timeval kPatience{5, 0};
+using android::base::Error;
+using android::base::Result;
+using android::base::ResultError;
+using android::base::unique_fd;
 
-Error noAnswer() {
-    return Error{fmt::format("the driver does not answer: {}", strerror(errno))};
+constexpr timeval kTimeout{5, 0};
+
+ResultError noAnswer() {
+    return {fmt::format("the driver does not answer: {}", strerror(errno)), errno};
 }
 
 }  // namespace
 
 Result<std::string> askDriver(const std::string& socketPath, std::string_view request) {
     if (request.find('\n') != std::string_view::npos) {
-        return Error{"a request is one line"};
+        return Error() << "a request is one line";
     }
-    const UniqueFd socket(::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0));
+    const unique_fd socket(::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0));
     sockaddr_un address{};
     address.sun_family = AF_UNIX;
     socketPath.copy(address.sun_path, sizeof address.sun_path - 1);
-    setsockopt(socket.get(), SOL_SOCKET, SO_RCVTIMEO, &kPatience, sizeof kPatience);
+    setsockopt(socket.get(), SOL_SOCKET, SO_RCVTIMEO, &kTimeout, sizeof kTimeout);
     if (connect(socket.get(), reinterpret_cast<sockaddr*>(&address), sizeof address) != 0) {
         return noAnswer();
     }
@@ -47,12 +53,12 @@ Result<std::string> askDriver(const std::string& socketPath, std::string_view re
         const ssize_t size = recv(socket.get(), part.data(), part.size(), 0);
         if (size < 0 && errno == EINTR) continue;
         if (size < 0) return noAnswer();
-        if (size == 0) return Error{"the driver ended before it answered"};
+        if (size == 0) return Error() << "the driver ended before it answered";
         answer.append(part.data(), static_cast<size_t>(size));
     }
     answer.pop_back();
     constexpr std::string_view kRefused = "error ";
-    if (answer.starts_with(kRefused)) return Error{answer.substr(kRefused.size())};
+    if (answer.starts_with(kRefused)) return Error() << answer.substr(kRefused.size());
     return answer.size() > 3 ? answer.substr(3) : std::string();
 }
 

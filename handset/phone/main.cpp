@@ -1,9 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The phone tool: brings a simulated phone up inside the handset, asks it for things, and takes it
 // down.
-#include <fmt/format.h>
-
-#include <CLI/CLI.hpp>
 #include <cstdio>
 #include <exception>
 #include <functional>
@@ -12,8 +10,11 @@
 #include <string>
 #include <vector>
 
-#include "phone/commands.h"
-#include "phone/phone_up.h"
+#include <CLI/CLI.hpp>
+#include <fmt/format.h>
+
+#include "handset/phone/commands.h"
+#include "handset/phone/phone_up.h"
 
 namespace handset {
 namespace {
@@ -26,6 +27,9 @@ constexpr const char* kHelp = R"(A simulated phone: driver, service manager and 
   phone exec --user 1000 -- sh      look at its nodes, as the user its service runs as
   phone fault node=/sys/class/leds/vibrator/duration op=write errno=EIO times=1
   phone journal                     what the driver saw, one JSON object a line
+  phone journal --pretty --follow   calls, driver and log in words, as it happens
+  phone unplug --after 300          the motor goes away in 300 milliseconds
+  phone service kill                the service dies; it starts again as its init script says
   phone down                        take it down
 
 Exit status: 0 done, 1 the service is not well, 2 wrong usage or not possible.)";
@@ -34,14 +38,18 @@ struct Arguments {
     UpOptions up;
     std::vector<std::string> faultWords;
     bool clearFaults = false;
-    std::string node;
+    bool listFaults = false;
+    bool json = false;
+    std::string action;
+    std::string node = "motor";
+    unsigned after = 0;
     std::string nodeText;
-    std::string out;
+    ListingOptions listing;
     unsigned user = 0;
     std::vector<std::string> command;
 };
 
-/// Adds a command; what it does runs after the whole line has been understood.
+// Adds a command; what it does runs after the whole line has been understood.
 CLI::App* addCommand(CLI::App& app, std::function<int()>& chosen, const char* name,
                      const char* help, const std::function<int()>& action) {
     CLI::App* command = app.add_subcommand(name, help);
@@ -53,23 +61,62 @@ void addUp(CLI::App& app, std::function<int()>& chosen, UpOptions& options) {
     CLI::App* up = addCommand(app, chosen, "up", "bring a phone up",
                               [&options] { return phoneUp(options); });
     up->add_option("--profile", options.profile, "which phone: a built-in profile, or a file");
-    up->add_option("--out", options.out, "folder for the journal and the logs");
+    up->add_option("--out", options.out, "directory for the journal and the logs");
     up->add_option("--service", options.service, "another build of the service")
             ->envname("PHONE_SERVICE");
     up->add_flag("--no-service", options.noService, "driver and service manager only");
 }
 
 void addFault(CLI::App& app, std::function<int()>& chosen, Arguments& arguments) {
-    CLI::App* fault = addCommand(app, chosen, "fault", "add a fault, or forget all", [&arguments] {
-        return arguments.clearFaults ? phoneClearFaults() : phoneFault(arguments.faultWords);
-    });
+    CLI::App* fault = addCommand(
+            app, chosen, "fault", "add a fault, list all with how often each struck, or forget all",
+            [&arguments] {
+                if (arguments.listFaults) return phoneListFaults(arguments.json);
+                return arguments.clearFaults ? phoneClearFaults()
+                                             : phoneFault(arguments.faultWords);
+            });
     CLI::Option* words = fault->add_option(
             "SPEC", arguments.faultWords, "a JSON object, or node=PATH op=write errno=EIO times=1");
     CLI::Option* clear = fault->add_flag("--clear", arguments.clearFaults, "forget all faults");
-    clear->excludes(words);
-    fault->parse_complete_callback([fault, words, clear] {
-        if (words->count() + clear->count() == 0) throw CLI::RequiredError("SPEC or --clear");
+    CLI::Option* list = fault->add_flag("--list", arguments.listFaults, "print all faults");
+    fault->add_flag("--json", arguments.json, "the list as JSON")->needs(list);
+    clear->excludes(words)->excludes(list);
+    list->excludes(words);
+    fault->parse_complete_callback([words, clear, list] {
+        if (words->count() + clear->count() + list->count() == 0) {
+            throw CLI::RequiredError("SPEC, --list or --clear");
+        }
     });
+}
+
+void addPlug(CLI::App& app, std::function<int()>& chosen, Arguments& arguments, bool plugIn) {
+    CLI::App* plug = addCommand(
+            app, chosen, plugIn ? "plug" : "unplug",
+            plugIn ? "bring the motor, or a node, back" : "take the motor, or a node, away",
+            [&arguments, plugIn] { return phonePlug(plugIn, arguments.node, arguments.after); });
+    plug->add_option("NODE", arguments.node, "a node's path (default: motor)");
+    plug->add_option("--after", arguments.after, "milliseconds from now")
+            ->check(CLI::Range(0, 3600000));
+}
+
+void addService(CLI::App& app, std::function<int()>& chosen, Arguments& arguments) {
+    CLI::App* service =
+            addCommand(app, chosen, "service", "stop, start, restart or kill the service",
+                       [&arguments] { return phoneService(arguments.action); });
+    service->add_option("ACTION", arguments.action, "stop, start, restart or kill")
+            ->required()
+            ->check(CLI::IsMember({"stop", "start", "restart", "kill"}));
+}
+
+// What the journal and the log have in common.
+CLI::App* addListing(CLI::App& app, std::function<int()>& chosen, const char* name,
+                     const char* help, ListingOptions& options,
+                     int (*print)(const ListingOptions&)) {
+    CLI::App* command =
+            addCommand(app, chosen, name, help, [&options, print] { return print(options); });
+    command->add_option("--out", options.out, "its directory, where no phone is up");
+    command->add_flag("--follow", options.follow, "go on while the phone is up");
+    return command;
 }
 
 void addNode(CLI::App& app, std::function<int()>& chosen, Arguments& arguments) {
@@ -106,16 +153,20 @@ int parseAndRun(int argc, char** argv) {
     app.require_subcommand(1);
     addUp(app, chosen, arguments.up);
     addCommand(app, chosen, "down", "take it down", phoneDown);
-    addCommand(app, chosen, "status", "say whether one is up", phoneStatus);
-    addCommand(app, chosen, "reset", "empty the journal and the service's log", phoneReset);
+    addCommand(app, chosen, "status", "say what runs and what clients find", [&arguments] {
+        return phoneStatus(arguments.json);
+    })->add_flag("--json", arguments.json, "as one JSON object");
+    addService(app, chosen, arguments);
+    addCommand(app, chosen, "reset", "empty the journal, the service's log and the calls",
+               phoneReset);
     addFault(app, chosen, arguments);
     addNode(app, chosen, arguments);
-    addCommand(app, chosen, "journal", "print what the driver saw", [&arguments] {
-        return phonePrintJournal(arguments.out);
-    })->add_option("--out", arguments.out, "its folder, where no phone is up");
-    addCommand(app, chosen, "log", "print the service's log", [&arguments] {
-        return phonePrintLog(arguments.out);
-    })->add_option("--out", arguments.out, "its folder, where no phone is up");
+    addPlug(app, chosen, arguments, false);
+    addPlug(app, chosen, arguments, true);
+    addListing(app, chosen, "journal", "print what the driver saw", arguments.listing, phoneJournal)
+            ->add_flag("--pretty", arguments.listing.pretty,
+                       "in words, with calls, answers and log lines, in order of time");
+    addListing(app, chosen, "log", "print the service's log", arguments.listing, phoneLog);
     addExec(app, chosen, arguments);
     try {
         app.parse(argc, argv);

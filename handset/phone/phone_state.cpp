@@ -1,18 +1,23 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // What is known about the phone that is up.
-#include "phone/phone_state.h"
+#include "handset/phone/phone_state.h"
 
 #include <fcntl.h>
 #include <sys/file.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <android-base/file.h>
 #include <nlohmann/json.hpp>
 
-#include "phone/text_file.h"
+#include "handset/phone/text_file.h"
 
 namespace handset {
 namespace {
+
+using android::base::Result;
+using android::base::unique_fd;
 
 using Json = nlohmann::json;
 
@@ -25,20 +30,22 @@ bool isSameFile(int fd, const char* path) {
 
 }  // namespace
 
-Failure saveState(const PhoneState& state) {
+Result<void> saveState(const PhoneState& state) {
     Json json{{"profile", state.profile},       {"out", state.out},
               {"supervisor", state.supervisor}, {"driver", state.driver},
               {"manager", state.manager},       {"service", state.service},
-              {"registered", state.registered}, {"made", state.made}};
+              {"registered", state.registered}, {"made", state.made},
+              {"stopped", state.stopped},       {"starts", state.starts},
+              {"restart_at", state.restartAt}};
     if (state.serviceStatus) json["service_status"] = *state.serviceStatus;
     return replaceTextFile(kStateFile,
                            json.dump(2, ' ', false, Json::error_handler_t::replace) + "\n");
 }
 
 std::optional<PhoneState> loadState() {
-    const std::optional<std::string> text = readTextFile(kStateFile);
-    if (!text) return std::nullopt;
-    const Json json = Json::parse(*text, nullptr, false);
+    std::string text;
+    if (!android::base::ReadFileToString(kStateFile, &text)) return std::nullopt;
+    const Json json = Json::parse(text, nullptr, false);
     if (!json.is_object()) return std::nullopt;
     PhoneState state;
     try {
@@ -49,6 +56,9 @@ std::optional<PhoneState> loadState() {
         state.manager = json.value("manager", 0);
         state.service = json.value("service", 0);
         state.registered = json.value("registered", false);
+        state.stopped = json.value("stopped", false);
+        state.starts = json.value("starts", 0);
+        state.restartAt = json.value("restart_at", int64_t{0});
         if (json.contains("service_status")) state.serviceStatus = json["service_status"];
         state.made = json.value("made", std::vector<std::string>());
     } catch (const Json::exception&) {
@@ -63,8 +73,8 @@ void removeState() {
 
 std::optional<PhoneLock> PhoneLock::tryTake() {
     while (true) {
-        UniqueFd file(open(kLockFile, O_RDWR | O_CREAT | O_CLOEXEC, 0644));
-        if (!file || flock(file.get(), LOCK_EX | LOCK_NB) != 0) return std::nullopt;
+        unique_fd file(open(kLockFile, O_RDWR | O_CREAT | O_CLOEXEC, 0644));
+        if (!file.ok() || flock(file.get(), LOCK_EX | LOCK_NB) != 0) return std::nullopt;
         // The last holder may have removed the file between the two calls.
         if (isSameFile(file.get(), kLockFile)) return PhoneLock(std::move(file));
     }
@@ -72,12 +82,12 @@ std::optional<PhoneLock> PhoneLock::tryTake() {
 
 void PhoneLock::unlock() {
     unlink(kLockFile);
-    file_.reset();
+    mFile.reset();
 }
 
 bool isPhoneLocked() {
-    const UniqueFd file(open(kLockFile, O_RDONLY | O_CLOEXEC));
-    return file && flock(file.get(), LOCK_SH | LOCK_NB) != 0;
+    const unique_fd file(open(kLockFile, O_RDONLY | O_CLOEXEC));
+    return file.ok() && flock(file.get(), LOCK_SH | LOCK_NB) != 0;
 }
 
 }  // namespace handset

@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // "phone up".
-#include "phone/phone_up.h"
+#include "handset/phone/phone_up.h"
 
 #include <fcntl.h>
-#include <fmt/format.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -18,50 +18,60 @@
 #include <system_error>
 #include <vector>
 
-#include "common/unique_fd.h"
-#include "driver/one_line.h"
-#include "driver/result.h"
-#include "phone/phone_state.h"
-#include "phone/supervisor.h"
-#include "phone/text_file.h"
+#include <android-base/result.h>
+#include <android-base/unique_fd.h>
+#include <fmt/format.h>
+
+#include "handset/driver/printable.h"
+#include "handset/phone/phone_state.h"
+#include "handset/phone/supervisor.h"
+#include "handset/phone/text_file.h"
 
 namespace handset {
 namespace {
 
+using android::base::Error;
+using android::base::Result;
+using android::base::unique_fd;
+
 namespace fs = std::filesystem;
 
 constexpr int kRefused = 2;
-constexpr const char* kProfiles = QVX_PROFILE_FOLDER;
+constexpr const char* kProfiles = QVX_PROFILE_DIRECTORY;
 constexpr const char* kBinder = "/dev/binder";
 constexpr const char* kServiceFile = "android.hardware.vibrator-service.quorvan";
+constexpr const char* kInitScript =
+        QVX_SERVICE_DIRECTORY "/android.hardware.vibrator-service.quorvan.rc";
 
 std::vector<std::string> builtInProfiles() {
     std::vector<std::string> names;
     std::error_code error;
     for (const auto& entry : fs::directory_iterator(kProfiles, error)) {
-        if (entry.path().extension() == ".json") names.push_back(entry.path().stem().string());
+        const fs::path name = entry.path().stem();  // the schema has one dot more
+        if (entry.path().extension() == ".json" && !name.has_extension()) names.push_back(name);
     }
     std::sort(names.begin(), names.end());
     return names;
 }
 
-/// The file of a profile given by name or by path.
+// The file of a profile given by name or by path.
 Result<std::string> findProfile(const std::string& profile) {
     if (profile.find('/') != std::string::npos || profile.ends_with(".json")) {
         if (access(profile.c_str(), R_OK) == 0) return fs::absolute(profile).string();
-        return Error{fmt::format("profile {}: {}", profile, strerror(errno))};
+        return Error() << fmt::format("profile {}: {}", profile, strerror(errno));
     }
     const std::vector<std::string> names = builtInProfiles();
     if (std::find(names.begin(), names.end(), profile) == names.end()) {
-        return Error{fmt::format("no profile named \"{}\"; there are {}, or give a file's path",
-                                 profile, fmt::join(names, ", "))};
+        return Error() << fmt::format(
+                       "no profile named \"{}\"; there are {}, or give a file's path", profile,
+                       fmt::join(names, ", "));
     }
     return fmt::format("{}/{}.json", kProfiles, profile);
 }
 
 Result<std::string> findExecutable(const std::string& path) {
     if (access(path.c_str(), X_OK) == 0) return fs::absolute(path).string();
-    return Error{fmt::format("{}: {}; build it first", path, strerror(errno))};
+    return Error() << fmt::format("{}: {}; build it first", path, strerror(errno));
 }
 
 Result<PhonePlan> makePlan(const UpOptions& options) {
@@ -70,7 +80,7 @@ Result<PhonePlan> makePlan(const UpOptions& options) {
     PhonePlan plan;
     plan.profileName = options.profile;
     plan.out = fs::absolute(options.out).string();
-    const Result<std::string> profile = findProfile(options.profile);
+    Result<std::string> profile = findProfile(options.profile);
     if (!profile) return profile.error();
     plan.profilePath = *profile;
     const std::string service =
@@ -81,20 +91,25 @@ Result<PhonePlan> makePlan(const UpOptions& options) {
     };
     std::vector<Part> parts{{here / "handset-driver", &plan.driver},
                             {here / "servicemanager", &plan.manager}};
-    if (!options.noService) parts.push_back({service, &plan.service});
+    if (!options.noService) {
+        parts.push_back({service, &plan.service});
+        Result<InitScript> init = readInitScript(kInitScript);
+        if (!init) return init.error();
+        plan.init = *init;
+    }
     for (const Part& part : parts) {
-        const Result<std::string> found = findExecutable(part.path);
+        Result<std::string> found = findExecutable(part.path);
         if (!found) return found.error();
         *part.found = *found;
     }
     return plan;
 }
 
-/// The supervisor's life, in a process of its own that keeps nothing of the terminal.
-[[noreturn]] void supervise(PhonePlan plan, UniqueFd starter, PhoneLock lock) {
+// The supervisor's life, in a process of its own that keeps nothing of the terminal.
+[[noreturn]] void supervise(PhonePlan plan, unique_fd starter, PhoneLock lock) {
     setsid();
     if (chdir("/") != 0) _exit(1);
-    const UniqueFd nothing(open("/dev/null", O_RDWR | O_CLOEXEC));
+    const unique_fd nothing(open("/dev/null", O_RDWR | O_CLOEXEC));
     for (const int fd : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO}) dup2(nothing.get(), fd);
     Supervisor(std::move(plan), std::move(starter)).run();
     lock.unlock();
@@ -117,8 +132,8 @@ UpReport readReport(int fd) {
 UpReport startSupervisor(PhonePlan plan, PhoneLock lock) {
     std::array<int, 2> ends{};
     if (pipe2(ends.data(), O_CLOEXEC) != 0) return {kRefused, strerror(errno)};
-    UniqueFd readEnd(ends[0]);
-    UniqueFd writeEnd(ends[1]);
+    unique_fd readEnd(ends[0]);
+    unique_fd writeEnd(ends[1]);
     const pid_t pid = fork();
     if (pid < 0) return {kRefused, strerror(errno)};
     if (pid == 0) {
@@ -132,7 +147,7 @@ UpReport startSupervisor(PhonePlan plan, PhoneLock lock) {
 }  // namespace
 
 int failWith(int status, std::string text) {
-    fmt::print(stderr, "phone: {}\n", oneLine(std::move(text)));
+    fmt::print(stderr, "phone: {}\n", printable(std::move(text)));
     return status;
 }
 
@@ -144,7 +159,7 @@ int phoneUp(const UpOptions& options) {
                         "handset, see handset/shell");
     }
     Result<PhonePlan> plan = makePlan(options);
-    if (!plan) return failWith(kRefused, plan.error().text);
+    if (!plan) return failWith(kRefused, plan.error().message());
     std::optional<PhoneLock> lock = PhoneLock::tryTake();
     if (!lock) {
         const std::optional<PhoneState> other = loadState();
@@ -153,9 +168,11 @@ int phoneUp(const UpOptions& options) {
                                     other ? other->profile : "unknown"));
     }
     if (const std::optional<PhoneState> left = loadState()) cleanUpAfter(*left);
-    if (auto failure = makeFolders(plan->out)) {
+    std::error_code error;
+    fs::create_directories(plan->out, error);
+    if (error) {
         lock->unlock();
-        return failWith(kRefused, failure->text);
+        return failWith(kRefused, fmt::format("{}: {}", plan->out, error.message()));
     }
     // Clients of every user open it, as on a phone.
     if (chmod(kBinder, 0666) != 0) {

@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Starting a process and waiting for its end.
-#include "phone/process.h"
+#include "handset/phone/process.h"
 
 #include <fcntl.h>
-#include <fmt/format.h>
 #include <grp.h>
 #include <poll.h>
 #include <sched.h>
@@ -18,16 +18,19 @@
 #include <csignal>
 #include <cstring>
 
+#include <fmt/format.h>
+
 namespace handset {
 namespace {
+
+using android::base::ErrnoError;
+using android::base::Error;
+using android::base::Result;
+using android::base::unique_fd;
 
 constexpr uid_t kSystemUser = 1000;
 constexpr std::array<gid_t, 3> kSystemGroups = {1000 /* system */, 1004 /* input */,
                                                 1007 /* log */};
-
-Error systemError(std::string_view what) {
-    return Error{fmt::format("{}: {}", what, strerror(errno))};
-}
 
 int openHandle(pid_t pid) {
     return static_cast<int>(syscall(SYS_pidfd_open, pid, 0));
@@ -38,7 +41,7 @@ bool waitReadable(int fd, int milliseconds) {
     return poll(&polled, 1, milliseconds) > 0;
 }
 
-/// Undoes what the parent changed for itself: blocked signals and ignored ones.
+// Undoes what the parent changed for itself: blocked signals and ignored ones.
 void resetSignals() {
     sigset_t none;
     sigemptyset(&none);
@@ -46,19 +49,19 @@ void resetSignals() {
     signal(SIGPIPE, SIG_DFL);
 }
 
-/// Ends with the parent. Set after the change of user, which would clear it.
+// Ends with the parent. Set after the change of user, which would clear it.
 void endWith(pid_t parent) {
     prctl(PR_SET_PDEATHSIG, SIGKILL);
     if (getppid() != parent) _exit(1);
 }
 
-/// What a child does up to its new program; returns only when that cannot be run.
-Error execute(const Launch& launch, pid_t parent) {
+// What a child does up to its new program; returns only when that cannot be run.
+std::string execute(const Launch& launch, pid_t parent) {
     resetSignals();
     if (launch.output >= 0) dup2(launch.output, STDOUT_FILENO);
     if (launch.errors >= 0) dup2(launch.errors, STDERR_FILENO);
     if (launch.kept >= 0) fcntl(launch.kept, F_SETFD, 0);
-    if (auto failure = becomeWhatLaunchAsks(launch)) return *failure;
+    if (auto done = becomeWhatLaunchAsks(launch); !done) return done.error().message();
     endWith(parent);
     std::vector<char*> arguments;
     arguments.reserve(launch.command.size() + 1);
@@ -67,16 +70,16 @@ Error execute(const Launch& launch, pid_t parent) {
     }
     arguments.push_back(nullptr);
     execv(arguments[0], arguments.data());
-    return systemError(launch.command[0]);
+    return fmt::format("{}: {}", launch.command[0], strerror(errno));
 }
 
 }  // namespace
 
-Failure becomeWhatLaunchAsks(const Launch& launch) {
+Result<void> becomeWhatLaunchAsks(const Launch& launch) {
     if (launch.mounts >= 0 && setns(launch.mounts, CLONE_NEWNS) != 0) {
-        return systemError("the phone's mount namespace");
+        return ErrnoError() << "the phone's mount namespace";
     }
-    if (!launch.user || *launch.user == 0) return std::nullopt;
+    if (!launch.user || *launch.user == 0) return {};
     const bool system = *launch.user == kSystemUser;
     // As the phone's init does for everybody: binder hands a caller's priority on to the one who
     // serves it, and complains where it may not.
@@ -87,22 +90,22 @@ Failure becomeWhatLaunchAsks(const Launch& launch) {
     if (setgroups(system ? kSystemGroups.size() : 0, kSystemGroups.data()) != 0 ||
         setresgid(*launch.user, *launch.user, *launch.user) != 0 ||
         setresuid(*launch.user, *launch.user, *launch.user) != 0) {
-        return systemError(fmt::format("user {}", *launch.user));
+        return ErrnoError() << fmt::format("user {}", *launch.user);
     }
-    return std::nullopt;
+    return {};
 }
 
 Result<Child> Child::start(const Launch& launch) {
     std::array<int, 2> ends{};
-    if (pipe2(ends.data(), O_CLOEXEC) != 0) return systemError("pipe");
-    UniqueFd readEnd(ends[0]);
-    UniqueFd writeEnd(ends[1]);
+    if (pipe2(ends.data(), O_CLOEXEC) != 0) return ErrnoError() << "pipe";
+    unique_fd readEnd(ends[0]);
+    unique_fd writeEnd(ends[1]);
     const pid_t parent = getpid();
     const pid_t pid = ::fork();
-    if (pid < 0) return systemError("fork");
+    if (pid < 0) return ErrnoError() << "fork";
     if (pid == 0) {
-        const Error error = execute(launch, parent);
-        if (write(writeEnd.get(), error.text.data(), error.text.size()) < 0) _exit(126);
+        const std::string error = execute(launch, parent);
+        if (write(writeEnd.get(), error.data(), error.size()) < 0) _exit(126);
         _exit(127);
     }
     writeEnd.reset();
@@ -110,40 +113,40 @@ Result<Child> Child::start(const Launch& launch) {
     const ssize_t size = read(readEnd.get(), text.data(), text.size());
     if (size > 0) {
         waitpid(pid, nullptr, 0);
-        return Error{std::string(text.data(), static_cast<size_t>(size))};
+        return Error() << std::string(text.data(), static_cast<size_t>(size));
     }
-    return Child(pid, UniqueFd(openHandle(pid)));
+    return Child(pid, unique_fd(openHandle(pid)));
 }
 
 Result<Child> Child::fork(const std::function<int()>& work) {
     const pid_t parent = getpid();
     const pid_t pid = ::fork();
-    if (pid < 0) return systemError("fork");
+    if (pid < 0) return ErrnoError() << "fork";
     if (pid == 0) {
         resetSignals();
         endWith(parent);
         _exit(work());
     }
-    return Child(pid, UniqueFd(openHandle(pid)));
+    return Child(pid, unique_fd(openHandle(pid)));
 }
 
 std::optional<int> Child::poll() {
-    if (status_) return status_;
+    if (mStatus) return mStatus;
     int status = 0;
-    if (waitpid(pid_, &status, WNOHANG) != pid_) return std::nullopt;
-    status_ = WIFSIGNALED(status) ? 128 + WTERMSIG(status) : WEXITSTATUS(status);
-    return status_;
+    if (waitpid(mPid, &status, WNOHANG) != mPid) return std::nullopt;
+    mStatus = WIFSIGNALED(status) ? 128 + WTERMSIG(status) : WEXITSTATUS(status);
+    return mStatus;
 }
 
-void Child::await(int patience) const {
-    waitReadable(handle_.get(), patience);
+void Child::await(int timeout) const {
+    waitReadable(mHandle.get(), timeout);
 }
 
-void Child::end(int patience) {
+void Child::end(int timeout) {
     if (poll()) return;
-    kill(pid_, SIGTERM);
-    if (!waitReadable(handle_.get(), patience)) kill(pid_, SIGKILL);
-    waitReadable(handle_.get(), -1);
+    kill(mPid, SIGTERM);
+    if (!waitReadable(mHandle.get(), timeout)) kill(mPid, SIGKILL);
+    waitReadable(mHandle.get(), -1);
     poll();
 }
 

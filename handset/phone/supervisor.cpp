@@ -1,15 +1,16 @@
 // SPDX-License-Identifier: Apache-2.0
-// The process that stands behind a phone.
-#include "phone/supervisor.h"
+//
+// The process that runs a phone.
+#include "handset/phone/supervisor.h"
 
 #include <fcntl.h>
-#include <fmt/format.h>
 #include <poll.h>
 #include <sys/prctl.h>
 #include <sys/signalfd.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
 #include <csignal>
@@ -17,12 +18,19 @@
 #include <initializer_list>
 #include <utility>
 
-#include "phone/binder_probe.h"
-#include "phone/text_file.h"
-#include "phone/vintf_fragments.h"
+#include <android-base/strings.h>
+#include <fmt/format.h>
+
+#include "handset/phone/registration.h"
+#include "handset/phone/text_file.h"
+#include "handset/phone/vintf_fragments.h"
 
 namespace handset {
 namespace {
+
+using android::base::ErrnoError;
+using android::base::Result;
+using android::base::unique_fd;
 
 using std::chrono::milliseconds;
 using std::chrono::seconds;
@@ -32,27 +40,26 @@ constexpr int kServiceEnded = 1;
 constexpr int kNotStarted = 2;
 
 constexpr uid_t kSystemUser = 1000;
-constexpr std::string_view kServiceName = "android.hardware.vibrator.IVibrator/default";
 
-constexpr seconds kReadyPatience{20};
-constexpr seconds kServicePatience{60};  // emulation under the address sanitizer takes its time
-constexpr int kProbeFound = 0;
-constexpr int kProbeFailed = 1;
-constexpr int kEndPatience = 3000;  // milliseconds
+constexpr seconds kReadyTimeout{20};
+constexpr seconds kServiceTimeout{60};  // emulation under the address sanitizer takes its time
+constexpr int kEndTimeout = 3000;       // milliseconds
 
-UniqueFd openLog(const std::string& path) {
+unique_fd openLog(const std::string& path) {
     // Appending, so that "phone reset" may empty the file under its writer.
-    return UniqueFd(open(path.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_APPEND | O_CLOEXEC, 0644));
+    return unique_fd(open(path.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_APPEND | O_CLOEXEC, 0644));
 }
 
 std::string withLastLine(std::string text, const std::string& log) {
-    const std::string line = lastLineOf(log);
+    std::string line = lastLineOf(log);
+    line.erase(0, line.find_first_not_of("0123456789"));  // the time
+    line = android::base::Trim(line);
     return line.empty() ? text : fmt::format("{}: {}", text, line);
 }
 
-/// How a server ended before it was ready. Both end with a line of their own that says why.
+// How a server ended before it was ready. Both end with a line of their own that says why.
 std::string endOf(std::string_view what, Child& child, const std::string& log) {
-    child.end(kEndPatience);
+    child.end(kEndTimeout);
     std::string line = lastLineOf(log);
     if (line.empty()) return fmt::format("the {} exited with status {}", what, *child.poll());
     constexpr std::string_view kOwnName = "handset-driver: ";
@@ -60,43 +67,27 @@ std::string endOf(std::string_view what, Child& child, const std::string& log) {
     return line;
 }
 
-/// Asks until the service is registered, or is no more; runs in a process of its own. SIGTERM ends
-/// it between two questions: one that is cut off would leave the manager's answer undelivered.
-int awaitService(bool registered) {
-    sigset_t end;
-    sigemptyset(&end);
-    sigaddset(&end, SIGTERM);
-    sigprocmask(SIG_BLOCK, &end, nullptr);
-    constexpr timespec kPause{0, 1000000};
-    BinderProbe probe;
-    if (!probe.isOpen()) return kProbeFailed;
-    while (probe.isRegistered(kServiceName) != registered) {
-        if (sigtimedwait(&end, nullptr, &kPause) == SIGTERM) return kProbeFailed;
-    }
-    return kProbeFound;
-}
-
 void endAll(std::initializer_list<std::optional<Child>*> children) {
     for (std::optional<Child>* child : children) {
-        if (*child) (*child)->end(kEndPatience);
+        if (*child) (*child)->end(kEndTimeout);
         child->reset();
     }
 }
 
 }  // namespace
 
-Supervisor::Supervisor(PhonePlan plan, UniqueFd starter)
-    : plan_(std::move(plan)), starter_(std::move(starter)) {
+Supervisor::Supervisor(PhonePlan plan, unique_fd starter)
+    : mPlan(std::move(plan)), mStarter(std::move(starter)) {
     sigset_t signals;
     sigemptyset(&signals);
     sigaddset(&signals, SIGTERM);
     sigaddset(&signals, SIGINT);
     sigprocmask(SIG_BLOCK, &signals, nullptr);
-    signals_.reset(signalfd(-1, &signals, SFD_CLOEXEC));
+    mSignals.reset(signalfd(-1, &signals, SFD_CLOEXEC));
     signal(SIGPIPE, SIG_IGN);
-    state_.profile = plan_.profileName;
-    state_.out = plan_.out;
-    state_.supervisor = getpid();
+    mState.profile = mPlan.profileName;
+    mState.out = mPlan.out;
+    mState.supervisor = getpid();
 }
 
 void Supervisor::run() {
@@ -104,38 +95,39 @@ void Supervisor::run() {
     if (up.status != kUp) takeDown();
     report(up);
     if (up.status != kUp) return;
-    watch();
+    if (listen()) watch();
     takeDown();
 }
 
 void Supervisor::report(const UpReport& report) {
     const std::string message = fmt::format("{}{}\n", report.status, report.text);
-    if (write(starter_.get(), message.data(), message.size()) < 0) errno = 0;  // nobody waits
-    starter_.reset();
+    if (write(mStarter.get(), message.data(), message.size()) < 0) errno = 0;  // nobody waits
+    mStarter.reset();
 }
 
 UpReport Supervisor::bringUp() {
-    if (auto failure = saveState(state_)) return {kNotStarted, failure->text};
+    if (auto done = saveState(mState); !done) return {kNotStarted, done.error().message()};
+    if (auto done = makeCalls(); !done) return {kNotStarted, done.error().message()};
     if (auto failed = startDriver()) return *failed;
     if (auto failed = startManager()) return *failed;
-    if (!plan_.service.empty()) {
+    if (!mPlan.service.empty()) {
         if (auto failed = startService()) return *failed;
         return awaitRegistration();
     }
-    if (auto failure = saveState(state_)) return {kNotStarted, failure->text};
-    return {kUp, fmt::format("phone is up: profile {}, no service", state_.profile)};
+    if (auto done = saveState(mState); !done) return {kNotStarted, done.error().message()};
+    return {kUp, fmt::format("phone is up: profile {}, no service", mState.profile)};
 }
 
-/// Starts a server that is told, by --ready-fd, where to write a line once it serves; `ready`
-/// becomes the other end.
+// Starts a server that is told, by --ready-fd, where to write a line once it serves; `ready`
+// becomes the other end.
 Result<Child> Supervisor::startServer(std::vector<std::string> command, const std::string& log,
-                                      UniqueFd& ready) {
+                                      unique_fd& ready) {
     std::array<int, 2> ends{};
-    if (pipe2(ends.data(), O_CLOEXEC) != 0) return Error{strerror(errno)};
+    if (pipe2(ends.data(), O_CLOEXEC) != 0) return ErrnoError();
     ready.reset(ends[0]);
-    const UniqueFd told(ends[1]);
-    const UniqueFd output = openLog(log);
-    if (!output) return Error{fmt::format("{}: {}", log, strerror(errno))};
+    const unique_fd told(ends[1]);
+    const unique_fd output = openLog(log);
+    if (!output.ok()) return ErrnoError() << log;
     command.insert(command.end(), {"--ready-fd", std::to_string(told.get())});
     return Child::start({.command = std::move(command),
                          .output = output.get(),
@@ -144,82 +136,101 @@ Result<Child> Supervisor::startServer(std::vector<std::string> command, const st
 }
 
 std::optional<UpReport> Supervisor::startDriver() {
-    UniqueFd ready;
-    Result<Child> driver = startServer({plan_.driver, "--profile", plan_.profilePath, "--journal",
-                                        state_.journal(), "--control", kControlSocket},
-                                       state_.driverLog(), ready);
-    if (!driver) return UpReport{kNotStarted, driver.error().text};
-    driver_ = std::move(*driver);
-    state_.driver = driver_->pid();
-    const Event event = wait(Clock::now() + kReadyPatience, ready.get());
+    unique_fd ready;
+    Result<Child> driver = startServer({mPlan.driver, "--profile", mPlan.profilePath, "--journal",
+                                        mState.journal(), "--control", kControlSocket},
+                                       mState.driverLog(), ready);
+    if (!driver) return UpReport{kNotStarted, driver.error().message()};
+    mDriver = std::move(*driver);
+    mState.driver = mDriver->pid();
+    const Event event = wait(Clock::now() + kReadyTimeout, ready.get());
     return event == Event::kReady ? std::nullopt : std::optional(notReady(event));
 }
 
 std::optional<UpReport> Supervisor::startManager() {
-    if (auto failure = installVintfFragments(state_.made)) {
-        return UpReport{kNotStarted, failure->text};
+    if (auto done = installVintfFragments(mState.made); !done) {
+        return UpReport{kNotStarted, done.error().message()};
     }
-    UniqueFd ready;
-    Result<Child> manager = startServer({plan_.manager}, state_.managerLog(), ready);
-    if (!manager) return UpReport{kNotStarted, manager.error().text};
-    manager_ = std::move(*manager);
-    state_.manager = manager_->pid();
-    const Event event = wait(Clock::now() + kReadyPatience, ready.get());
+    unique_fd ready;
+    Result<Child> manager =
+            startServer({mPlan.manager, "--rules", QVX_SERVICE_RULES}, mState.managerLog(), ready);
+    if (!manager) return UpReport{kNotStarted, manager.error().message()};
+    mManager = std::move(*manager);
+    mState.manager = mManager->pid();
+    const Event event = wait(Clock::now() + kReadyTimeout, ready.get());
     return event == Event::kReady ? std::nullopt : std::optional(notReady(event));
 }
 
+// Where clients note their calls: of whatever user they are.
+Result<void> Supervisor::makeCalls() const {
+    const unique_fd calls = openLog(mState.calls());
+    if (!calls.ok() || fchmod(calls.get(), 0666) != 0) return ErrnoError() << mState.calls();
+    return {};
+}
+
 std::optional<UpReport> Supervisor::startService() {
-    const UniqueFd mounts(
-            open(fmt::format("/proc/{}/ns/mnt", driver_->pid()).c_str(), O_RDONLY | O_CLOEXEC));
-    if (!mounts) return UpReport{kNotStarted, "the driver's mount namespace is gone"};
-    const UniqueFd log = openLog(state_.serviceLog());
-    const UniqueFd output = openLog(state_.serviceOutput());
-    if (!log || !output) {
-        return UpReport{kNotStarted, fmt::format("{}: {}", state_.serviceLog(), strerror(errno))};
+    const unique_fd mounts(
+            open(fmt::format("/proc/{}/ns/mnt", mDriver->pid()).c_str(), O_RDONLY | O_CLOEXEC));
+    if (!mounts.ok()) return UpReport{kNotStarted, "the driver's mount namespace is gone"};
+    if (!mLog) {
+        Result<ServiceLog> log = ServiceLog::create(mState.serviceLog());
+        if (!log) return UpReport{kNotStarted, log.error().message()};
+        mLog = std::move(*log);
+        unlink(mState.serviceOutput().c_str());
     }
-    Result<Child> service = Child::start({.command = {plan_.service},
+    mServiceStart = Clock::now();
+    mRestartAt.reset();
+    const unique_fd output = openLog(mState.serviceOutput());
+    if (!output.ok()) {
+        return UpReport{kNotStarted, fmt::format("{}: {}", mState.serviceLog(), strerror(errno))};
+    }
+    Result<Child> service = Child::start({.command = {mPlan.service},
                                           .mounts = mounts.get(),
                                           .user = kSystemUser,
                                           .output = output.get(),
-                                          .errors = log.get()});
-    if (!service) return UpReport{kNotStarted, service.error().text};
-    service_ = std::move(*service);
-    state_.service = service_->pid();
-    if (auto failure = saveState(state_)) return UpReport{kNotStarted, failure->text};
+                                          .errors = mLog->writer()});
+    if (!service) return UpReport{kNotStarted, service.error().message()};
+    mService = std::move(*service);
+    mState.service = mService->pid();
+    mState.serviceStatus.reset();
+    mState.stopped = false;
+    mState.restartAt = 0;
+    ++mState.starts;
+    if (auto done = saveState(mState); !done) return UpReport{kNotStarted, done.error().message()};
     return std::nullopt;
 }
 
 UpReport Supervisor::awaitRegistration() {
     Result<Child> probe = Child::fork([] { return awaitService(true); });
-    if (!probe) return {kNotStarted, probe.error().text};
-    probe_ = std::move(*probe);
-    const Event event = wait(Clock::now() + kServicePatience);
+    if (!probe) return {kNotStarted, probe.error().message()};
+    mProbe = std::move(*probe);
+    const Event event = wait(Clock::now() + kServiceTimeout);
     if (event == Event::kService) {
         noteServiceEnd();
-        return {kServiceEnded, serviceEndText(state_)};
+        return {kServiceEnded, serviceEndText(mState)};
     }
     if (event == Event::kLate) {
         return {kServiceEnded,
                 withLastLine(fmt::format("the service did not register within {} seconds",
-                                         kServicePatience.count()),
-                             state_.serviceLog())};
+                                         kServiceTimeout.count()),
+                             mState.serviceLog())};
     }
     if (event != Event::kProbe) return notReady(event);
-    if (probe_->poll() != kProbeFound) return {kNotStarted, "/dev/binder cannot be opened"};
-    probe_.reset();
-    state_.registered = true;
-    if (auto failure = saveState(state_)) return {kNotStarted, failure->text};
-    return {kUp, fmt::format("phone is up: profile {}, service registered, pid {}", state_.profile,
-                             state_.service)};
+    if (mProbe->poll() != kProbeDone) return {kNotStarted, "/dev/binder cannot be opened"};
+    mProbe.reset();
+    mState.registered = true;
+    if (auto done = saveState(mState); !done) return {kNotStarted, done.error().message()};
+    return {kUp, fmt::format("phone is up: profile {}, service registered, pid {}", mState.profile,
+                             mState.service)};
 }
 
-/// Why something that was waited for did not come.
+// Why something that was waited for did not come.
 UpReport Supervisor::notReady(Event event) {
     switch (event) {
         case Event::kDriver:
-            return {kNotStarted, endOf("driver", *driver_, state_.driverLog())};
+            return {kNotStarted, endOf("driver", *mDriver, mState.driverLog())};
         case Event::kManager:
-            return {kNotStarted, endOf("service manager", *manager_, state_.managerLog())};
+            return {kNotStarted, endOf("service manager", *mManager, mState.managerLog())};
         case Event::kLate:
             return {kNotStarted, "the driver or the service manager hangs"};
         default:
@@ -227,9 +238,17 @@ UpReport Supervisor::notReady(Event event) {
     }
 }
 
+Result<void> Supervisor::listen() {
+    auto requests = ControlSocket::listenAt(
+            kSupervisorSocket, [this](std::string_view request) { return answer(request); });
+    if (!requests) return requests.error();
+    mRequests = std::move(*requests);
+    return {};
+}
+
 void Supervisor::watch() {
     while (true) {
-        switch (wait(Clock::time_point::max())) {
+        switch (wait(mRestartAt.value_or(Clock::time_point::max()))) {
             case Event::kStop:
             case Event::kDriver:
                 return;
@@ -237,33 +256,95 @@ void Supervisor::watch() {
                 noteServiceEnd();
                 break;
             case Event::kManager:
-                manager_.reset();
-                state_.manager = 0;
+                mManager.reset();
+                mState.manager = 0;
+                break;
+            case Event::kRequest:
+                mRequests->serve();
+                break;
+            case Event::kLate:
+                mRestartAt.reset();
+                (void)startService();
                 break;
             default:
                 break;
         }
-        if (saveState(state_)) return;
+        if (!saveState(mState)) return;
     }
 }
 
+std::string Supervisor::answer(std::string_view request) {
+    constexpr std::string_view kService = "service ";
+    if (request == "log") {
+        if (mLog) mLog->drain();
+        return "ok";
+    }
+    if (!request.starts_with(kService)) return "error unknown request";
+    if (mPlan.service.empty()) return "error the phone has no service";
+    const std::string refusal = serviceRequest(request.substr(kService.size()));
+    (void)saveState(mState);  // before whoever asked looks at it
+    return refusal.empty() ? "ok" : "error " + refusal;
+}
+
+// Does what is asked; why not, or nothing.
+std::string Supervisor::serviceRequest(std::string_view action) {
+    if (action == "kill") {
+        if (!mService) return "the service does not run";
+        kill(mService->pid(), SIGKILL);
+        mService->await(kEndTimeout);
+        noteServiceEnd();
+        return "";
+    }
+    if (action == "start" && mService) {
+        return fmt::format("the service runs already, pid {}", mService->pid());
+    }
+    if (action == "stop" || action == "restart") stopService();
+    if (action == "stop") return "";
+    const std::optional<UpReport> failed = startService();
+    return failed ? failed->text : "";
+}
+
+void Supervisor::stopService() {
+    if (mService) {
+        mService->end(kEndTimeout);
+        noteServiceEnd();
+    }
+    mRestartAt.reset();
+    mState.restartAt = 0;
+    mState.stopped = true;
+}
+
+// As init has it: started again, but no sooner than the period after the last start.
 void Supervisor::noteServiceEnd() {
-    state_.serviceStatus = service_->poll();
-    service_.reset();
+    mLog->drain();
+    mLog->flush();
+    mState.serviceStatus = mService->poll();
+    mService.reset();
+    mState.service = 0;
+    if (mPlan.init.oneshot) return;
+    mRestartAt = std::max(Clock::now(), mServiceStart + mPlan.init.period);
+    mState.restartAt =
+            std::chrono::duration_cast<std::chrono::microseconds>(mRestartAt->time_since_epoch())
+                    .count();
 }
 
 void Supervisor::takeDown() {
     // The service first, so that the driver sees it let go of everything.
-    endAll({&probe_, &service_, &driver_});
+    endAll({&mProbe, &mService, &mDriver});
+    if (mLog) {
+        mLog->drain();
+        mLog->flush();
+    }
+    mRequests.reset();
     // A manager that ends with the news of the service's death unread leaves a complaint of the
     // binder driver's behind.
-    if (state_.registered && manager_) {
+    if (mState.registered && mManager) {
         Result<Child> probe = Child::fork([] { return awaitService(false); });
-        if (probe) probe->await(kEndPatience);
-        if (probe) probe->end(kEndPatience);
+        if (probe) probe->await(kEndTimeout);
+        if (probe) probe->end(kEndTimeout);
     }
-    endAll({&manager_});
-    removeVintfFragments(state_.made);
+    endAll({&mManager});
+    removeVintfFragments(mState.made);
     unlink(kControlSocket);
     removeState();
 }
@@ -274,29 +355,33 @@ Supervisor::Event Supervisor::wait(Clock::time_point deadline, int ready) {
         return child ? child->descriptor() : -1;
     };
     // In the order in which they count.
-    const std::array<std::pair<int, Event>, 7> sources{{
-            {signals_.get(), Event::kStop},
-            {handleOf(driver_), Event::kDriver},
-            {handleOf(manager_), Event::kManager},
-            {handleOf(service_), Event::kService},
-            {handleOf(probe_), Event::kProbe},
+    const std::array<std::pair<int, Event>, 8> sources{{
+            {mSignals.get(), Event::kStop},
+            {handleOf(mDriver), Event::kDriver},
+            {handleOf(mManager), Event::kManager},
+            {handleOf(mService), Event::kService},
+            {handleOf(mProbe), Event::kProbe},
             {ready, Event::kReady},
-            {starter_.get(), Event::kStarterGone},
+            {mRequests ? mRequests->descriptor() : -1, Event::kRequest},
+            {mStarter.get(), Event::kStarterGone},
     }};
-    std::array<pollfd, sources.size()> polled{};
+    std::array<pollfd, sources.size() + 1> polled{};
+    pollfd& log = polled.back();
+    log = {mLog ? mLog->reader() : -1, POLLIN, 0};
     for (size_t i = 0; i < sources.size(); ++i) {
         // Of the starter only its end is of interest, and that is reported unasked.
         const bool asked = sources[i].second != Event::kStarterGone;
         polled[i] = {sources[i].first, static_cast<short>(asked ? POLLIN : 0), 0};
     }
     while (true) {
-        int patience = -1;
+        int timeout = -1;
         if (deadline != Clock::time_point::max()) {
             const auto left = std::chrono::ceil<milliseconds>(deadline - Clock::now());
             if (left.count() <= 0) return Event::kLate;
-            patience = static_cast<int>(left.count());
+            timeout = static_cast<int>(left.count());
         }
-        if (poll(polled.data(), polled.size(), patience) <= 0) continue;
+        if (poll(polled.data(), polled.size(), timeout) <= 0) continue;
+        if (log.revents != 0) mLog->drain();
         for (size_t i = 0; i < sources.size(); ++i) {
             if (polled[i].revents == 0) continue;
             if (sources[i].second != Event::kReady || (polled[i].revents & POLLIN) != 0) {
@@ -310,6 +395,7 @@ Supervisor::Event Supervisor::wait(Clock::time_point deadline, int ready) {
 void cleanUpAfter(const PhoneState& state) {
     removeVintfFragments(state.made);
     unlink(kControlSocket);
+    unlink(kSupervisorSocket);
     removeState();
 }
 

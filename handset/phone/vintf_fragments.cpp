@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The VINTF fragments that declare the service.
-#include "phone/vintf_fragments.h"
+#include "handset/phone/vintf_fragments.h"
 
-#include <fmt/format.h>
 #include <sys/stat.h>
 
 #include <cerrno>
@@ -12,23 +12,30 @@
 #include <optional>
 #include <system_error>
 
-#include "phone/text_file.h"
+#include <fmt/format.h>
+
+#include "handset/phone/text_file.h"
 
 namespace handset {
 namespace {
 
-constexpr const char* kSource = QVX_VINTF_FOLDER;
-constexpr const char* kFolders[] = {"/vendor", "/vendor/etc", "/vendor/etc/vintf",
-                                    "/vendor/etc/vintf/manifest"};
+using android::base::ErrnoError;
+using android::base::Error;
+
+using android::base::Result;
+
+constexpr const char* kSource = QVX_SERVICE_DIRECTORY;
+constexpr const char* kDirectories[] = {"/vendor", "/vendor/etc", "/vendor/etc/vintf",
+                                        "/vendor/etc/vintf/manifest"};
 
 }  // namespace
 
-Failure installVintfFragments(std::vector<std::string>& made) {
-    for (const char* folder : kFolders) {
-        if (mkdir(folder, 0755) == 0) {
-            made.emplace_back(folder);
+Result<void> installVintfFragments(std::vector<std::string>& made) {
+    for (const char* directory : kDirectories) {
+        if (mkdir(directory, 0755) == 0) {
+            made.emplace_back(directory);
         } else if (errno != EEXIST) {
-            return Error{fmt::format("{}: {}", folder, strerror(errno))};
+            return ErrnoError() << directory;
         }
     }
     std::error_code error;
@@ -36,14 +43,14 @@ Failure installVintfFragments(std::vector<std::string>& made) {
         const std::filesystem::path& source = entry.path();
         if (source.extension() != ".xml") continue;
         const std::string target =
-                fmt::format("{}/{}", std::end(kFolders)[-1], source.filename().string());
-        const std::optional<std::string> text = readTextFile(source.string());
-        if (!text) return Error{fmt::format("{}: {}", source.string(), strerror(errno))};
+                fmt::format("{}/{}", std::end(kDirectories)[-1], source.filename().string());
         const bool isNew = !std::filesystem::exists(target, error);
-        if (auto failure = replaceTextFile(target, *text)) return failure;
+        std::filesystem::copy_file(source, target,
+                                   std::filesystem::copy_options::overwrite_existing, error);
+        if (error) return Error(error.value()) << target;
         if (isNew) made.push_back(target);
     }
-    return std::nullopt;
+    return {};
 }
 
 void removeVintfFragments(const std::vector<std::string>& made) {

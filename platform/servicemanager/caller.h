@@ -7,21 +7,23 @@
 
 namespace servicemanager {
 
-/// The sender of the transaction being served, as the binder driver reports it.
+// The sender of the transaction being served, as the binder driver reports it.
 struct Caller {
-    pid_t pid = 0;  ///< 0 in a oneway transaction: the driver does not tell
+    pid_t pid = 0;  // 0 in a oneway transaction: the driver does not tell
     uid_t uid = 0;
 };
 
-/// A user id is the number of an Android user times this, plus the id of the app or system part.
+// A user id is the number of an Android user times this, plus the id of the app or system part.
 inline constexpr uid_t kUidsPerUser = 100000;
 
-/// True for the uid of an installed app. Everything from 10000 on counts, `nobody` included.
+inline constexpr uid_t kFirstApp = 10000;
+
+// True for the uid of an installed app. Everything from 10000 on counts, `nobody` included.
 constexpr bool isApp(uid_t uid) {
-    return uid % kUidsPerUser >= 10000;
+    return uid % kUidsPerUser >= kFirstApp;
 }
 
-/// True for an isolated process: an app's sandbox that sees only services that allow it.
+// True for an isolated process: an app's sandbox that sees only services that allow it.
 constexpr bool isIsolated(uid_t uid) {
     return uid % kUidsPerUser >= 90000;
 }

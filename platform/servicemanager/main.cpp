@@ -1,39 +1,51 @@
 // SPDX-License-Identifier: Apache-2.0
 //
-// servicemanager [--root DIR] [--ready-fd N]: makes itself the context manager of the binder device
-// and serves until the driver is gone. Exit status 2 for wrong usage, 1 when it cannot serve; each
-// with one line that says why.
+// servicemanager [--root DIR] [--rules FILE] [--ready-fd N]: makes itself the context manager of the
+// binder device and serves until the driver is gone. Exit status 2 for wrong usage, 1 when it cannot
+// serve; each with one line that says why.
+#include <poll.h>
+#include <unistd.h>
+
+#include <algorithm>
 #include <cerrno>
+#include <chrono>
+#include <cstdint>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
 #include <exception>
 #include <filesystem>
 #include <string>
+#include <utility>
 
-#include <unistd.h>
-
+#include <CLI/CLI.hpp>
 #include <android/binder_process.h>
 #include <binder_context_manager.h>
 #include <fmt/format.h>
 
-#include <CLI/CLI.hpp>
-
-#include "service_manager.h"
+#include "platform/servicemanager/registration_rules.h"
+#include "platform/servicemanager/service_manager.h"
+#include "platform/servicemanager/systemd_notify.h"
 
 namespace {
+
+using servicemanager::RegistrationRules;
+using servicemanager::ServiceManager;
 
 constexpr const char* kBinderDevice = "/dev/binder";
 constexpr const char* kMountedBinderDevice = "/dev/binderfs/binder";
 constexpr int kWrongUsage = 2;
+
+// How often clients are counted, as on a phone, and systemd hears that the one thread is alive.
+constexpr std::chrono::seconds kTick{5};
 
 [[noreturn]] void fail(const std::string& why, int status) {
     fmt::print(stderr, "servicemanager: {}\n", why);
     std::exit(status);
 }
 
-/// The binder library ends the process when it cannot open its driver; say why before that. It
-/// takes the first of the devices that exists.
+// The binder library ends the process when it cannot open its driver; say why before that. It
+// takes the first of the devices that exists.
 void requireBinderDevice() {
     for (const char* device : {kBinderDevice, kMountedBinderDevice}) {
         if (access(device, R_OK | W_OK) == 0) return;
@@ -57,31 +69,44 @@ std::string reasonOf(binder_status_t status) {
 
 struct Options {
     std::string root = "/";
+    std::string rules;  // empty: none
     int readyFd = -1;
 };
 
 Options parseOptions(int argc, char** argv) {
     Options options;
     CLI::App app("Context manager of the binder device: finds services by name.", "servicemanager");
-    app.add_option("--root", options.root, "Look for VINTF manifests below this folder")
+    app.add_option("--root", options.root, "Look for VINTF manifests below this directory")
             ->option_text("DIR (default /)")
             ->check(CLI::ExistingDirectory);
+    app.add_option("--rules", options.rules,
+                   "Let users register services as this file says; without it only root may")
+            ->option_text("FILE");
     app.add_option("--ready-fd", options.readyFd,
-                   "Write a line feed to this descriptor and close it when requests are served")
+                   "Write a newline to this descriptor and close it when requests are served")
             ->option_text("N");
     try {
         app.parse(argc, argv);
     } catch (const CLI::CallForHelp& help) {
         std::exit(app.exit(help));
     } catch (const CLI::ParseError& error) {
-        fail(fmt::format("{}; usage: servicemanager [--root DIR] [--ready-fd N]", error.what()),
+        fail(fmt::format("{}; usage: servicemanager [--root DIR] [--rules FILE] [--ready-fd N]",
+                         error.what()),
              kWrongUsage);
     }
     return options;
 }
 
-/// Whoever starts the manager can wait for this instead of asking a manager that is not there yet.
-void announceReady(int fd) {
+RegistrationRules loadRules(const std::string& file) {
+    if (file.empty()) return {};
+    auto rules = RegistrationRules::load(file);
+    if (!rules.ok()) fail(rules.error().message(), kWrongUsage);
+    return *std::move(rules);
+}
+
+// Whoever starts the manager can wait for this instead of asking a manager that is not there yet.
+void reportReady(int fd) {
+    servicemanager::notifySystemd("READY=1");
     if (fd < 0) return;
     if (write(fd, "\n", 1) != 1) {
         fail(fmt::format("--ready-fd {}: {}", fd, std::strerror(errno)), kWrongUsage);
@@ -89,17 +114,39 @@ void announceReady(int fd) {
     close(fd);
 }
 
+// Answers what comes in and, between two requests, counts clients where somebody wants to know.
+// Returns when the driver is gone.
+void serveRequests(ServiceManager& manager) {
+    using Clock = std::chrono::steady_clock;
+    const bool isWatched = servicemanager::systemdWatches();
+    pollfd driver{.fd = -1, .events = POLLIN, .revents = 0};
+    ABinderProcess_setupPolling(&driver.fd);
+    auto next = Clock::now() + kTick;
+    while ((driver.revents & (POLLERR | POLLHUP | POLLNVAL)) == 0) {
+        const auto left = std::chrono::ceil<std::chrono::milliseconds>(next - Clock::now());
+        const bool ticks = isWatched || manager.hasClientCallbacks();
+        const int timeout = ticks ? static_cast<int>(std::max<int64_t>(left.count(), 0)) : -1;
+        if (poll(&driver, 1, timeout) < 0) continue;
+        if ((driver.revents & POLLIN) != 0 && ABinderProcess_handlePolledCommands() < 0) return;
+        if (Clock::now() < next) continue;
+        next = Clock::now() + kTick;
+        manager.checkClients();
+        if (isWatched) servicemanager::notifySystemd("WATCHDOG=1");
+    }
+}
+
 [[noreturn]] void serve(const Options& options) {
+    RegistrationRules rules = loadRules(options.rules);
     requireBinderDevice();
     // One thread, this one: registrations and questions are answered one after the other.
     ABinderProcess_setThreadPoolMaxThreadCount(0);
-    servicemanager::ServiceManager manager(options.root);
+    ServiceManager manager(options.root, std::move(rules));
     const binder_status_t status = ABinderProcess_becomeContextManager(manager.binder());
     if (status != STATUS_OK) {
         fail(fmt::format("cannot become the context manager: {}", reasonOf(status)), EXIT_FAILURE);
     }
-    announceReady(options.readyFd);
-    ABinderProcess_joinThreadPool();
+    reportReady(options.readyFd);
+    serveRequests(manager);
     fail("the binder device is gone", EXIT_FAILURE);
 }
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 //
 // The VINTF manifests: see manifests.h.
-#include "manifests.h"
+#include "platform/servicemanager/manifests.h"
 
 #include <algorithm>
 #include <charconv>
@@ -12,7 +12,7 @@
 #include <fmt/format.h>
 #include <tinyxml2.h>
 
-#include "service_name.h"
+#include "platform/servicemanager/service_name.h"
 
 namespace servicemanager {
 
@@ -21,21 +21,21 @@ namespace {
 namespace fs = std::filesystem;
 using tinyxml2::XMLElement;
 
-/// One `IFoo/instance` of one <hal>.
+// One `IFoo/instance` of one <hal>.
 struct Entry {
     std::string package;
     std::string interface;
     std::string instance;
-    std::string apex;  ///< empty: not updatable
-    fs::path file;     ///< where it stands
+    std::string apex;  // empty: not updatable
+    fs::path file;     // where it stands
 };
 
-/// What was wrong with a file; empty when nothing was.
+// What was wrong with a file; empty when nothing was.
 using Fault = std::string;
 
 struct ManifestKind {
-    const char* type;                     ///< the type attribute its files must carry
-    std::vector<const char*> partitions;  ///< in order of reading
+    const char* type;                     // the type attribute its files must carry
+    std::vector<const char*> partitions;  // in order of reading
 };
 
 const ManifestKind kDevice = {"device", {"vendor", "odm"}};
@@ -55,7 +55,7 @@ Fault atLine(const XMLElement& element, const std::string& what) {
     return fmt::format("line {}: {}", element.GetLineNum(), what);
 }
 
-/// The format's own version, "major.minor", up to 4.0.
+// The format's own version, "major.minor", up to 4.0.
 bool isReadableVersion(const std::string& version) {
     unsigned major = 0;
     unsigned minor = 0;
@@ -68,7 +68,7 @@ bool isReadableVersion(const std::string& version) {
     return major < 4 || (major == 4 && minor == 0);
 }
 
-/// `<fqname>IFoo/instance</fqname>`. The forms with a package or a version belong to other formats.
+// `<fqname>IFoo/instance</fqname>`. The forms with a package or a version belong to other formats.
 Fault readFqname(const XMLElement& element, Entry entry, std::vector<Entry>& entries) {
     const std::string text = textOf(element);
     const size_t slash = text.find('/');
@@ -82,7 +82,7 @@ Fault readFqname(const XMLElement& element, Entry entry, std::vector<Entry>& ent
     return {};
 }
 
-/// The older form: `<interface><name>IFoo</name><instance>default</instance>...</interface>`.
+// The older form: `<interface><name>IFoo</name><instance>default</instance>...</interface>`.
 Fault readInterface(const XMLElement& element, Entry entry, std::vector<Entry>& entries) {
     const XMLElement* name = element.FirstChildElement("name");
     if (name == nullptr || textOf(*name).empty()) return atLine(element, "interface has no name");
@@ -113,7 +113,7 @@ Fault readHal(const XMLElement& hal, std::vector<Entry>& entries) {
     return {};
 }
 
-/// Adds the entries of one file; on a fault none of them.
+// Adds the entries of one file; on a fault none of them.
 Fault readFile(const fs::path& file, const char* type, std::vector<Entry>& entries) {
     tinyxml2::XMLDocument document;
     if (document.LoadFile(file.c_str()) != tinyxml2::XML_SUCCESS) {
@@ -146,7 +146,7 @@ Fault readFile(const fs::path& file, const char* type, std::vector<Entry>& entri
     return {};
 }
 
-/// The manifest of a partition and its fragments, those that exist, fragments in byte order.
+// The manifest of a partition and its fragments, those that exist, fragments in byte order.
 std::vector<fs::path> filesOf(const fs::path& root, const char* partition) {
     const fs::path folder = root / partition / "etc" / "vintf";
     std::vector<fs::path> fragments;
@@ -177,7 +177,7 @@ std::vector<Entry> readAll(const fs::path& root, const ManifestKind& kind,
     return entries;
 }
 
-/// The entry of a service, the device's before the framework's.
+// The entry of a service, the device's before the framework's.
 std::optional<Entry> findEntry(const fs::path& root, const std::string& serviceName,
                                const Manifests::Log& log) {
     const std::optional<InstanceName> wanted = parseInstanceName(serviceName);

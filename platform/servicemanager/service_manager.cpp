@@ -5,12 +5,12 @@
 // The stub is written by hand because it has to behave as the C++ backend's does, which the phone's
 // own service manager uses: a null where none is allowed is answered with the exception
 // EX_NULL_POINTER in an ordinary reply, where generated NDK code would fail the transaction.
-#include "service_manager.h"
+#include "platform/servicemanager/service_manager.h"
+
+#include <unistd.h>
 
 #include <cstdio>
-#include <optional>
 #include <utility>
-#include <vector>
 
 #include <android/binder_parcel_utils.h>
 #include <android/binder_status.h>
@@ -21,17 +21,21 @@ namespace servicemanager {
 
 namespace {
 
-/// Bit of the dump priorities under which the service manager lists itself.
+// What it registers itself as.
+constexpr const char* kOwnName = "manager";
+
+// Bit of the dump priorities under which the service manager lists itself.
 constexpr int32_t kDumpPriorityDefault = 8;
 
-/// The one method of android.os.IServiceCallback.
+// The one method of android.os.IServiceCallback, and the one of android.os.IClientCallback.
 constexpr transaction_code_t kOnRegistration = FIRST_CALL_TRANSACTION;
+constexpr transaction_code_t kOnClients = FIRST_CALL_TRANSACTION;
 
 void log(const std::string& line) {
     fmt::print(stderr, "servicemanager: {}\n", line);
 }
 
-/// A name as the log shows it. It comes from outside, so it may hold anything.
+// A name as the log shows it. It comes from outside, so it may hold anything.
 std::string shown(const std::string& name) {
     constexpr size_t kEnough = 200;
     return fmt::format("{:?}", name.substr(0, kEnough));
@@ -41,18 +45,27 @@ Caller callerOfThisTransaction() {
     return {AIBinder_getCallingPid(), AIBinder_getCallingUid()};
 }
 
-/// Takes over one strong reference.
+// Takes over one strong reference.
 Object adopt(AIBinder* binder) {
     return binder == nullptr ? nullptr : Object(binder, AIBinder_decStrong);
 }
 
-// Callbacks are called from here and never served here, so their class has no behaviour.
-const AIBinder_Class* registrationCallbackClass() {
-    static const AIBinder_Class* const clazz = AIBinder_Class_define(
-            "android.os.IServiceCallback", [](void*) -> void* { return nullptr; }, [](void*) {},
+// Callbacks are called from here and never served here, so their classes have no behaviour.
+const AIBinder_Class* defineCallbackClass(const char* descriptor) {
+    return AIBinder_Class_define(
+            descriptor, [](void*) -> void* { return nullptr; }, [](void*) {},
             [](AIBinder*, transaction_code_t, const AParcel*, AParcel*) -> binder_status_t {
                 return STATUS_UNKNOWN_TRANSACTION;
             });
+}
+
+const AIBinder_Class* registrationCallbackClass() {
+    static const AIBinder_Class* const clazz = defineCallbackClass("android.os.IServiceCallback");
+    return clazz;
+}
+
+const AIBinder_Class* clientCallbackClass() {
+    static const AIBinder_Class* const clazz = defineCallbackClass("android.os.IClientCallback");
     return clazz;
 }
 
@@ -68,7 +81,7 @@ binder_status_t read(const AParcel* in, int32_t* value) {
     return AParcel_readInt32(in, value);
 }
 
-/// No binder argument of this interface may be null.
+// No binder argument of this interface may be null.
 binder_status_t read(const AParcel* in, Object* value) {
     AIBinder* binder = nullptr;
     const binder_status_t status = AParcel_readStrongBinder(in, &binder);
@@ -76,7 +89,7 @@ binder_status_t read(const AParcel* in, Object* value) {
     return status == STATUS_OK && binder == nullptr ? STATUS_UNEXPECTED_NULL : status;
 }
 
-/// Reads the arguments in order, up to the first failure.
+// Reads the arguments in order, up to the first failure.
 template <typename... Value>
 binder_status_t readArguments(const AParcel* in, Value*... values) {
     binder_status_t status = STATUS_OK;
@@ -92,6 +105,10 @@ binder_status_t write(AParcel* out, const Object& value) {
     return AParcel_writeStrongBinder(out, value.get());
 }
 
+binder_status_t write(AParcel* out, const std::string& value) {
+    return ndk::AParcel_writeString(out, value);
+}
+
 binder_status_t write(AParcel* out, const std::vector<std::string>& value) {
     return ndk::AParcel_writeVector(out, value);
 }
@@ -100,7 +117,7 @@ binder_status_t write(AParcel* out, const std::optional<std::string>& value) {
     return ndk::AParcel_writeString(out, value);
 }
 
-/// A parcelable array element: presence, size (counting itself), name, pid.
+// A parcelable array element: presence, size (counting itself), name, pid.
 binder_status_t write(AParcel* out, const ServiceDebugInfo& value) {
     binder_status_t status = AParcel_writeInt32(out, 1);
     const int32_t start = AParcel_getDataPosition(out);
@@ -128,14 +145,44 @@ binder_status_t writeException(AParcel* out, binder_exception_t exception) {
     return AParcel_writeStatusHeader(out, header.get());
 }
 
-/// An ok header and the result.
+// An ok header and the result.
 template <typename Value>
 binder_status_t reply(AParcel* out, const Value& value) {
     const binder_status_t status = writeException(out, EX_NONE);
     return status == STATUS_OK ? write(out, value) : status;
 }
 
-/// The header alone. A refusal is logged here, with the reason that the caller is not told.
+// Calls a callback without waiting for it.
+template <typename... Value>
+binder_status_t callOneway(const Object& callback, transaction_code_t code,
+                           const Value&... values) {
+    ndk::ScopedAParcel in;
+    ndk::ScopedAParcel out;
+    binder_status_t status = AIBinder_prepareTransaction(callback.get(), in.getR());
+    if (status != STATUS_OK) return status;
+    static_cast<void>((((status = write(in.get(), values)) == STATUS_OK) && ...));
+    if (status != STATUS_OK) return status;
+    return AIBinder_transact(callback.get(), code, in.getR(), out.getR(), FLAG_ONEWAY);
+}
+
+// Calls each of the callbacks for a name; one line on the log for all that fail.
+template <typename... Value>
+void callEachOneway(const std::vector<Object>& callbacks, const std::string& name,
+                    transaction_code_t code, const Value&... values) {
+    size_t failures = 0;
+    binder_status_t last = STATUS_OK;
+    for (const Object& callback : callbacks) {
+        const binder_status_t status = callOneway(callback, code, values...);
+        if (status == STATUS_OK) continue;
+        ++failures;
+        last = status;
+    }
+    if (failures == 0) return;
+    log(fmt::format("{} of {} callbacks for {} could not be called: status {}", failures,
+                    callbacks.size(), shown(name), last));
+}
+
+// The header alone. A refusal is logged here, with the reason that the caller is not told.
 binder_status_t replyVerdict(AParcel* out, const char* method, const std::string& name,
                              const Verdict& verdict) {
     if (!verdict.ok()) {
@@ -165,9 +212,16 @@ const ServiceManager::Serve ServiceManager::kMethods[12] = {
         /* 12 getServiceDebugInfo        */ &ServiceManager::getServiceDebugInfo,
 };
 
-ServiceManager::ServiceManager(const std::filesystem::path& manifestRoot)
+ServiceManager::ServiceManager(const std::filesystem::path& manifestRoot, RegistrationRules rules)
     : mManifests(manifestRoot, log),
-      mRegistry(*this, [this](const std::string& name) { return mManifests.isDeclared(name); }),
+      mRules(std::move(rules)),
+      mRegistry(*this,
+                {.isDeclared =
+                         [this](const std::string& name) { return mManifests.isDeclared(name); },
+                 .mayRegister =
+                         [this](uid_t user, const std::string& name) {
+                             return mRules.mayRegister(user, name);
+                         }}),
       mDeathRecipient(AIBinder_DeathRecipient_new(onBinderDied)) {
     const AIBinder_Class* clazz = AIBinder_Class_define(
             "android.os.IServiceManager", [](void* self) { return self; }, [](void*) {},
@@ -175,10 +229,11 @@ ServiceManager::ServiceManager(const std::filesystem::path& manifestRoot)
     mBinder = ndk::SpAIBinder(AIBinder_new(clazz, this));
 
     AIBinder_incStrong(mBinder.get());
-    const Verdict verdict =
-            mRegistry.addService(callerOfThisTransaction(), {.name = "manager",
-                                                             .object = adopt(mBinder.get()),
-                                                             .dumpPriority = kDumpPriorityDefault});
+    const Caller self{getpid(), geteuid()};
+    mRules.allow(kOwnName, self.uid);
+    const Verdict verdict = mRegistry.addService(self, {.name = kOwnName,
+                                                        .object = adopt(mBinder.get()),
+                                                        .dumpPriority = kDumpPriorityDefault});
     if (!verdict.ok()) log(fmt::format("cannot register itself: {}", verdict.reason));
 }
 
@@ -202,21 +257,20 @@ void ServiceManager::unwatch(const Object& object) {
     mWatches.erase(watch);
 }
 
-void ServiceManager::notifyRegistration(const Object& callback, const std::string& name,
-                                        const Object& service) {
-    AParcel* in = nullptr;
-    AParcel* out = nullptr;
-    binder_status_t status = AIBinder_prepareTransaction(callback.get(), &in);
-    if (status == STATUS_OK) status = ndk::AParcel_writeString(in, name);
-    if (status == STATUS_OK) status = write(in, service);
-    if (status == STATUS_OK) {
-        status = AIBinder_transact(callback.get(), kOnRegistration, &in, &out, FLAG_ONEWAY);
-    }
-    AParcel_delete(in);
-    AParcel_delete(out);
-    if (status != STATUS_OK) {
-        log(fmt::format("a callback for {} could not be told: status {}", shown(name), status));
-    }
+void ServiceManager::notifyRegistration(const std::vector<Object>& callbacks,
+                                        const std::string& name, const Object& service) {
+    callEachOneway(callbacks, name, kOnRegistration, name, service);
+}
+
+void ServiceManager::notifyClients(const std::vector<Object>& callbacks, const std::string& name,
+                                   const Object& service, bool hasClients) {
+    callEachOneway(callbacks, name, kOnClients, service, hasClients);
+}
+
+std::optional<uint32_t> ServiceManager::countHolders(const Object& object) {
+    uint32_t count = 0;
+    const binder_status_t status = AIBinder_countHolders(object.get(), &count);
+    return status == STATUS_OK ? std::optional(count) : std::nullopt;
 }
 
 binder_status_t ServiceManager::onTransact(AIBinder* binder, transaction_code_t code,
@@ -271,8 +325,9 @@ binder_status_t ServiceManager::registerForNotifications(const AParcel* in, APar
     // An object of another interface is accepted like any other; it refuses the calls itself. It
     // is not asked which it is: the answer would be the client's to withhold.
     AIBinder_assumeClass(callback.get(), registrationCallbackClass());
-    return replyVerdict(out, "registerForNotifications", name,
-                        mRegistry.registerForNotifications(name, callback));
+    return replyVerdict(
+            out, "registerForNotifications", name,
+            mRegistry.registerForNotifications(callerOfThisTransaction(), name, callback));
 }
 
 binder_status_t ServiceManager::unregisterForNotifications(const AParcel* in, AParcel* out) {
@@ -311,6 +366,7 @@ binder_status_t ServiceManager::registerClientCallback(const AParcel* in, AParce
     Object callback;
     const binder_status_t status = readArguments(in, &name, &service, &callback);
     if (status != STATUS_OK) return status;
+    AIBinder_assumeClass(callback.get(), clientCallbackClass());
     return replyVerdict(
             out, "registerClientCallback", name,
             mRegistry.registerClientCallback(callerOfThisTransaction(), name, service, callback));

@@ -1,48 +1,57 @@
 // SPDX-License-Identifier: Apache-2.0
 //
 // The binder side of the service manager: serves android.os.IServiceManager, answers out of the
-// registry and the manifests.
+// registry, the rules and the manifests.
 #pragma once
 
 #include <filesystem>
-#include <memory>
+#include <optional>
 #include <string>
 #include <unordered_map>
+#include <vector>
 
 #include <android/binder_auto_utils.h>
 #include <android/binder_ibinder.h>
 #include <android/binder_parcel.h>
 
-#include "manifests.h"
-#include "service_registry.h"
+#include "platform/servicemanager/manifests.h"
+#include "platform/servicemanager/registration_rules.h"
+#include "platform/servicemanager/service_registry.h"
 
 namespace servicemanager {
 
-/// One per process, for the life of the process. It waits for nobody: all calls it makes to others
-/// are oneway, because its one thread serves the whole machine.
+// One per process, for the life of the process. It waits for nobody: all calls it makes to others
+// are oneway, because its one thread serves the whole machine.
 class ServiceManager final : public ObjectHost {
   public:
-    /// Manifests are looked for below `manifestRoot`. Registers itself under the name `manager`.
-    explicit ServiceManager(const std::filesystem::path& manifestRoot);
+    // Manifests are looked for below `manifestRoot`. Registers itself under the name `manager`.
+    ServiceManager(const std::filesystem::path& manifestRoot, RegistrationRules rules);
 
     ServiceManager(const ServiceManager&) = delete;
     ServiceManager& operator=(const ServiceManager&) = delete;
 
-    /// The object to be put behind handle 0. Owned by this.
+    // The object to be put behind handle 0. Owned by this.
     AIBinder* binder() const { return mBinder.get(); }
+
+    // See ServiceRegistry.
+    void checkClients() { mRegistry.checkClients(); }
+    bool hasClientCallbacks() const { return mRegistry.hasClientCallbacks(); }
 
     bool isRemote(const Object& object) override;
     bool watch(const Object& object) override;
     void unwatch(const Object& object) override;
-    void notifyRegistration(const Object& callback, const std::string& name,
+    void notifyRegistration(const std::vector<Object>& callbacks, const std::string& name,
                             const Object& service) override;
+    void notifyClients(const std::vector<Object>& callbacks, const std::string& name,
+                       const Object& service, bool hasClients) override;
+    std::optional<uint32_t> countHolders(const Object& object) override;
 
   private:
-    /// Serves one method: reads its arguments from `in`, writes header and result to `out`. The
-    /// status STATUS_UNEXPECTED_NULL reaches the caller as EX_NULL_POINTER.
+    // Serves one method: reads its arguments from `in`, writes header and result to `out`. The
+    // status STATUS_UNEXPECTED_NULL reaches the caller as EX_NULL_POINTER.
     using Serve = binder_status_t (ServiceManager::*)(const AParcel* in, AParcel* out);
 
-    /// The cookie of a death link.
+    // The cookie of a death link.
     struct Watch {
         ServiceManager* manager;
         const AIBinder* object;
@@ -67,6 +76,7 @@ class ServiceManager final : public ObjectHost {
     static const Serve kMethods[12];
 
     Manifests mManifests;
+    RegistrationRules mRules;
     ServiceRegistry mRegistry;
     ndk::ScopedAIBinder_DeathRecipient mDeathRecipient;
     std::unordered_map<const AIBinder*, Watch> mWatches;

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 //
 // Names of services: see service_name.h.
-#include "service_name.h"
+#include "platform/servicemanager/service_name.h"
 
 #include <algorithm>
 

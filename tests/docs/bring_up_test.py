@@ -22,7 +22,7 @@ def first_cells(text):
 
 class BringUp(unittest.TestCase):
     def test_explains_lines_that_the_service_logs(self):
-        sources = "".join(path.read_text("utf-8") for path in SERVICE.glob("*.cpp"))
+        sources = "".join(path.read_text("utf-8") for path in SERVICE.rglob("*.cpp"))
         # What is streamed in pieces counts as one text: the pieces follow each other.
         logged = re.sub(r'"\s*<<\s*"|"\s+"', "", sources)
         lines = [span for cell in first_cells(section("4. The log"))
@@ -35,7 +35,7 @@ class BringUp(unittest.TestCase):
 
     def test_names_nodes_that_the_service_opens(self):
         sources = "".join(path.read_text("utf-8") for path in
-                          [*SERVICE.glob("*.cpp"), *SERVICE.glob("*.h")])
+                          [*SERVICE.rglob("*.cpp"), *SERVICE.rglob("*.h")])
         for cell in first_cells(section("1. The driver: which node decides what")):
             for span in re.findall(r"`([a-z_0-9]+)`", cell):
                 self.assertRegex(sources, rf"[\"/]{span}\"", span)

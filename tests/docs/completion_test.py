@@ -36,21 +36,27 @@ class Completion(unittest.TestCase):
         self.assertEqual(result.stdout, "complete -F _vibctl vibctl\n")
 
     def test_offers_commands_first(self):
-        self.assertEqual(offered(""), ["std", "ext", "list", "doctor", "help"])
+        self.assertEqual(offered(""), ["std", "ext", "info", "dump", "raw", "play", "list", "doctor", "help"])
         self.assertEqual(offered("do"), ["doctor"])
+        self.assertEqual(offered("dump", ""), ["std", "ext"])
+        self.assertEqual(offered("raw", "e"), ["ext"])
+        self.assertEqual(offered("help", ""), ["std", "ext"])
         self.assertEqual(offered("--json", "--wait", "3", "e"), ["ext"])
 
     def test_offers_options_anywhere(self):
-        options = ["--json", "--wait", "--callback", "--help", "--version"]
+        options = ["--json", "--timeout", "--wait", "--callback", "--off-on-interrupt",
+                   "--amplitudes", "--repeat", "--explain", "--help", "--version"]
         self.assertEqual(offered("-"), options)
         self.assertEqual(offered("std", "on", "500", "--c"), ["--callback"])
 
-    def test_offers_nothing_for_the_value_of_wait(self):
+    def test_offers_nothing_for_a_number_of_seconds(self):
         self.assertEqual(offered("--wait", ""), [])
+        self.assertEqual(offered("--timeout", ""), [])
 
     def test_offers_the_methods_of_the_interface(self):
         self.assertEqual(offered("std", "setA"), ["setAmplitude"])
         self.assertEqual(offered("std", "compose"), ["compose", "composePwle"])
+        self.assertEqual(offered("help", "std", "compose"), ["compose", "composePwle"])
         self.assertEqual(offered("ext", "--json", "setF"),
                          ["setForceTouchAmplitude", "setFrequencyType", "setFolderStatus",
                           "setFolderTentModeStatus"])

@@ -1,12 +1,12 @@
 # SPDX-License-Identifier: Apache-2.0
 """Finds the commands that README.md and docs/*.md show.
 
-    ```sh               run on the host, in a folder that looks like the project's
+    ```sh               run on the host, in a directory that looks like the project's
     ```sh guest PROFILE run in the handset, where the nodes of a phone of that profile are seen
 
 A command that is meant to fail is followed by "# status N". A block that cannot be run has, on the
 line before it, the reason: <!-- not run: REASON -->. In README.md, blocks that are indented by four
-columns are commands too; two blanks or more end the command, what follows describes it.
+columns are commands too; two spaces or more end the command, what follows describes it.
 """
 
 import dataclasses

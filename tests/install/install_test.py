@@ -12,25 +12,27 @@ import unittest
 from installation import FILES, PROJECT, SERVICE, files_below, install, run
 
 # What a unit needs of the system it is verified in.
-TARGETS = ("basic", "multi-user", "shutdown", "sysinit")
+TARGETS = ("basic", "multi-user", "shutdown", "sysinit", "time-set", "time-sync", "timers")
 
 EVERYWHERE = {
     "CapabilityBoundingSet": "", "NoNewPrivileges": "yes", "ProtectSystem": "strict",
     "ProtectHome": "yes", "PrivateNetwork": "yes", "MemoryDenyWriteExecute": "yes",
-    "DevicePolicy": "closed",
+    "DevicePolicy": "closed", "LimitNICE": "40", "UMask": "0077",
+    # As the init script has it.
+    "Restart": "always", "RestartSec": "5",
 }
 
 
 class Installation(unittest.TestCase):
     @classmethod
     def setUpClass(cls):
-        cls.folder = tempfile.TemporaryDirectory(prefix="installation-")
-        cls.root = pathlib.Path(cls.folder.name)
+        cls.directory = tempfile.TemporaryDirectory(prefix="installation-")
+        cls.root = pathlib.Path(cls.directory.name)
         install(cls.root, "/usr")
 
     @classmethod
     def tearDownClass(cls):
-        cls.folder.cleanup()
+        cls.directory.cleanup()
 
     def test_brings_these_files_and_no_other(self):
         self.assertEqual(files_below(self.root, "/usr"), FILES)
@@ -44,7 +46,8 @@ class Installation(unittest.TestCase):
             unit = self.unit("qvx-servicemanager", other / "opt/vibrator")
             self.assertEqual(unit["Service"]["ExecStart"],
                              "/opt/vibrator/libexec/qvx-vibrator/servicemanager "
-                             "--root /opt/vibrator/share/qvx-vibrator")
+                             "--root /opt/vibrator/share/qvx-vibrator "
+                             "--rules /opt/vibrator/share/qvx-vibrator/services.rules")
             self.assertEqual(run(other / "opt/vibrator/bin/vibctl", "--version"), "vibctl 1.0.0\n")
 
     def test_programs_find_their_library_where_they_are_put(self):
@@ -72,7 +75,8 @@ class Installation(unittest.TestCase):
     def test_units_start_the_installed_programs_as_their_own_users(self):
         manager = self.unit("qvx-servicemanager", self.root / "usr")["Service"]
         self.assertEqual(manager["ExecStart"], "/usr/libexec/qvx-vibrator/servicemanager "
-                                               "--root /usr/share/qvx-vibrator")
+                                               "--root /usr/share/qvx-vibrator "
+                                               "--rules /usr/share/qvx-vibrator/services.rules")
         self.assertEqual(manager["User"], "qvx-servicemanager")
         service = self.unit("qvx-vibrator", self.root / "usr")
         self.assertEqual(service["Service"]["ExecStart"],
@@ -86,6 +90,10 @@ class Installation(unittest.TestCase):
             section = self.unit(name, self.root / "usr")["Service"]
             for key, value in EVERYWHERE.items():
                 self.assertEqual(section[key], value, f"{name}: {key}")
+            for key in ("TasksMax", "MemoryMax", "SystemCallFilter"):
+                self.assertIn(key, section, name)
+            self.assertEqual(self.unit(name, self.root / "usr")["Unit"]["StartLimitIntervalSec"],
+                             "0")
         section = self.unit("qvx-vibrator", self.root / "usr")["Service"]
         text = (self.root / "usr/lib/systemd/system/qvx-vibrator.service").read_text()
         self.assertIn("\nDeviceAllow=/dev/binder rw\n", text)
@@ -97,14 +105,22 @@ class Installation(unittest.TestCase):
     def test_units_are_what_systemd_understands(self):
         if shutil.which("systemd-analyze") is None:
             self.skipTest("systemd-analyze is not installed")
-        folder = self.root / "usr/lib/systemd/system"
-        stubs = [folder / f"{target}.target" for target in TARGETS]
+        directory = self.root / "usr/lib/systemd/system"
+        stubs = [directory / f"{target}.target" for target in TARGETS]
         for stub in stubs:
             stub.write_text("[Unit]\nDescription=stub\n")
+        # Programs of the system that the units start.
+        for program in ("usr/bin/timeout", "bin/sh"):
+            path = self.root / program
+            path.parent.mkdir(parents=True, exist_ok=True)
+            path.write_text("#!/bin/sh\n")
+            path.chmod(0o755)
+            stubs.append(path)
         try:
             result = subprocess.run(
                 ["systemd-analyze", "verify", "--man=no", f"--root={self.root}",
-                 "qvx-servicemanager.service", "qvx-vibrator.service"],
+                 "qvx-servicemanager.service", "qvx-vibrator.service",
+                 "qvx-vibrator-watchdog.service", "qvx-vibrator-watchdog.timer"],
                 capture_output=True, text=True)
         finally:
             for stub in stubs:

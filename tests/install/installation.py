@@ -9,13 +9,16 @@ PROJECT = pathlib.Path(__file__).resolve().parent.parent.parent
 BUILD = pathlib.Path(os.environ["QVX_BUILD"])
 SERVICE = "android.hardware.vibrator-service.quorvan"
 
-# Below the prefix, with their modes. The folder of libraries has the machine's name in it on some
+# Below the prefix, with their modes. The directory of libraries has the machine's name in it on some
 # prefixes; LIBRARIES stands for it.
 FILES = {
     "bin/vibctl": 0o755,
     "LIBRARIES/qvx-vibrator/libbinder_ndk.so": 0o644,
     "lib/modprobe.d/qvx-vibrator.conf": 0o644,
+    "lib/modules-load.d/qvx-vibrator.conf": 0o644,
     "lib/systemd/system/qvx-servicemanager.service": 0o644,
+    "lib/systemd/system/qvx-vibrator-watchdog.service": 0o644,
+    "lib/systemd/system/qvx-vibrator-watchdog.timer": 0o644,
     "lib/systemd/system/qvx-vibrator.service": 0o644,
     "lib/sysusers.d/qvx-vibrator.conf": 0o644,
     "lib/udev/rules.d/60-qvx-vibrator.rules": 0o644,
@@ -23,9 +26,12 @@ FILES = {
     "libexec/qvx-vibrator/servicemanager": 0o755,
     "share/bash-completion/completions/vibctl": 0o644,
     "share/doc/qvx-vibrator/bring-up.md": 0o644,
+    "share/doc/qvx-vibrator/changelog.gz": 0o644,
     "share/doc/qvx-vibrator/copyright": 0o644,
     "share/doc/qvx-vibrator/interfaces.md": 0o644,
-    "share/man/man1/vibctl.1": 0o644,
+    "share/man/man1/vibctl.1.gz": 0o644,
+    "share/man/man8/servicemanager.8.gz": 0o644,
+    "share/qvx-vibrator/services.rules": 0o644,
     "share/qvx-vibrator/vendor/etc/vintf/manifest/"
     "android.hardware.vibrator-service.quorvan.xml": 0o644,
 }
@@ -46,9 +52,9 @@ def install(destination, prefix):
         env={**os.environ, "DESTDIR": str(destination)})
 
 
-def files_below(folder, prefix):
-    """Every file below `prefix` in `folder`, with its mode, named as in FILES."""
-    root = folder / prefix.lstrip("/")
+def files_below(directory, prefix):
+    """Every file below `prefix` in `directory`, with its mode, named as in FILES."""
+    root = directory / prefix.lstrip("/")
     found = {}
     for path in root.rglob("*"):
         if path.is_dir():

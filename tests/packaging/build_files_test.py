@@ -1,5 +1,5 @@
 # SPDX-License-Identifier: Apache-2.0
-"""The Android.bp files against the folders they build, and against the build that runs here."""
+"""The Android.bp files against the directories they build, and against the build that runs here."""
 
 import pathlib
 import re
@@ -8,8 +8,10 @@ import unittest
 import blueprint
 import project
 
-FOLDERS = {name: project.ROOT / name for name in (
-    "hal-server/vibrator/aidl", "hal-server/vibrator/aidl/default", "tests/service", "fuzz")}
+TESTS = project.HAL / "tests"
+DIRECTORIES = {name: project.ROOT / name for name in (
+    "hal-server/vibrator/aidl", "hal-server/vibrator/aidl/default",
+    "hal-server/vibrator/aidl/tests", "hal-server/vibrator/aidl/fuzz", "vibctl")}
 
 # The kinds of module in use and their properties; a property that the build does not know ends it.
 COMMON = {"name", "defaults", "vendor", "cpp_std", "cflags", "cppflags", "srcs", "shared_libs",
@@ -18,7 +20,7 @@ PROPERTIES = {
     "package": {"default_applicable_licenses"},
     "cc_defaults": COMMON,
     "cc_library_static": COMMON | {"export_include_dirs"},
-    "cc_binary": COMMON | {"relative_install_path", "init_rc", "vintf_fragments"},
+    "cc_binary": COMMON | {"include_dirs", "relative_install_path", "init_rc", "vintf_fragments"},
     "cc_test": COMMON | {"test_suites"},
     "cc_fuzz": COMMON | {"corpus"},
     "aidl_interface": {"name", "owner", "vendor_available", "srcs", "stability", "imports",
@@ -26,23 +28,24 @@ PROPERTIES = {
 }
 
 # What the platform's own build files define.
-PLATFORM_LIBRARIES = {"libbase", "liblog", "libbinder_ndk", "libgmock",
+PLATFORM_LIBRARIES = {"libbase", "liblog", "libbinder_ndk", "libgmock", "fmtlib", "libjsoncpp",
+                      "libtinyxml2",
                       "android.hardware.vibrator-V2-ndk_platform"}
 
-# Headers of tests/service by which a test puts a kernel of its own under the service.
-IMITATION = re.compile(r"imitated_|interposed_|service_test\.h|vibrator_test\.h|log_capture\.h")
+# Headers of the service's tests by which a test puts a kernel of its own under the service.
+FAKES = re.compile(r"fake_|interposed_|service_test\.h|vibrator_test\.h|log_capture\.h")
 
 
-def is_imitating(path, seen=None):
-    """Whether a test includes one of those headers, itself or through another header beside it."""
+def uses_fakes(path, seen=None):
+    """Whether a test includes one of those headers, itself or through another header of the tests."""
     seen = set() if seen is None else seen
     for quote, name in project.includes(path):
-        header = path.parent / name
-        if IMITATION.search(name):
+        header = project.HAL / name
+        if FAKES.search(name):
             return True
         if quote == '"' and header.is_file() and header not in seen:
             seen.add(header)
-            if is_imitating(header, seen):
+            if uses_fakes(header, seen):
                 return True
     return False
 
@@ -50,10 +53,10 @@ def is_imitating(path, seen=None):
 class BuildFiles(unittest.TestCase):
     @classmethod
     def setUpClass(cls):
-        cls.files = {name: blueprint.read(folder / "Android.bp")
-                     for name, folder in FOLDERS.items()}
+        cls.files = {name: blueprint.read(directory / "Android.bp")
+                     for name, directory in DIRECTORIES.items()}
         cls.modules = [module for modules in cls.files.values() for module in modules]
-        cls.folder_of = {module.name: FOLDERS[name] for name, modules in cls.files.items()
+        cls.directory_of = {module.name: DIRECTORIES[name] for name, modules in cls.files.items()
                          for module in modules if module.name}
 
     def joined(self, name):
@@ -66,10 +69,10 @@ class BuildFiles(unittest.TestCase):
 
 class EveryModule(BuildFiles):
     def test_every_build_file_is_looked_at(self):
-        found = {str(path.parent.relative_to(project.ROOT)) for folder in (
+        found = {str(path.parent.relative_to(project.ROOT)) for directory in (
             "hal-server", "tests", "fuzz", "platform", "vibctl", "handset", "bench")
-            for path in (project.ROOT / folder).rglob("Android.bp")}
-        self.assertEqual(found, set(FOLDERS))
+            for path in (project.ROOT / directory).rglob("Android.bp")}
+        self.assertEqual(found, set(DIRECTORIES))
 
     def test_kinds_and_properties_are_known(self):
         for module in self.modules:
@@ -92,11 +95,11 @@ class EveryModule(BuildFiles):
 
     def test_sources_exist(self):
         for module in self.modules:
-            folder = self.folder_of.get(module.name)
+            directory = self.directory_of.get(module.name)
             for key in ("srcs", "init_rc", "vintf_fragments", "corpus"):
                 for pattern in module.properties.get(key, []):
                     with self.subTest(f"{module.name}: {pattern}"):
-                        self.assertTrue(list(folder.glob(pattern)))
+                        self.assertTrue(list(directory.glob(pattern)))
 
     def test_libraries_exist(self):
         interface = self.joined(project.EXTENSION_PACKAGE)
@@ -123,14 +126,14 @@ class Service(BuildFiles):
 
     def test_every_fragment_is_installed(self):
         # The handset installs every .xml file beside the service; so must the phone.
-        self.assertEqual([path.name for path in project.service_files(".xml")],
+        self.assertEqual(project.service_names(".xml"),
                          self.program["vintf_fragments"])
 
     def test_sources_are_all_there_is(self):
-        sources = [path.name for path in project.service_files(".cpp")]
+        sources = project.service_names(".cpp")
         self.assertEqual(self.program["srcs"], ["main.cpp"])
         self.assertEqual(self.program["static_libs"], ["libqvx_vibrator"])
-        self.assertEqual(sorted(self.library["srcs"] + ["main.cpp"]), sources)
+        self.assertEqual(sorted(self.library["srcs"] + ["main.cpp"]), sorted(sources))
 
     def test_sources_are_those_of_the_build_here(self):
         words = project.cmake_words(project.SERVICE / "CMakeLists.txt", "add_library(qvx_vibrator ")
@@ -153,6 +156,31 @@ class Service(BuildFiles):
 
     def test_warnings_are_errors(self):
         self.assertEqual(self.library["cflags"], ["-Wall", "-Wextra", "-Werror"])
+
+
+class Client(BuildFiles):
+    def setUp(self):
+        self.program = self.joined("vibctl")
+
+    def test_sources_are_those_of_the_build_here(self):
+        build = DIRECTORIES["vibctl"] / "CMakeLists.txt"
+        words = (project.cmake_words(build, "add_library(vibctl_core ")[1:] +
+                 project.cmake_words(build, "add_executable(vibctl "))
+        self.assertEqual(self.program["srcs"], sorted(words))
+
+    def test_includes_nothing_that_the_tree_lacks(self):
+        libraries = r"(aidl|android|android-base|fmt|json)/|(log/log|tinyxml2)\.h$"
+        for name in self.program["srcs"]:
+            for quote, header in project.includes(DIRECTORIES["vibctl"] / name):
+                with self.subTest(f"{name}: {header}"):
+                    if quote == '"':
+                        self.assertTrue(header.startswith("vibctl/"))
+                    elif "/" in header or header == "tinyxml2.h":
+                        self.assertRegex(header, rf"^(sys/|{libraries})")
+
+    def test_version_is_that_of_the_build_here(self):
+        version = project.cmake_words(project.ROOT / "CMakeLists.txt", "project(qvx-vibrator ")[1]
+        self.assertIn(f"-DVIBCTL_VERSION={version}", self.program["cflags"])
 
 
 class Interface(BuildFiles):
@@ -197,14 +225,14 @@ class TestsAndFuzzers(BuildFiles):
         (tests,) = self.of_kind("cc_test")
         for name in tests["srcs"]:
             with self.subTest(name):
-                self.assertFalse(is_imitating(FOLDERS["tests/service"] / name))
+                self.assertFalse(uses_fakes(TESTS / name))
 
-    def test_imitation_is_recognised(self):
-        self.assertTrue(is_imitating(FOLDERS["tests/service"] / "probing_test.cpp"))
+    def test_a_fake_is_recognised(self):
+        self.assertTrue(uses_fakes(TESTS / "probing_test.cpp"))
 
     def test_every_fuzzer_of_the_service_is_built(self):
-        headers = {path.name for path in project.service_files(".h")}
-        fuzzers = {path.name for path in FOLDERS["fuzz"].glob("*_fuzzer.cpp")
+        headers = set(project.service_names(".h"))
+        fuzzers = {path.name for path in (project.HAL / "fuzz").glob("*_fuzzer.cpp")
                    if headers & {name for _, name in project.includes(path)}}
         self.assertIn("composite_fuzzer.cpp", fuzzers)
         self.assertEqual({source for each in self.of_kind("cc_fuzz") for source in each["srcs"]},

@@ -4,7 +4,6 @@
 import re
 import unittest
 
-import init_script
 import project
 
 DOCUMENT = project.ROOT / "docs/android.md"
@@ -15,42 +14,27 @@ def blocks(language):
                       re.MULTILINE | re.DOTALL)
 
 
-def nodes_to_hand_over():
-    """Every node that the service writes or that may be its user's alone: the fixed ones, and in
-    both classes the leaves that probing puts behind the class's folder."""
-    constants = set(project.string_literals(project.SERVICE / "Constants.h"))
-    fixed = {path for path in constants if path.startswith("/sys/class/")
-             and "/vib_info_class/" not in path and not path.endswith("/dc_pmic")}
-    probing = project.SERVICE / "Probing.cpp"
-    leaves = re.findall(r'\{THE_DEVICE_\w+,\s*"(\w+)"', project.code(probing))
-    folders = [literal for literal in project.string_literals(probing) if literal.endswith("/")
-               and literal.startswith("/sys/class/")]
-    others = {literal for literal in project.string_literals(probing)
-              if literal.startswith("/sys/class/") and not literal.endswith("/")}
-    assert len(leaves) == 21 and len(folders) == 2
-    return fixed | others | {folder + leaf for folder in folders for leaf in leaves}
-
-
 class Document(unittest.TestCase):
-    def test_init_section_hands_over_every_node_the_service_opens(self):
-        (text,) = blocks("rc")
-        (section,) = init_script.parse(text)
-        # Class "hal" is started by the action "boot", which comes next.
-        self.assertEqual(section.words, ["on", "early-boot"])
-        self.assertEqual({tuple(option[:3]) for option in section.options},
-                         {("chown", "system", "system")})
-        self.assertEqual({option[3] for option in section.options}, nodes_to_hand_over())
-
-    def test_makefile_line_names_the_makefile(self):
+    def test_makefile_lines_name_the_makefile_and_a_script(self):
         (text,) = blocks("make")
-        path = re.fullmatch(r"\$\(call inherit-product, vendor/quorvan/(.*)\)\n", text)[1]
+        script, path = re.fullmatch(r"QVX_VIBRATOR_CLASS := (\w+)\n"
+                                    r"\$\(call inherit-product, vendor/quorvan/(.*)\)\n",
+                                    text).groups()
         self.assertTrue((project.ROOT / path).is_file())
+        self.assertTrue((project.HAL / f"init/init.vibrator-{script}.rc").is_file())
 
-    def test_files_of_the_table_exist(self):
-        names = re.findall(r"`([^`]+)`",
-                           "".join(re.findall(r"(?m)^\| (`[^|]*) \| [^|]* \|$",
-                                              project.text(DOCUMENT))))
-        self.assertIn("vibrator.mk", names)
+    def test_log_tags_are_the_services(self):
+        (tags,) = re.findall(r"logcat -d -s (.*)", project.text(DOCUMENT))
+        self.assertEqual(set(tags.split()),
+                         set(re.findall(r'#define LOG_TAG "([^"]+)"', "".join(
+                             project.text(path) for path in project.service_files(".cpp")))))
+
+    def test_files_that_it_names_exist(self):
+        text = project.text(DOCUMENT)
+        first_cells = "".join(re.findall(r"(?m)^\| (`[^|]*) \| [^|]* \|$", text))
+        names = {name for name in re.findall(r"`([^`]+)`", first_cells)
+                 if not name.startswith("CONFIG_")} | set(re.findall(r"`(init/[^`]+)`", text))
+        self.assertLessEqual({"vibrator.mk", "init/init.vibrator-leds.rc"}, names)
         for name in names:
             with self.subTest(name):
                 self.assertTrue((project.HAL / name).exists())

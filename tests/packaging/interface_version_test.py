@@ -12,7 +12,7 @@ import project
 
 COMPILER = project.ROOT / "platform/aidl/aidl"
 VERSION = str(project.extension_version())
-FOLDER = project.EXTENSION_PACKAGE.replace(".", "/")
+DIRECTORY = project.EXTENSION_PACKAGE.replace(".", "/")
 
 
 def compiler(*arguments):
@@ -20,19 +20,19 @@ def compiler(*arguments):
                           capture_output=True, text=True, check=False)
 
 
-def contents(folder):
-    return {str(path.relative_to(folder)): path.read_text(encoding="utf-8")
-            for path in folder.rglob("*.aidl")}
+def contents(directory):
+    return {str(path.relative_to(directory)): path.read_text(encoding="utf-8")
+            for path in directory.rglob("*.aidl")}
 
 
 def complaints(interface):
-    """What is wrong with the interface in this folder, laid out as the extension's is: any of
+    """What is wrong with the interface in this directory, laid out as the extension's is: any of
     "invalid", "changed", "incompatible" and "hash"."""
     found = []
     frozen = interface / "aidl_api" / project.EXTENSION_PACKAGE / VERSION
     include = f"--include={project.STANDARD_AIDL}"
-    with tempfile.TemporaryDirectory() as folder:
-        now = pathlib.Path(folder)
+    with tempfile.TemporaryDirectory() as directory:
+        now = pathlib.Path(directory)
         if compiler("--dumpapi", now, include, f"--include={interface}",
                     *project.aidl_files(interface, project.EXTENSION_PACKAGE)).returncode != 0:
             return ["invalid"]
@@ -48,9 +48,9 @@ def complaints(interface):
 
 class ChangedInterface(unittest.TestCase):
     def setUp(self):
-        folder = tempfile.TemporaryDirectory()
-        self.addCleanup(folder.cleanup)
-        self.copy = pathlib.Path(folder.name)
+        directory = tempfile.TemporaryDirectory()
+        self.addCleanup(directory.cleanup)
+        self.copy = pathlib.Path(directory.name)
         for name in ("vendor", "aidl_api"):
             shutil.copytree(project.HAL / name, self.copy / name)
 
@@ -65,33 +65,33 @@ class ChangedInterface(unittest.TestCase):
         self.assertEqual(complaints(self.copy), [])
 
     def test_new_field_needs_a_new_version(self):
-        name = f"{FOLDER}/ZelPlaybackPacket.aidl"
+        name = f"{DIRECTORY}/ZelPlaybackPacket.aidl"
         text = project.text(self.copy / name).rstrip()
         (self.copy / name).write_text(text.removesuffix("}") + "    int added;\n}\n",
                                       encoding="utf-8")
         self.assertEqual(complaints(self.copy), ["changed"])
 
     def test_new_type_needs_a_new_version(self):
-        (self.copy / FOLDER / "ZelNew.aidl").write_text(
+        (self.copy / DIRECTORY / "ZelNew.aidl").write_text(
             f"package {project.EXTENSION_PACKAGE};\n@VintfStability\nparcelable ZelNew {{\n}}\n",
             encoding="utf-8")
         self.assertEqual(complaints(self.copy), ["changed"])
 
     def test_lost_type_is_not_allowed_in_any_version(self):
-        (self.copy / FOLDER / "ZelPlaybackPacket.aidl").unlink()
+        (self.copy / DIRECTORY / "ZelPlaybackPacket.aidl").unlink()
         self.assertEqual(complaints(self.copy), ["invalid"])
 
     def test_renamed_method_is_not_allowed_in_any_version(self):
-        self.change(f"{FOLDER}/IZelVibrator.aidl", " performPlaybackEngine(", " playSequence(")
+        self.change(f"{DIRECTORY}/IZelVibrator.aidl", " performPlaybackEngine(", " playSequence(")
         self.assertEqual(complaints(self.copy), ["changed", "incompatible"])
 
     def test_comment_is_no_change(self):
-        self.change(f"{FOLDER}/IZelVibrator.aidl", "@VintfStability\n",
+        self.change(f"{DIRECTORY}/IZelVibrator.aidl", "@VintfStability\n",
                     "// An aside.\n@VintfStability\n")
         self.assertEqual(complaints(self.copy), [])
 
     def test_frozen_files_stay_under_their_hash(self):
-        frozen = f"aidl_api/{project.EXTENSION_PACKAGE}/{VERSION}/{FOLDER}"
+        frozen = f"aidl_api/{project.EXTENSION_PACKAGE}/{VERSION}/{DIRECTORY}"
         self.change(f"{frozen}/ZelPlaybackPacket.aidl", "package vendor.", "package  vendor.")
         self.assertEqual(complaints(self.copy), ["changed", "hash"])
 

@@ -94,10 +94,10 @@ def paths_in_the_code():
 class Policy(unittest.TestCase):
     @classmethod
     def setUpClass(cls):
-        folder = tempfile.TemporaryDirectory()
-        cls.addClassCleanup(folder.cleanup)
-        cls.folder = pathlib.Path(folder.name)
-        cls.policy = security_policy.compile_text(security_policy.source(), cls.folder)
+        directory = tempfile.TemporaryDirectory()
+        cls.addClassCleanup(directory.cleanup)
+        cls.directory = pathlib.Path(directory.name)
+        cls.policy = security_policy.compile_text(security_policy.source(), cls.directory)
 
     def label(self, path):
         """The type of what a path of the code names; a node's class link is followed."""
@@ -177,10 +177,10 @@ class Labels(Policy):
                 self.assertNotIn((label, "file"), GRANTED)
 
     def test_every_node_of_a_class_is_covered(self):
-        for folder in ("/sys/class/timed_output/vibrator/", "/sys/class/leds/vibrator/"):
+        for directory in ("/sys/class/timed_output/vibrator/", "/sys/class/leds/vibrator/"):
             for leaf in ("intensity", "motor_type", "cp_trigger_queue", "vibe_state"):
-                with self.subTest(folder + leaf):
-                    self.assertEqual(self.label(folder + leaf), REACHED[folder][0])
+                with self.subTest(directory + leaf):
+                    self.assertEqual(self.label(directory + leaf), REACHED[directory][0])
 
     def test_program_of_the_init_script_has_the_programs_type(self):
         for path in (f"/vendor/bin/hw/{project.PROGRAM}",
@@ -192,16 +192,16 @@ class Labels(Policy):
 
     def test_contexts_name_types_of_the_policy(self):
         types = security_policy.types(self.policy)
-        for folder in (project.POLICY, security_policy.PLATFORM):
+        for directory in (project.POLICY, security_policy.PLATFORM):
             for name in ("file_contexts", "service_contexts"):
-                for pattern, label in security_policy.read_contexts(folder / name):
+                for pattern, label in security_policy.read_contexts(directory / name):
                     with self.subTest(pattern):
                         self.assertIn(label, types)
 
     def test_registered_name_is_labelled_once(self):
         # The lookup of the whole phone fails when a name has two lines.
-        lines = [line for folder in (project.POLICY, security_policy.PLATFORM)
-                 for line in security_policy.read_contexts(folder / "service_contexts")]
+        lines = [line for directory in (project.POLICY, security_policy.PLATFORM)
+                 for line in security_policy.read_contexts(directory / "service_contexts")]
         self.assertEqual(lines, [("android.hardware.vibrator.IVibrator/default",
                                   "hal_vibrator_service")])
 
@@ -211,7 +211,7 @@ class Mistakes(Policy):
 
     def compile_with(self, line):
         text = security_policy.source().replace("role r;", f"{line}\nrole r;", 1)
-        return security_policy.compile_text(text, self.folder)
+        return security_policy.compile_text(text, self.directory)
 
     def test_additional_rule_is_seen(self):
         policy = self.compile_with(f"allow {DOMAIN} sysfs:file read;")

@@ -29,7 +29,12 @@ def code(path):
 
 
 def service_files(*suffixes):
-    return sorted(path for path in SERVICE.iterdir() if path.suffix in suffixes)
+    return sorted(path for path in SERVICE.rglob("*") if path.suffix in suffixes)
+
+
+def service_names(*suffixes):
+    """The same by their paths below the service's directory, as its sources include them."""
+    return [str(path.relative_to(SERVICE)) for path in service_files(*suffixes)]
 
 
 def string_literals(path):
@@ -58,7 +63,8 @@ def aidl_imports(path):
 
 
 def standard_version():
-    words = cmake_words(STANDARD_AIDL / "CMakeLists.txt", "aidl_interface_library(")
+    words = cmake_words(STANDARD_AIDL / "CMakeLists.txt",
+                        f"aidl_interface_library({STANDARD_PACKAGE}-V")
     return int(words[words.index("VERSION") + 1])
 
 

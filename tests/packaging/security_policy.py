@@ -27,10 +27,10 @@ def source(vendor=project.POLICY):
     return "".join(map(project.text, parts))
 
 
-def compile_text(text, folder):
-    """The compiled policy, whose file is kept in `folder`."""
-    folder = pathlib.Path(folder)
-    expanded, compiled = folder / "policy.conf", folder / "policy"
+def compile_text(text, directory):
+    """The compiled policy, whose file is kept in `directory`."""
+    directory = pathlib.Path(directory)
+    expanded, compiled = directory / "policy.conf", directory / "policy"
     expanded.write_text(_run(["m4", "--synclines", "-"], text), encoding="utf-8")
     _run(["checkpolicy", "-M", "-c", "30", "-o", str(compiled), str(expanded)])
     return setools.SELinuxPolicy(str(compiled))
@@ -92,7 +92,7 @@ def read_contexts(path):
 
 def file_label(path):
     """The type of a file on a disk or in /dev; the last pattern that fits decides."""
-    fitting = [label for folder in (PLATFORM, project.POLICY)
-               for pattern, label in read_contexts(folder / "file_contexts")
+    fitting = [label for directory in (PLATFORM, project.POLICY)
+               for pattern, label in read_contexts(directory / "file_contexts")
                if re.fullmatch(pattern, path)]
     return fitting[-1] if fitting else None

@@ -15,8 +15,8 @@ def main(arguments):
         print("usage: service_size.py STRIP PROGRAM LIMIT", file=sys.stderr)
         return 2
     strip, program, limit = arguments[0], pathlib.Path(arguments[1]), int(arguments[2])
-    with tempfile.TemporaryDirectory() as folder:
-        stripped = pathlib.Path(folder) / program.name
+    with tempfile.TemporaryDirectory() as directory:
+        stripped = pathlib.Path(directory) / program.name
         subprocess.run([strip, "-o", str(stripped), str(program)], check=True)
         size = stripped.stat().st_size
     kib = size / 1024

@@ -96,15 +96,18 @@ class Product(unittest.TestCase):
         lines = [line for line in project.text(project.HAL / "vibrator.mk").splitlines()
                  if line and not line.startswith("#")]
         self.assertEqual(lines, [
-            "QVX_VIBRATOR_FOLDER := $(patsubst %/,%,$(dir $(lastword $(MAKEFILE_LIST))))",
+            "QVX_VIBRATOR_DIRECTORY := $(patsubst %/,%,$(dir $(lastword $(MAKEFILE_LIST))))",
             "PRODUCT_PACKAGES += android.hardware.vibrator-service.quorvan",
-            "BOARD_VENDOR_SEPOLICY_DIRS += $(QVX_VIBRATOR_FOLDER)/sepolicy"])
+            "PRODUCT_COPY_FILES += $(foreach class,$(QVX_VIBRATOR_CLASS), \\",
+            "    $(QVX_VIBRATOR_DIRECTORY)/init/init.vibrator-$(class).rc:"
+            "$(TARGET_COPY_OUT_VENDOR)/etc/init/init.vibrator-$(class).rc)",
+            "BOARD_VENDOR_SEPOLICY_DIRS += $(QVX_VIBRATOR_DIRECTORY)/sepolicy"])
         self.assertTrue((project.HAL / "sepolicy").is_dir())
 
     def test_test_mapping_names_tests_that_exist(self):
         mapping = json.loads(project.text(project.HAL / "TEST_MAPPING"))
         names = {group: [test["name"] for test in tests] for group, tests in mapping.items()}
-        built = [module.name for module in blueprint.read(project.ROOT / "tests/service/Android.bp")
+        built = [module.name for module in blueprint.read(project.ROOT / "hal-server/vibrator/aidl/tests/Android.bp")
                  if module.kind == "cc_test"]
         self.assertEqual(names["presubmit"], built)
         # The platform's own test of every vibrator service.

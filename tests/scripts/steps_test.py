@@ -4,6 +4,7 @@
 import contextlib
 import os
 import pathlib
+import pty
 import signal
 import subprocess
 import tempfile
@@ -28,14 +29,14 @@ def is_running(pid):
 
 class Steps(unittest.TestCase):
     def setUp(self):
-        folder = tempfile.TemporaryDirectory()
-        self.addCleanup(folder.cleanup)
-        self.folder = pathlib.Path(folder.name)
+        directory = tempfile.TemporaryDirectory()
+        self.addCleanup(directory.cleanup)
+        self.directory = pathlib.Path(directory.name)
 
     def start(self, script):
         process = subprocess.Popen(
-            ["bash", "-c", f"set -euo pipefail\n. {STEPS}\n{script}"], cwd=self.folder,
-            env={**os.environ, "TMPDIR": str(self.folder)}, text=True,
+            ["bash", "-c", f"set -euo pipefail\n. {STEPS}\n{script}"], cwd=self.directory,
+            env={**os.environ, "TMPDIR": str(self.directory)}, text=True,
             stdout=subprocess.PIPE, stderr=subprocess.PIPE)
         self.addCleanup(process.communicate)
         self.addCleanup(process.kill)
@@ -50,6 +51,40 @@ class Steps(unittest.TestCase):
         status, output, errors = self.finish("step quiet echo hidden; echo after")
         self.assertEqual((status, errors), (0, ""))
         self.assertRegex(output, r"\A-- quiet \(\d s\)\nafter\n\Z")
+
+    def test_show_each_step_once_where_no_terminal_is(self):
+        status, output, _ = self.finish("step slow sh -c 'for i in 1 2 3; do echo $i; sleep 0.7; done'")
+        self.assertEqual(status, 0)
+        self.assertRegex(output, r"\A-- slow \(\d s\)\n\Z")
+
+    def test_show_their_newest_line_on_a_terminal(self):
+        master, terminal = pty.openpty()
+        self.addCleanup(os.close, master)
+        process = subprocess.Popen(
+            ["bash", "-c", f". {STEPS}; step slow sh -c 'echo early; sleep 2.5'"], stdout=terminal,
+            env={**os.environ, "TERM": "xterm"})
+        os.close(terminal)
+        self.assertEqual(process.wait(timeout=30), 0)
+        output = os.read(master, 65536).decode()
+        self.assertIn("\r\033[K-- slow, 1 s  early", output)
+        self.assertRegex(output, r"\r\033\[K-- slow \(\d s\)\r\n\Z")
+
+    def test_without_a_reader_end_with_all_that_they_started(self):
+        for runner in ("step long", "whole"):
+            with self.subTest(runner=runner):
+                process, grandchild = self.grandchild_of(runner, "sleep 1; echo more; wait")
+                process.stdout.close()
+                process.send_signal(signal.SIGPIPE)
+                self.assertEqual(process.wait(timeout=20), 141)
+                self.assert_ends(grandchild)
+                self.assertEqual(list(self.directory.iterdir()), [])
+
+    def test_without_a_reader_end_without_a_word(self):
+        process = self.start("step one sleep 0.5; step two true; step three touch reached")
+        process.stdout.close()
+        self.assertEqual(process.stderr.read(), "")
+        self.assertEqual(process.wait(timeout=20), 141)
+        self.assertFalse((self.directory / "reached").exists())
 
     def test_show_the_output_of_what_fails_and_end_with_its_status(self):
         status, output, errors = self.finish("step broken sh -c 'echo why; exit 7'; echo after")
@@ -66,12 +101,12 @@ class Steps(unittest.TestCase):
     def test_leave_no_file(self):
         self.finish("step good true")
         self.finish("step bad false")
-        self.assertEqual(list(self.folder.iterdir()), [])
+        self.assertEqual(list(self.directory.iterdir()), [])
 
     def grandchild_of(self, runner, then):
         """Starts a command that starts a long one and then does `then`; gives both."""
         process = self.start(f"{runner} sh -c 'sleep 1000 & echo $! >grandchild; {then}'")
-        grandchild = self.folder / "grandchild"
+        grandchild = self.directory / "grandchild"
         limit = time.monotonic() + 20
         while not (grandchild.exists() and grandchild.read_text("ascii").endswith("\n")):
             self.assertLess(time.monotonic(), limit)
@@ -96,7 +131,7 @@ class Steps(unittest.TestCase):
                     process.send_signal(number)
                     self.assertEqual(process.wait(timeout=20), 130)
                     self.assert_ends(grandchild)
-                    self.assertEqual(list(self.folder.iterdir()), [])
+                    self.assertEqual(list(self.directory.iterdir()), [])
 
     def test_failed_take_along_all_that_they_started(self):
         for runner in ("step long", "whole"):

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "command.h"
+#include "tests/support/command.h"
 
 #include <fcntl.h>
 #include <poll.h>
@@ -9,10 +9,14 @@
 
 #include <array>
 
+#include <android-base/unique_fd.h>
+
 extern char** environ;
 
 namespace qvx::test {
 namespace {
+
+using android::base::unique_fd;
 
 // Appends what is readable; false at the end of the stream.
 bool drain(int fd, std::string* text) {
@@ -26,15 +30,17 @@ bool drain(int fd, std::string* text) {
 }  // namespace
 
 CommandResult runCommand(const std::vector<std::string>& arguments) {
-    std::array<int, 2> out{};
-    std::array<int, 2> err{};
-    if (pipe2(out.data(), O_CLOEXEC) != 0 || pipe2(err.data(), O_CLOEXEC) != 0) return {};
+    unique_fd out;
+    unique_fd outEnd;
+    unique_fd err;
+    unique_fd errEnd;
+    if (!android::base::Pipe(&out, &outEnd) || !android::base::Pipe(&err, &errEnd)) return {};
 
     posix_spawn_file_actions_t actions;
     posix_spawn_file_actions_init(&actions);
     posix_spawn_file_actions_addopen(&actions, STDIN_FILENO, "/dev/null", O_RDONLY, 0);
-    posix_spawn_file_actions_adddup2(&actions, out[1], STDOUT_FILENO);
-    posix_spawn_file_actions_adddup2(&actions, err[1], STDERR_FILENO);
+    posix_spawn_file_actions_adddup2(&actions, outEnd.get(), STDOUT_FILENO);
+    posix_spawn_file_actions_adddup2(&actions, errEnd.get(), STDERR_FILENO);
 
     std::vector<std::string> words = arguments;
     std::vector<char*> argv;
@@ -44,16 +50,16 @@ CommandResult runCommand(const std::vector<std::string>& arguments) {
     pid_t pid = -1;
     const int failure = posix_spawnp(&pid, argv[0], &actions, nullptr, argv.data(), environ);
     posix_spawn_file_actions_destroy(&actions);
-    close(out[1]);
-    close(err[1]);
+    outEnd.reset();
+    errEnd.reset();
 
     CommandResult result;
     if (failure == 0) {
-        std::array<pollfd, 2> streams{{{out[0], POLLIN, 0}, {err[0], POLLIN, 0}}};
+        std::array<pollfd, 2> streams{{{out.get(), POLLIN, 0}, {err.get(), POLLIN, 0}}};
         while (streams[0].fd >= 0 || streams[1].fd >= 0) {
             if (poll(streams.data(), streams.size(), -1) < 0) break;
-            if (streams[0].revents != 0 && !drain(out[0], &result.out)) streams[0].fd = -1;
-            if (streams[1].revents != 0 && !drain(err[0], &result.err)) streams[1].fd = -1;
+            if (streams[0].revents != 0 && !drain(out.get(), &result.out)) streams[0].fd = -1;
+            if (streams[1].revents != 0 && !drain(err.get(), &result.err)) streams[1].fd = -1;
         }
         int status = 0;
         waitpid(pid, &status, 0);
@@ -61,8 +67,6 @@ CommandResult runCommand(const std::vector<std::string>& arguments) {
     } else {
         result.status = 127;
     }
-    close(out[0]);
-    close(err[0]);
     return result;
 }
 

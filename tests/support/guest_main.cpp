@@ -1,9 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The main function of test programs that run in the guest: GoogleTest's, and after the last test
 // a look at the kernel log, which must hold no complaint about binder.
 #include <gtest/gtest.h>
 
-#include "kernel_log.h"
+#include "tests/support/kernel_log.h"
 
 namespace {
 

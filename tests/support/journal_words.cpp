@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "journal_words.h"
+#include "tests/support/journal_words.h"
 
 namespace qvx::test {
 namespace {

@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // A line of the driver's journal in words, short enough to be compared by eye:
 //
 //   "open LEAF O_RDWR"   "read LEAF SIZE"   "write LEAF DATA"   "close LEAF"
@@ -8,8 +9,9 @@
 // with " = " and the error's name or, of a write, the count that was taken.
 #pragma once
 
-#include <nlohmann/json.hpp>
 #include <string>
+
+#include <nlohmann/json.hpp>
 
 namespace qvx::test {
 

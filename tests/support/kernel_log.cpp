@@ -1,12 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "kernel_log.h"
+#include "tests/support/kernel_log.h"
 
 #include <fcntl.h>
 #include <sys/klog.h>
 #include <unistd.h>
 
-#include <sstream>
 #include <string_view>
+
+#include <android-base/strings.h>
+#include <android-base/unique_fd.h>
 
 namespace qvx::test {
 namespace {
@@ -17,10 +19,9 @@ constexpr int kReadAll = 3;      // SYSLOG_ACTION_READ_ALL of syslog(2)
 constexpr int kSizeBuffer = 10;  // SYSLOG_ACTION_SIZE_BUFFER
 
 void writeMarker(std::string_view text) {
-    const int fd = open("/dev/kmsg", O_WRONLY | O_CLOEXEC);
-    if (fd < 0) return;
+    // One write makes one record.
+    const android::base::unique_fd fd(open("/dev/kmsg", O_WRONLY | O_CLOEXEC));
     [[maybe_unused]] const ssize_t written = write(fd, text.data(), text.size());
-    close(fd);
 }
 
 std::string readKernelLog() {
@@ -42,9 +43,8 @@ ExpectBinderComplaints::~ExpectBinderComplaints() {
 
 std::vector<std::string> binderComplaints() {
     std::vector<std::string> complaints;
-    std::istringstream log(readKernelLog());
     bool expected = false;
-    for (std::string line; std::getline(log, line);) {
+    for (const std::string& line : android::base::Split(readKernelLog(), "\n")) {
         if (line.find("complaints expected from here") != std::string::npos) expected = true;
         if (line.find("complaints expected up to here") != std::string::npos) expected = false;
         if (!expected && line.find("binder") != std::string::npos) complaints.push_back(line);

@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // What the guest's kernel said about binder. The driver logs every misuse it sees, so a quiet log
 // is evidence that this project's processes keep its protocol.
 #pragma once

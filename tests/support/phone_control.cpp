@@ -1,37 +1,39 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "phone_control.h"
+#include "tests/support/phone_control.h"
 
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
-#include <sstream>
+
+#include <android-base/file.h>
+#include <android-base/strings.h>
 
 namespace qvx::test {
 namespace {
 
-constexpr const char* kOutFolder = "/run/system-test";
+constexpr const char* kOutDirectory = "/run/system-test";
 
 std::string readFile(const std::string& path) {
-    std::ostringstream text;
-    text << std::ifstream(path, std::ios::binary).rdbuf();
-    return text.str();
+    std::string text;
+    android::base::ReadFileToString(path, &text);
+    return text;
 }
 
 }  // namespace
 
 Phone::Phone(const nlohmann::json& profile, const std::vector<std::string>& options)
-    : out_(kOutFolder) {
-    std::filesystem::remove_all(out_);
+    : mOut(kOutDirectory) {
+    std::filesystem::remove_all(mOut);
     std::string name;
     if (profile.is_string()) {
         name = profile.get<std::string>();
     } else {
-        name = out_ + "-profile.json";
+        name = mOut + "-profile.json";
         std::ofstream(name) << profile.dump();
     }
-    std::vector<std::string> command = {"phone", "up", "--profile", name, "--out", out_};
+    std::vector<std::string> command = {"phone", "up", "--profile", name, "--out", mOut};
     command.insert(command.end(), options.begin(), options.end());
-    up_ = runCommand(command);
+    mUp = runCommand(command);
 }
 
 Phone::~Phone() {
@@ -46,9 +48,9 @@ nlohmann::json Phone::call(const std::vector<std::string>& words) const {
 
 std::vector<nlohmann::json> Phone::journal() const {
     std::vector<nlohmann::json> lines;
-    std::istringstream text(runCommand({"phone", "journal"}).out);
-    for (std::string line; std::getline(text, line);) {
-        lines.push_back(nlohmann::json::parse(line, nullptr, false));
+    for (const std::string& line :
+         android::base::Split(runCommand({"phone", "journal"}).out, "\n")) {
+        if (!line.empty()) lines.push_back(nlohmann::json::parse(line, nullptr, false));
     }
     return lines;
 }
@@ -73,7 +75,7 @@ void Phone::fault(const nlohmann::json& fault) const {
 }
 
 std::string Phone::log() const {
-    return readFile(out_ + "/service.log");
+    return runCommand({"phone", "log"}).out;
 }
 
 int Phone::servicePid() const {
@@ -94,7 +96,7 @@ CommandResult Phone::startService(const std::string& user) const {
 }
 
 nlohmann::json builtInProfile(const std::string& name) {
-    return nlohmann::json::parse(readFile(QVX_PROFILE_FOLDER "/" + name + ".json"));
+    return nlohmann::json::parse(readFile(QVX_PROFILE_DIRECTORY "/" + name + ".json"));
 }
 
 }  // namespace qvx::test

@@ -1,17 +1,19 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // A phone inside the guest, as system tests drive it: brought up with a profile, called through
 // vibctl, and read back through the driver's journal.
 #pragma once
 
-#include <nlohmann/json.hpp>
 #include <string>
 #include <vector>
 
-#include "command.h"
+#include <nlohmann/json.hpp>
+
+#include "tests/support/command.h"
 
 namespace qvx::test {
 
-// Brings a phone up for the life of the object. The out folder is emptied first.
+// Brings a phone up for the life of the object. The out directory is emptied first.
 class Phone {
   public:
     // `profile` is a string, the name of a built-in profile, or an object, a profile of the test's
@@ -22,7 +24,7 @@ class Phone {
     Phone& operator=(const Phone&) = delete;
 
     // What "phone up" answered: status 0 when the service is registered.
-    const CommandResult& up() const { return up_; }
+    const CommandResult& up() const { return mUp; }
 
     // One call, with --json: what vibctl printed, parsed; null when that is not JSON.
     nlohmann::json call(const std::vector<std::string>& words) const;
@@ -49,8 +51,8 @@ class Phone {
     CommandResult startService(const std::string& user) const;
 
   private:
-    std::string out_;
-    CommandResult up_;
+    std::string mOut;
+    CommandResult mUp;
 };
 
 // The profile text of a built-in profile, to be varied by a test.

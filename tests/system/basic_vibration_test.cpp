@@ -1,10 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // On, off, amplitude and the reports of the standard interface, on each kind of phone with sysfs
 // nodes and on a phone without a motor.
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include "phone_control.h"
+#include "tests/support/phone_control.h"
 
 namespace qvx::test {
 namespace {

@@ -1,20 +1,22 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // A client of the vibrator service that composes and waits to be told that it is over. Its callback
 // is served by the process's own binder threads, as any client's is.
 #pragma once
+
+#include <time.h>
+
+#include <atomic>
+#include <chrono>
+#include <memory>
+#include <optional>
+#include <semaphore>
+#include <vector>
 
 #include <aidl/android/hardware/vibrator/BnVibratorCallback.h>
 #include <aidl/android/hardware/vibrator/IVibrator.h>
 #include <android/binder_manager.h>
 #include <android/binder_process.h>
-#include <time.h>
-
-#include <chrono>
-#include <condition_variable>
-#include <memory>
-#include <mutex>
-#include <optional>
-#include <vector>
 
 namespace qvx::test {
 
@@ -34,31 +36,25 @@ class Notification : public aidl::android::hardware::vibrator::BnVibratorCallbac
   public:
     ndk::ScopedAStatus onComplete() override {
         const double now = monotonicMs();
-        const std::lock_guard lock(mutex_);
-        if (calls_++ == 0) firstMs_ = now;
-        called_.notify_all();
+        if (mCalls++ == 0) {
+            mFirstMs = now;
+            mCalled.release();
+        }
         return ndk::ScopedAStatus::ok();
     }
 
-    // Waits for the first call; its time by monotonicMs(), or nothing after five seconds.
+    // Waits, once, for the first call; its time by monotonicMs(), or nothing after five seconds.
     std::optional<double> wait() {
-        std::unique_lock lock(mutex_);
-        if (!called_.wait_for(lock, std::chrono::seconds(5), [this] { return calls_ != 0; })) {
-            return std::nullopt;
-        }
-        return firstMs_;
+        if (!mCalled.try_acquire_for(std::chrono::seconds(5))) return std::nullopt;
+        return mFirstMs;
     }
 
-    int calls() {
-        const std::lock_guard lock(mutex_);
-        return calls_;
-    }
+    int calls() const { return mCalls; }
 
   private:
-    std::mutex mutex_;
-    std::condition_variable called_;
-    double firstMs_ = 0;
-    int calls_ = 0;
+    std::binary_semaphore mCalled{0};
+    std::atomic<int> mCalls = 0;
+    double mFirstMs = 0;  // written before mCalled is released
 };
 
 // The service, with a thread of this process ready to serve callbacks; null when it is not

@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Compositions on each kind of phone: what the driver gets, and when clients are told that it is
 // over.
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -11,10 +10,13 @@
 #include <limits>
 #include <sstream>
 
-#include "composition_client.h"
-#include "kernel_log.h"
-#include "phone_control.h"
-#include "process.h"
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include "platform/libbinder_ndk/tests/guest/process.h"
+#include "tests/support/kernel_log.h"
+#include "tests/support/phone_control.h"
+#include "tests/system/composition_client.h"
 
 namespace qvx::test {
 namespace {
@@ -65,9 +67,9 @@ std::vector<std::string> kernelOnBinder() {
     return lines;
 }
 
-json withQueue(json profile, const std::string& folder) {
+json withQueue(json profile, const std::string& directory) {
     for (const char* leaf : {"cp_trigger_index", "cp_trigger_queue"}) {
-        profile["nodes"][folder + leaf] = {{"mode", "rw"}, {"text", "0\n"}};
+        profile["nodes"][directory + leaf] = {{"mode", "rw"}, {"text", "0\n"}};
     }
     return profile;
 }

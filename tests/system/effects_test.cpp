@@ -1,9 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Predefined effects through real binder: what each phone's driver sees of each effect at each
 // strength, how long it is said to last, what is refused, and the times of a double click.
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-
 #include <algorithm>
 #include <chrono>
 #include <cstddef>
@@ -13,8 +11,11 @@
 #include <thread>
 #include <utility>
 
-#include "journal_words.h"
-#include "phone_control.h"
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include "tests/support/journal_words.h"
+#include "tests/support/phone_control.h"
 
 namespace qvx::test {
 namespace {

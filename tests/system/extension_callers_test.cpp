@@ -1,12 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
-// Who may call the maker's interface, method by method, with the user id that the kernel reports.
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-
+//
+// Who may call the vendor's interface, method by method, with the user id that the kernel reports.
 #include <iterator>
 #include <sstream>
 
-#include "extension_calls.h"
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include "tests/system/extension_calls.h"
 
 namespace qvx::test {
 namespace {
@@ -51,7 +52,7 @@ constexpr Method kMethods[] = {
         {"supportsFolderTentModeStatusSetting", "true", "false"},
         {"setFolderTentModeStatus 0", "null", "null"},
         {"supportsHasFeature", "true", "null", -1, "[supportsHasFeature]Fail - "},
-        // The list of this phone has a line for each word, and only blanks part words here.
+        // The list of this phone has a line for each word, and only spaces separate words here.
         {"hasFeature INTENSITY", "false", "null", -1, "[hasFeature]Fail - "},
 };
 
@@ -116,7 +117,7 @@ TEST(ExtensionBinder, IsFoundThroughTheStandardServiceAndNotByName) {
     EXPECT_EQ(phone.call({"ext", "getInterfaceVersion"})["result"], 4);
     EXPECT_EQ(callAllAs("10123", {"getInterfaceVersion"}).at(0)["result"], 4);
     EXPECT_EQ(phone.call({"ext", "getInterfaceHash"})["result"],
-              "a494dcbbfe8baded1569bcb7cb0d8f38ea65e21a");
+              "c0ff092fe8620379540f19df85a364bf30162688");
 }
 
 }  // namespace

@@ -1,10 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "extension_calls.h"
+#include "tests/system/extension_calls.h"
 
 #include <algorithm>
 #include <sstream>
 
-#include "journal_words.h"
+#include "tests/support/journal_words.h"
 
 namespace qvx::test {
 

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Calls of the maker's interface as any user, and the journal in words.
+//
+// Calls of the vendor's interface as any user, and the journal in words.
 #pragma once
 
 #include <cstddef>
@@ -7,7 +8,7 @@
 #include <string_view>
 #include <vector>
 
-#include "phone_control.h"
+#include "tests/support/phone_control.h"
 
 namespace qvx::test {
 

@@ -1,10 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
-// What each method of the maker's interface makes the driver see, phone by phone: the journal, word
+//
+// What each method of the vendor's interface makes the driver see, phone by phone: the journal, word
 // for word, of one call after another.
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include "extension_calls.h"
+#include "tests/system/extension_calls.h"
 
 namespace qvx::test {
 namespace {

@@ -1,16 +1,21 @@
 // SPDX-License-Identifier: Apache-2.0
-// The ends of what a client can send to the maker's interface: the largest lists, the smallest and
+//
+// The ends of what a client can send to the vendor's interface: the largest lists, the smallest and
 // largest integers, and lists that are null. The service answers each and goes on.
+#include <memory>
+
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include <memory>
-
-#include "extension_calls.h"
-#include "raw_binder.h"
+#include "handset/common/raw_binder.h"
+#include "tests/system/extension_calls.h"
 
 namespace qvx::test {
 namespace {
+
+using handset::RawBinder;
+using handset::RawReply;
+using handset::RequestBytes;
 
 using nlohmann::json;
 using testing::ElementsAre;
@@ -23,19 +28,19 @@ constexpr const char* kMax = "2147483647";
 // One phone for all tests of a suite: bringing one up takes longer than any of them.
 class ExtensionLimits : public testing::Test {
   protected:
-    static void SetUpTestSuite() { phone_ = std::make_unique<Phone>("leds"); }
-    static void TearDownTestSuite() { phone_.reset(); }
+    static void SetUpTestSuite() { mPhone = std::make_unique<Phone>("leds"); }
+    static void TearDownTestSuite() { mPhone.reset(); }
 
     void SetUp() override {
-        ASSERT_EQ(phone_->up().status, 0) << phone_->up().out << phone_->up().err;
-        phone_->reset();
-        pid_ = phone_->servicePid();
+        ASSERT_EQ(mPhone->up().status, 0) << mPhone->up().out << mPhone->up().err;
+        mPhone->reset();
+        mPid = mPhone->servicePid();
     }
 
     // The service is the one that was there before, and it answers.
     void TearDown() override {
-        EXPECT_EQ(phone_->servicePid(), pid_);
-        EXPECT_EQ(phone_->call({"ext", "supportsAmplitudeControl"})["result"], true);
+        EXPECT_EQ(mPhone->servicePid(), mPid);
+        EXPECT_EQ(mPhone->call({"ext", "supportsAmplitudeControl"})["result"], true);
     }
 
     // The exception of a call with so many packets.
@@ -43,11 +48,11 @@ class ExtensionLimits : public testing::Test {
                          const std::string& packet) const {
         words.insert(words.begin(), "ext");
         words.insert(words.end(), count, packet);
-        return phone_->call(words)["exception"];
+        return mPhone->call(words)["exception"];
     }
 
-    static inline std::unique_ptr<Phone> phone_;
-    int pid_ = 0;
+    static inline std::unique_ptr<Phone> mPhone;
+    int mPid = 0;
 };
 
 TEST_F(ExtensionLimits, PacketListsEndAt339) {
@@ -55,15 +60,15 @@ TEST_F(ExtensionLimits, PacketListsEndAt339) {
     for (int i = 0; i < 1356; ++i) zeros += " 0";
     EXPECT_EQ(callWithPackets({"performHapticEngine", "1"}, 339, "0,0,0,0"), 0);
     EXPECT_EQ(callWithPackets({"performHybridHapticEngine", "1"}, 339, "0,0,0,0,0"), 0);
-    EXPECT_THAT(phone_->writes(),
+    EXPECT_THAT(mPhone->writes(),
                 ElementsAre("haptic_engine " + zeros + "\n", "state 1\n", "duration 1\n",
                             "activate 1\n", "hybrid_haptic_engine " + zeros + "\n", "state 1\n",
                             "duration 1\n", "activate 1\n"));
-    phone_->reset();
+    mPhone->reset();
     EXPECT_EQ(callWithPackets({"performHapticEngine", "1"}, 340, "0,0,0,0"), kIllegalArgument);
     EXPECT_EQ(callWithPackets({"performHybridHapticEngine", "1"}, 340, "0,0,0,0,0"),
               kIllegalArgument);
-    EXPECT_THAT(journalInWords(*phone_), IsEmpty());
+    EXPECT_THAT(journalInWords(*mPhone), IsEmpty());
 }
 
 TEST_F(ExtensionLimits, TenThousandPacketsAreAnIllegalArgument) {
@@ -73,19 +78,19 @@ TEST_F(ExtensionLimits, TenThousandPacketsAreAnIllegalArgument) {
               kIllegalArgument);
     EXPECT_EQ(callWithPackets({"performPlaybackEngine", "true", "0"}, 10000, "5,100,0"),
               kIllegalArgument);
-    EXPECT_THAT(journalInWords(*phone_), IsEmpty());
+    EXPECT_THAT(journalInWords(*mPhone), IsEmpty());
 }
 
 TEST_F(ExtensionLimits, PlaybackTakesOneTo200Packets) {
     EXPECT_EQ(callWithPackets({"performPlaybackEngine", "true", "0"}, 200, "1,2,3"), 0);
     std::string text;
     for (int i = 0; i < 200; ++i) text += "1.2,3,";
-    EXPECT_EQ(phone_->writes()[1], "cp_trigger_queue " + text + "~" + '\0');
-    phone_->reset();
+    EXPECT_EQ(mPhone->writes()[1], "cp_trigger_queue " + text + "~" + '\0');
+    mPhone->reset();
     EXPECT_EQ(callWithPackets({"performPlaybackEngine", "true", "0"}, 201, "1,2,3"),
               kIllegalArgument);
     EXPECT_EQ(callWithPackets({"performPlaybackEngine", "true", "0"}, 0, ""), kIllegalArgument);
-    EXPECT_THAT(journalInWords(*phone_), IsEmpty());
+    EXPECT_THAT(journalInWords(*mPhone), IsEmpty());
 }
 
 TEST_F(ExtensionLimits, EndsOfTheIntegersOutsideARangeAreIllegalArguments) {
@@ -98,34 +103,34 @@ TEST_F(ExtensionLimits, EndsOfTheIntegersOutsideARangeAreIllegalArguments) {
               "performPrebakedHapticPattern 1 " + number + " false",
               "performPrebakedHapticPattern 1 " + number + " true", "perform CLICK " + number,
               "getAmplitudeList " + number}) {
-            EXPECT_EQ(phone_->call(extensionCall(words))["exception"], kIllegalArgument) << words;
+            EXPECT_EQ(mPhone->call(extensionCall(words))["exception"], kIllegalArgument) << words;
         }
     }
-    EXPECT_EQ(phone_->call(
+    EXPECT_EQ(mPhone->call(
                       extensionCall("performPlaybackEngine true -2147483648 1,2,3"))["exception"],
               kIllegalArgument);
-    EXPECT_THAT(journalInWords(*phone_), IsEmpty());
+    EXPECT_THAT(journalInWords(*mPhone), IsEmpty());
 }
 
 TEST_F(ExtensionLimits, EndsOfTheIntegersWithinPacketsAreWrittenCutOrWhole) {
     const std::string both = std::string(kMin) + "," + kMax;
-    EXPECT_EQ(phone_->call({"ext", "performHapticEngine", "9999",
+    EXPECT_EQ(mPhone->call({"ext", "performHapticEngine", "9999",
                             std::string(kMin) + "," + both + ",5"})["exception"],
               0);
-    EXPECT_EQ(phone_->call({"ext", "performHybridHapticEngine", "10000",
+    EXPECT_EQ(mPhone->call({"ext", "performHybridHapticEngine", "10000",
                             both + "," + kMax + "," + both})["exception"],
               0);
-    EXPECT_EQ(phone_->call({"ext", "performPlaybackEngine", "true", kMax,
+    EXPECT_EQ(mPhone->call({"ext", "performPlaybackEngine", "true", kMax,
                             both + "," + kMin})["exception"],
               0);
-    EXPECT_EQ(phone_->call(
+    EXPECT_EQ(mPhone->call(
                       {"ext", "performPrebakedHapticPattern", kMin, "10000", "true"})["exception"],
               0);
     EXPECT_EQ(
-            phone_->call({"ext", "performPrebakedHapticPattern", kMax, "1", "false"})["exception"],
+            mPhone->call({"ext", "performPrebakedHapticPattern", kMax, "1", "false"})["exception"],
             0);
     EXPECT_THAT(
-            phone_->writes(),
+            mPhone->writes(),
             ElementsAre("haptic_engine 4 -21474836-214748 2147483645\n", "state 1\n",
                         "duration 1\n", "activate 1\n",
                         // The type is none of the two, so the value is left out.
@@ -143,16 +148,16 @@ TEST_F(ExtensionLimits, EndsOfTheIntegersWithinPacketsAreWrittenCutOrWhole) {
 
 TEST_F(ExtensionLimits, EffectsOutsideTheEnumerationAreNotOffered) {
     for (const char* effect : {kMin, kMax, "-1", "3", "4", "22"}) {
-        EXPECT_EQ(phone_->call({"ext", "perform", effect, "5000"})["exception"], -7) << effect;
+        EXPECT_EQ(mPhone->call({"ext", "perform", effect, "5000"})["exception"], -7) << effect;
     }
-    EXPECT_THAT(journalInWords(*phone_), IsEmpty());
+    EXPECT_THAT(journalInWords(*mPhone), IsEmpty());
 }
 
 TEST_F(ExtensionLimits, LongFeatureNamesAreLookedUp) {
-    const json answer = phone_->call({"ext", "hasFeature", std::string(100000, 'H')});
+    const json answer = mPhone->call({"ext", "hasFeature", std::string(100000, 'H')});
     EXPECT_EQ(answer["exception"], 0);
     EXPECT_EQ(answer["result"], false);
-    EXPECT_EQ(phone_->call({"ext", "hasFeature", ""})["exception"], kIllegalArgument);
+    EXPECT_EQ(mPhone->call({"ext", "hasFeature", ""})["exception"], kIllegalArgument);
 }
 
 // Below the level of a client library, which would not send these.
@@ -168,28 +173,28 @@ class MalformedExtensionRequest : public ExtensionLimits {
     void SetUp() override {
         ExtensionLimits::SetUp();
         const std::optional<uint32_t> service =
-                binder_.checkService("android.hardware.vibrator.IVibrator/default");
+                mBinder.checkService("android.hardware.vibrator.IVibrator/default");
         ASSERT_TRUE(service.has_value());
-        const RawReply reply = binder_.transact(*service, kExtensionTransaction, RequestBytes());
+        const RawReply reply = mBinder.transact(*service, kExtensionTransaction, RequestBytes());
         ASSERT_EQ(reply.handles.size(), 1U);
-        extension_ = reply.handles.front();
+        mExtension = reply.handles.front();
     }
 
     void TearDown() override {
-        EXPECT_THAT(journalInWords(*phone_), IsEmpty());
+        EXPECT_THAT(journalInWords(*mPhone), IsEmpty());
         ExtensionLimits::TearDown();
     }
 
     static RequestBytes token() { return RequestBytes().token(kDescriptor); }
 
     void expectStatus(uint32_t code, const RequestBytes& request, int32_t status) {
-        const RawReply reply = binder_.transact(extension_, code, request.data());
+        const RawReply reply = mBinder.transact(mExtension, code, request.data());
         EXPECT_EQ(reply.kind, RawReply::Kind::kStatus);
         EXPECT_EQ(reply.status, status);
     }
 
-    RawBinder binder_;
-    uint32_t extension_ = 0;
+    RawBinder mBinder;
+    uint32_t mExtension = 0;
 };
 
 TEST_F(MalformedExtensionRequest, NullListIsNoMemory) {

@@ -1,10 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
-// The maker's interface on phones whose nodes answer otherwise than usual: other texts, nodes that
+//
+// The vendor's interface on phones whose nodes answer otherwise than usual: other texts, nodes that
 // are missing, a driver that fails.
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include "extension_calls.h"
+#include "tests/system/extension_calls.h"
 
 namespace qvx::test {
 namespace {
@@ -15,26 +16,27 @@ using testing::HasSubstr;
 
 constexpr int kIllegalState = -5;
 
-const std::string kFolder = "/sys/class/leds/vibrator/";
-const std::string kInfoFolder = "/sys/class/vib_info_class/vib_support_info/";
+const std::string kDirectory = "/sys/class/leds/vibrator/";
+const std::string kInfoDirectory = "/sys/class/vib_info_class/vib_support_info/";
 
 // The LED-class phone without its feature list and its own intensity lists, with one more node or
 // another text for one.
 json plainLeds(const std::string& leaf = "", const std::string& text = "") {
     json profile = builtInProfile("leds");
-    for (const std::string& node : {kInfoFolder + "functions", kInfoFolder + "intensities",
-                                    kInfoFolder + "haptic_intensities", kFolder + "intensities",
-                                    kFolder + "haptic_intensities"}) {
+    for (const std::string& node :
+         {kInfoDirectory + "functions", kInfoDirectory + "intensities",
+          kInfoDirectory + "haptic_intensities", kDirectory + "intensities",
+          kDirectory + "haptic_intensities"}) {
         profile["nodes"].erase(node);
     }
-    if (!leaf.empty()) profile["nodes"][kFolder + leaf] = {{"mode", "rw"}, {"text", text}};
+    if (!leaf.empty()) profile["nodes"][kDirectory + leaf] = {{"mode", "rw"}, {"text", text}};
     return profile;
 }
 
 TEST(Extension, SingleLettersOfEventCmdAnswerThePostureQueries) {
     const struct {
         const char* text;
-        bool folder;
+        bool directory;
         bool tentMode;
     } rows[] = {{"ON\n", true, true},
                 {"1\n", false, false},
@@ -43,9 +45,9 @@ TEST(Extension, SingleLettersOfEventCmdAnswerThePostureQueries) {
                 {"O", false, false}};
     const Phone phone("leds");
     ASSERT_EQ(phone.up().status, 0) << phone.up().out << phone.up().err;
-    for (const auto& [text, folder, tentMode] : rows) {
-        runCommand({"phone", "node", kFolder + "event_cmd", text});
-        EXPECT_EQ(phone.call({"ext", "supportsFolderStatusSetting"})["result"], folder) << text;
+    for (const auto& [text, directory, tentMode] : rows) {
+        runCommand({"phone", "node", kDirectory + "event_cmd", text});
+        EXPECT_EQ(phone.call({"ext", "supportsFolderStatusSetting"})["result"], directory) << text;
         EXPECT_EQ(phone.call({"ext", "supportsFolderTentModeStatusSetting"})["result"], tentMode)
                 << text;
     }
@@ -58,7 +60,7 @@ TEST(Extension, AmplitudeListFollowsTheMotorAndTheIndexNode) {
         EXPECT_EQ(phone.call({"ext", "getAmplitudeList", "1"})["result"],
                   json({0, 2000, 4000, 6000, 8000, 10000}));
     }
-    profile["nodes"].erase(kFolder + "cp_trigger_index");
+    profile["nodes"].erase(kDirectory + "cp_trigger_index");
     const Phone phone(profile);
     EXPECT_EQ(phone.call({"ext", "getAmplitudeList", "1"})["result"],
               json({0, 3400, 4900, 6500, 8200, 10000}));
@@ -66,7 +68,7 @@ TEST(Extension, AmplitudeListFollowsTheMotorAndTheIndexNode) {
 
 TEST(Extension, WithoutAFeatureListNodesAnswer) {
     json profile = plainLeds();
-    profile["nodes"].erase(kFolder + "fifo");
+    profile["nodes"].erase(kDirectory + "fifo");
     const Phone phone(profile);
     EXPECT_EQ(phone.call({"ext", "supportsFifoHapticEngine"})["result"], false);
     EXPECT_EQ(phone.call({"ext", "supportsHybridHapticEngine"})["result"], true);
@@ -89,7 +91,7 @@ TEST(Extension, HybridShortOrFailingWriteIsOkWithoutVibration) {
     const Phone phone("leds");
     for (const json& fault : {json{{"short", 3}}, json{{"errno", "EIO"}}}) {
         phone.reset();
-        json whole = {{"node", kFolder + "hybrid_haptic_engine"}, {"op", "write"}, {"times", 1}};
+        json whole = {{"node", kDirectory + "hybrid_haptic_engine"}, {"op", "write"}, {"times", 1}};
         whole.update(fault);
         phone.fault(whole);
         EXPECT_EQ(phone.call({"ext", "performHybridHapticEngine", "10000",
@@ -103,7 +105,8 @@ TEST(Extension, HybridShortOrFailingWriteIsOkWithoutVibration) {
 TEST(Extension, PlainShortWriteIsAnIllegalStateWithoutVibration) {
     const Phone phone("leds");
     phone.reset();
-    phone.fault({{"node", kFolder + "haptic_engine"}, {"op", "write"}, {"short", 3}, {"times", 1}});
+    phone.fault(
+            {{"node", kDirectory + "haptic_engine"}, {"op", "write"}, {"short", 3}, {"times", 1}});
     EXPECT_EQ(phone.call({"ext", "performHapticEngine", "10000", "7,10000,2050,0"})["exception"],
               kIllegalState);
     EXPECT_THAT(phone.writes(), ElementsAre("haptic_engine 4 7 10000 2050 0\n"));
@@ -113,8 +116,10 @@ TEST(Extension, PlainShortWriteIsAnIllegalStateWithoutVibration) {
 TEST(Extension, InterruptedDriverIsAskedAgain) {
     const Phone phone("leds");
     phone.reset();
-    phone.fault(
-            {{"node", kFolder + "event_cmd"}, {"op", "write"}, {"errno", "EINTR"}, {"times", 2}});
+    phone.fault({{"node", kDirectory + "event_cmd"},
+                 {"op", "write"},
+                 {"errno", "EINTR"},
+                 {"times", 2}});
     EXPECT_EQ(phone.call({"ext", "setFolderStatus", "1"})["exception"], 0);
     EXPECT_THAT(journalInWords(phone),
                 ElementsAre("open event_cmd O_RDWR", "write event_cmd FOLDER_CLOSE\n = EINTR",
@@ -125,7 +130,7 @@ TEST(Extension, InterruptedDriverIsAskedAgain) {
 TEST(Extension, FailedQueueStartsNothing) {
     const Phone phone("leds");
     phone.reset();
-    phone.fault({{"node", kFolder + "cp_trigger_queue"}, {"op", "open"}, {"errno", "EBUSY"}});
+    phone.fault({{"node", kDirectory + "cp_trigger_queue"}, {"op", "open"}, {"errno", "EBUSY"}});
     EXPECT_EQ(phone.call({"ext", "performPlaybackEngine", "true", "0", "5,100,0"})["exception"],
               kIllegalState);
     EXPECT_EQ(phone.call({"ext", "performPrebakedHapticPattern", "3", "5000", "true"})["exception"],

@@ -1,26 +1,32 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // What the service's process holds: one thread while nothing is under way, and no descriptor but
 // binder, its six streams and the motor's input device.
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-
 #include <chrono>
 #include <filesystem>
+#include <fstream>
 #include <string>
 #include <thread>
 #include <vector>
 
-#include "phone_control.h"
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include "handset/common/raw_binder.h"
+#include "tests/support/phone_control.h"
 
 namespace qvx::test {
 namespace {
 
+using handset::RawBinder;
+using handset::RawReply;
+using handset::RequestBytes;
 using testing::ElementsAre;
 using testing::UnorderedElementsAre;
 
-std::vector<std::string> entriesOf(const Phone& phone, const std::string& folder) {
+std::vector<std::string> entriesOf(const Phone& phone, const std::string& directory) {
     std::vector<std::string> entries;
-    const std::string path = "/proc/" + std::to_string(phone.servicePid()) + "/" + folder;
+    const std::string path = "/proc/" + std::to_string(phone.servicePid()) + "/" + directory;
     for (const auto& entry : std::filesystem::directory_iterator(path)) {
         entries.push_back(entry.path().filename());
     }
@@ -29,13 +35,24 @@ std::vector<std::string> entriesOf(const Phone& phone, const std::string& folder
 
 // What the descriptors beyond the three standard ones refer to.
 std::vector<std::string> openFiles(const Phone& phone) {
-    const std::string folder = "/proc/" + std::to_string(phone.servicePid()) + "/fd/";
+    const std::string directory = "/proc/" + std::to_string(phone.servicePid()) + "/fd/";
     std::vector<std::string> files;
     for (const std::string& number : entriesOf(phone, "fd")) {
         if (std::stoi(number) <= 2) continue;
-        files.push_back(std::filesystem::read_symlink(folder + number));
+        files.push_back(std::filesystem::read_symlink(directory + number));
     }
     return files;
+}
+
+// The service's memory that is its own, in KiB.
+int privateMemory(const Phone& phone) {
+    std::ifstream file("/proc/" + std::to_string(phone.servicePid()) + "/smaps_rollup");
+    int sum = 0;
+    for (std::string word; file >> word;) {
+        int size = 0;
+        if (word.starts_with("Private_") && file >> size) sum += size;
+    }
+    return sum;
 }
 
 size_t threadsOf(const Phone& phone) {
@@ -79,6 +96,23 @@ TEST(Footprint, WithoutAMotorIsBinderAlone) {
     phone.call({"std", "on", "500"});
     EXPECT_THAT(openFiles(phone), ElementsAre("/dev/binder"));
     EXPECT_EQ(threadsOf(phone), 1U);
+}
+
+TEST(Footprint, FallsBackAfterRequestsOfAMegabyte) {
+    const Phone phone("leds");
+    RawBinder client;
+    const auto service = client.checkService("android.hardware.vibrator.IVibrator/default");
+    ASSERT_TRUE(service.has_value());
+    // compose with as many elements as a request can hold, and with fewer in between, which may stay
+    // in the heap where the large ones go back at once.
+    for (const int count : {44000, 10000, 30000, 20000, 7000, 25000, 12000, 44000}) {
+        RequestBytes request = RequestBytes().token("android.hardware.vibrator.IVibrator");
+        request.int32(count);
+        for (int i = 0; i < count; ++i) request.int32(1).int32(16).int32(0).int32(1).int32(0);
+        EXPECT_EQ(client.transact(*service, 12, request.nullBinder()).kind, RawReply::Kind::kData);
+    }
+    EXPECT_GT(privateMemory(phone), 0);
+    EXPECT_LT(privateMemory(phone), 3 * 1024);
 }
 
 }  // namespace

@@ -1,14 +1,15 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // A force-feedback motor that fails: what the client is told, what is tried again, and what the
 // next request finds.
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-
 #include <filesystem>
 #include <iterator>
 
-#include "force_feedback_journal.h"
-#include "phone_control.h"
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include "tests/support/phone_control.h"
+#include "tests/system/force_feedback_journal.h"
 
 namespace qvx::test {
 namespace {

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "force_feedback_journal.h"
+#include "tests/system/force_feedback_journal.h"
 
-#include "journal_words.h"
+#include "tests/support/journal_words.h"
 
 namespace qvx::test {
 

@@ -1,11 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // What a force-feedback motor saw of the service, read from the driver's journal.
 #pragma once
 
 #include <string>
 #include <vector>
 
-#include "phone_control.h"
+#include "tests/support/phone_control.h"
 
 namespace qvx::test {
 

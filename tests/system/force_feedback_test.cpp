@@ -1,10 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Requests on a phone with a force-feedback motor: what is uploaded, erased and played.
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include "force_feedback_journal.h"
-#include "phone_control.h"
+#include "tests/support/phone_control.h"
+#include "tests/system/force_feedback_journal.h"
 
 namespace qvx::test {
 namespace {

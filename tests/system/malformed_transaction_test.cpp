@@ -1,15 +1,20 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Requests no well-behaved client sends, straight through the driver: each gets the platform's
 // status, none reaches the motor, and the service goes on.
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include "kernel_log.h"
-#include "phone_control.h"
-#include "raw_binder.h"
+#include "handset/common/raw_binder.h"
+#include "tests/support/kernel_log.h"
+#include "tests/support/phone_control.h"
 
 namespace qvx::test {
 namespace {
+
+using handset::RawBinder;
+using handset::RawReply;
+using handset::RequestBytes;
 
 using testing::IsEmpty;
 
@@ -32,18 +37,18 @@ constexpr uint32_t kComposePwle = 24;
 class MalformedTransaction : public testing::Test {
   protected:
     void SetUp() override {
-        ASSERT_EQ(phone_.up().status, 0) << phone_.up().out << phone_.up().err;
-        ASSERT_TRUE(binder_.isOpen());
-        const std::optional<uint32_t> handle = binder_.checkService(kInstance);
+        ASSERT_EQ(mPhone.up().status, 0) << mPhone.up().out << mPhone.up().err;
+        ASSERT_TRUE(mBinder.isOpen());
+        const std::optional<uint32_t> handle = mBinder.checkService(kInstance);
         ASSERT_TRUE(handle.has_value());
-        service_ = *handle;
-        phone_.reset();
+        mService = *handle;
+        mPhone.reset();
     }
 
     // Every request was refused before the motor, and the service still answers.
     void TearDown() override {
-        EXPECT_THAT(phone_.writes(), IsEmpty());
-        const RawReply alive = binder_.transact(service_, kGetCapabilities, token().data());
+        EXPECT_THAT(mPhone.writes(), IsEmpty());
+        const RawReply alive = mBinder.transact(mService, kGetCapabilities, token().data());
         EXPECT_EQ(alive.kind, RawReply::Kind::kData);
         EXPECT_EQ(alive.word(0), 0);
     }
@@ -51,14 +56,14 @@ class MalformedTransaction : public testing::Test {
     static RequestBytes token() { return RequestBytes().token(kDescriptor); }
 
     void expectStatus(uint32_t code, const RequestBytes& request, int32_t status) {
-        const RawReply reply = binder_.transact(service_, code, request.data());
+        const RawReply reply = mBinder.transact(mService, code, request.data());
         EXPECT_EQ(reply.kind, RawReply::Kind::kStatus);
         EXPECT_EQ(reply.status, status);
     }
 
-    const Phone phone_{"leds"};
-    RawBinder binder_;
-    uint32_t service_ = 0;
+    const Phone mPhone{"leds"};
+    RawBinder mBinder;
+    uint32_t mService = 0;
 };
 
 TEST_F(MalformedTransaction, EmptyRequestIsBadType) {
@@ -143,7 +148,7 @@ TEST_F(MalformedTransaction, UnknownUnionTagIsBadValue) {
 
 TEST_F(MalformedTransaction, ArrayLongerThanAnyMemoryIsRefused) {
     const RawReply reply =
-            binder_.transact(service_, kCompose, token().int32(0x7fffffff).int32(1).data());
+            mBinder.transact(mService, kCompose, token().int32(0x7fffffff).int32(1).data());
     EXPECT_EQ(reply.kind, RawReply::Kind::kStatus);
     EXPECT_LT(reply.status, 0);
 }
@@ -154,7 +159,7 @@ TEST_F(MalformedTransaction, TruncatedEnumIsNotEnoughData) {
 
 TEST_F(MalformedTransaction, TrailingBytesAreIgnored) {
     const RawReply reply =
-            binder_.transact(service_, kGetCapabilities, token().bytes(65536, 0xa5).data());
+            mBinder.transact(mService, kGetCapabilities, token().bytes(65536, 0xa5).data());
     EXPECT_EQ(reply.kind, RawReply::Kind::kData);
     EXPECT_EQ(reply.word(0), 0);
 }
@@ -162,14 +167,14 @@ TEST_F(MalformedTransaction, TrailingBytesAreIgnored) {
 TEST_F(MalformedTransaction, RequestBeyondTheReceiversBufferIsRefusedByTheDriver) {
     const ExpectBinderComplaints provoked;
     const RawReply reply =
-            binder_.transact(service_, kGetCapabilities, token().bytes(2 << 20, 0).data());
+            mBinder.transact(mService, kGetCapabilities, token().bytes(2 << 20, 0).data());
     EXPECT_EQ(reply.kind, RawReply::Kind::kFailed);
 }
 
 TEST_F(MalformedTransaction, OffsetsOutsideTheDataAreRefusedByTheDriver) {
     const ExpectBinderComplaints provoked;
     const RawReply reply =
-            binder_.transact(service_, kOn, token().int32(100).nullBinder().data(), {4096});
+            mBinder.transact(mService, kOn, token().int32(100).nullBinder().data(), {4096});
     EXPECT_EQ(reply.kind, RawReply::Kind::kFailed);
 }
 

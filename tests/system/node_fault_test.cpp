@@ -1,13 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // A driver that fails: what the client is told, what was written before, and that the service loses
 // no descriptor over it.
-#include <gmock/gmock.h>
-#include <gtest/gtest.h>
-
 #include <filesystem>
 #include <iterator>
 
-#include "phone_control.h"
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include "tests/support/phone_control.h"
 
 namespace qvx::test {
 namespace {

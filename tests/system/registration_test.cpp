@@ -1,12 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // What happens when the service cannot be registered: it ends with the platform's fatal check, so
 // that init restarts it and the crash report names the line.
+#include <filesystem>
+
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include <filesystem>
-
-#include "phone_control.h"
+#include "tests/support/phone_control.h"
 
 namespace qvx::test {
 namespace {
@@ -17,7 +18,7 @@ constexpr int kAborted = 128 + 6;  // SIGABRT
 constexpr const char* kRefused =
         "main.cpp:45] Check failed: STATUS_OK == AServiceManager_addService(vibBinder.get(), "
         "instance.c_str())";
-constexpr const char* kManifestFolder = "/vendor/etc/vintf/manifest";
+constexpr const char* kManifestDirectory = "/vendor/etc/vintf/manifest";
 
 TEST(Registration, StandardServiceIsFoundUnderItsDescriptorAndDefault) {
     const Phone phone("leds");
@@ -36,7 +37,7 @@ TEST(Registration, ByAnApplicationUserIsRefusedAndAborts) {
 
 TEST(Registration, UndeclaredServiceIsRefusedAndAborts) {
     const Phone phone("none", {"--no-service"});
-    for (const auto& fragment : std::filesystem::directory_iterator(kManifestFolder)) {
+    for (const auto& fragment : std::filesystem::directory_iterator(kManifestDirectory)) {
         std::filesystem::remove(fragment);
     }
     const CommandResult second = phone.startService("1000");

@@ -24,12 +24,12 @@ _vibctl() {
     local program=${COMP_WORDS[0]} current=${COMP_WORDS[COMP_CWORD]} choices="" word
     local -a plain=()
     local skip="" i
-    # The words before this one that are neither options nor the value of --wait.
+    # The words before this one that are neither options nor the value of an option.
     for ((i = 1; i < COMP_CWORD; i++)); do
         word=${COMP_WORDS[i]}
         if [[ -n $skip ]]; then
             skip=""
-        elif [[ $word == --wait ]]; then
+        elif [[ $word =~ ^--(wait|timeout|amplitudes|repeat)$ ]]; then
             skip=1
         elif [[ $word != --* ]]; then
             plain+=("$word")
@@ -38,9 +38,14 @@ _vibctl() {
     COMPREPLY=()
     [[ -n $skip ]] && return
     if [[ $current == -* ]]; then
-        choices="--json --wait --callback --help --version"
+        choices="--json --timeout --wait --callback --off-on-interrupt --amplitudes --repeat --explain
+            --help --version"
     elif ((${#plain[@]} == 0)); then
-        choices="std ext list doctor help"
+        choices="std ext info dump raw play list doctor help"
+    elif [[ ${plain[0]} == help && ${#plain[@]} == 2 ]]; then
+        choices=$(_vibctl_methods "$program" "${plain[1]}")
+    elif ((${#plain[@]} == 1)) && [[ ${plain[0]} =~ ^(dump|raw|help)$ ]]; then
+        choices="std ext"
     elif [[ ${plain[0]} == std || ${plain[0]} == ext ]]; then
         if ((${#plain[@]} == 1)); then
             choices="help $(_vibctl_methods "$program" "${plain[0]}")"
@@ -48,7 +53,12 @@ _vibctl() {
             choices=$(_vibctl_argument "$program" "${plain[0]}" "${plain[1]}" $((${#plain[@]} - 1)))
         fi
     fi
-    # Newlines and blanks both part the choices.
+    # Files are completed by the shell.
+    if [[ ${plain[0]:-} == play && $current != -* ]]; then
+        mapfile -t COMPREPLY < <(compgen -f -- "$current")
+        return
+    fi
+    # Newlines and spaces both separate the choices.
     # shellcheck disable=SC2207
     COMPREPLY=($(compgen -W "$choices" -- "$current"))
 }

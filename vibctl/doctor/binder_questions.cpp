@@ -1,42 +1,41 @@
 // SPDX-License-Identifier: Apache-2.0
 //
 // The doctor's questions over binder: see binder_questions.h.
-#include "doctor/binder_questions.h"
+#include "vibctl/doctor/binder_questions.h"
 
 #include <chrono>
-#include <future>
 #include <string>
-#include <thread>
-#include <utility>
 
 #include <android/binder_manager.h>
 #include <fmt/format.h>
 
-#include "binder_client.h"
+#include "vibctl/binder_client.h"
+#include "vibctl/deadline.h"
 
 namespace vibctl {
 
 namespace {
 
-constexpr std::chrono::seconds kServicePatience{2};
-const std::string kName = std::string(IVibrator::descriptor) + "/default";
+constexpr std::chrono::seconds kTimeout{2};
 
 Problem problemOf(const ndk::ScopedAStatus& status, const char* what) {
     if (status.isOk()) return std::nullopt;
     return fmt::format("{}: {}", what, status.getDescription());
 }
 
-/// What only the service itself can answer.
-void askService(BinderFacts& facts) {
-    const auto service = connect(static_cast<IVibrator*>(nullptr), facts.serviceProblem);
+// What only the service itself can answer.
+void askVersions(BinderFacts& facts) {
+    const Service service = connect("std", facts.serviceProblem);
     if (facts.serviceProblem) return;
     facts.serviceProblem =
-            problemOf(service->getInterfaceVersion(&facts.version), "it does not tell its version");
+            problemOf(static_cast<IVibrator&>(*service).getInterfaceVersion(&facts.version),
+                      "does not tell its version");
     if (facts.serviceProblem) return;
-    const auto extension = connect(static_cast<IZelVibrator*>(nullptr), facts.extensionProblem);
+    const Service extension = connect("ext", facts.extensionProblem);
     if (facts.extensionProblem) return;
-    facts.extensionProblem = problemOf(extension->getInterfaceVersion(&facts.extensionVersion),
-                                       "the extension does not tell its version");
+    facts.extensionProblem = problemOf(
+            static_cast<IZelVibrator&>(*extension).getInterfaceVersion(&facts.extensionVersion),
+            "the extension does not tell its version");
 }
 
 }  // namespace
@@ -45,24 +44,19 @@ BinderFacts askOverBinder() {
     BinderFacts facts;
     facts.deviceProblem = checkDevice(facts.device);
     if (facts.deviceProblem) return facts;
-    facts.managerProblem = checkManager();
+    facts.managerProblem = checkManager(kTimeout);
     if (facts.managerProblem) return facts;
-    facts.declared = AServiceManager_isDeclared(kName.c_str());
-    facts.registered =
-            ndk::SpAIBinder(AServiceManager_checkService(kName.c_str())).get() != nullptr;
+    const std::string name = serviceName();
+    facts.declared = AServiceManager_isDeclared(name.c_str());
+    facts.registered = ndk::SpAIBinder(AServiceManager_checkService(name.c_str())).get() != nullptr;
     if (!facts.registered) return facts;
-    facts.registrant = findRegistrant(kName);
-    // A service that hangs would keep its caller for ever: a thread of its own asks, and is left
-    // behind when that takes too long.
-    std::promise<BinderFacts> promise;
-    std::future<BinderFacts> answer = promise.get_future();
-    std::thread([facts, promise = std::move(promise)]() mutable {
-        askService(facts);
-        promise.set_value(std::move(facts));
-    }).detach();
-    if (answer.wait_for(kServicePatience) == std::future_status::ready) return answer.get();
-    facts.serviceProblem =
-            fmt::format("it has not answered for {} seconds", kServicePatience.count());
+    facts.registrant = findRegistrant(name);
+    const auto answered = within(kTimeout, [facts]() mutable {
+        askVersions(facts);
+        return facts;
+    });
+    if (answered) return *answered;
+    facts.serviceProblem = fmt::format("has not answered for {} s", kTimeout.count());
     return facts;
 }
 

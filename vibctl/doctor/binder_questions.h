@@ -3,11 +3,11 @@
 // The doctor's questions over binder.
 #pragma once
 
-#include "doctor/doctor.h"
+#include "vibctl/doctor/doctor.h"
 
 namespace vibctl {
 
-/// Asks the service manager and the service; waits a few seconds at most for either.
+// Asks the service manager and the service; waits a few seconds at most for either.
 BinderFacts askOverBinder();
 
 }  // namespace vibctl

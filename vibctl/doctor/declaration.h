@@ -5,19 +5,18 @@
 
 #include <filesystem>
 #include <optional>
-#include <string>
 
-#include "doctor/finding.h"
+#include "vibctl/doctor/finding.h"
 
 namespace vibctl {
 
-/// Looks where the service manager looks. `root` is the folder that it reads manifests below;
-/// `declared` is its own answer, where it gave one, and the files then only explain it.
-Finding checkDeclaration(const std::filesystem::path& root, const std::string& service,
-                         std::optional<bool> declared);
+// Looks where the service manager looks for what a device declares: vendor/etc/vintf/manifest.xml,
+// vendor/etc/vintf/manifest/*.xml, then odm/..., below `root`. `declared` is the service manager's
+// own answer, where it gave one, and the files then only explain it.
+Finding checkDeclaration(const std::filesystem::path& root, std::optional<bool> declared);
 
-/// The folder that the running service manager reads manifests below: what its option --root says,
-/// else "/".
+// The directory that the running service manager reads manifests below: what its option --root says,
+// else "/".
 std::filesystem::path manifestRoot(const std::filesystem::path& proc);
 
 }  // namespace vibctl

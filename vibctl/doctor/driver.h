@@ -1,29 +1,36 @@
 // SPDX-License-Identifier: Apache-2.0
 //
-// The vibrator driver from outside the service: which device class a start of the service would
-// choose, and whether its user may open what it needs there. The rules and the names are written
-// down here once more, from the nodes' side, so that a slip in the service shows as a difference.
+// Which device class a start of the service would choose, and whether its user may open what it
+// needs there.
 #pragma once
 
+#include <set>
 #include <string>
 #include <vector>
 
-#include "doctor/file_view.h"
-#include "doctor/finding.h"
+#include "vibctl/doctor/file_view.h"
+#include "vibctl/doctor/finding.h"
 
 namespace vibctl {
 
-/// The findings "device class", "nodes" (one for each node that cannot be opened, else one for all)
-/// and "input device".
-std::vector<Finding> checkDriver(const FileView& view, const User& user);
+enum class DeviceClass { kNone, kLegacy, kLeds, kForceFeedback };
 
-/// One block of /proc/bus/input/devices.
-struct InputDevice {
-    std::string name;
-    std::string handlers;  ///< without the blanks at its end
+struct Driver {
+    DeviceClass deviceClass = DeviceClass::kNone;
+    std::string directory;          // of its nodes, with a slash behind it; empty for kNone
+    std::set<std::string> open;     // paths of the nodes that the user can open
+    std::vector<Finding> findings;  // "device class", and "nodes", one for each that does not open
 };
 
-/// The blocks in order; a block without a name is left out.
+Driver checkDriver(const FileView& view, const User& user);
+
+// One block of /proc/bus/input/devices.
+struct InputDevice {
+    std::string name;
+    std::string handlers;  // without the spaces at its end
+};
+
+// The blocks in order; a block without a name is left out.
 std::vector<InputDevice> parseInputDevices(const std::string& text);
 
 }  // namespace vibctl

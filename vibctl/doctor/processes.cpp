@@ -1,13 +1,15 @@
 // SPDX-License-Identifier: Apache-2.0
 //
 // Processes as /proc shows them: see processes.h.
-#include "doctor/processes.h"
+#include "vibctl/doctor/processes.h"
 
 #include <algorithm>
-#include <charconv>
-#include <fstream>
-#include <sstream>
+#include <set>
 #include <system_error>
+
+#include <android-base/file.h>
+#include <android-base/parseint.h>
+#include <android-base/strings.h>
 
 namespace vibctl {
 
@@ -15,72 +17,123 @@ namespace {
 
 namespace fs = std::filesystem;
 
-std::optional<pid_t> pidIn(const std::string& name) {
-    pid_t pid = 0;
-    const char* const end = name.data() + name.size();
-    const auto [stop, error] = std::from_chars(name.data(), end, pid);
-    if (error != std::errc() || stop != end) return std::nullopt;
-    return pid;
+// A file of a process; empty when it cannot be read.
+std::string readOf(const fs::path& proc, pid_t pid, const std::string& file) {
+    std::string text;
+    android::base::ReadFileToString((proc / std::to_string(pid) / file).string(), &text);
+    return text;
 }
 
-/// The file name of the executable, or of the first word where the executable may not be seen.
-std::string nameOf(const fs::path& proc, pid_t pid) {
+// Where a link of a process leads; empty when that may not be seen.
+std::string linkOf(const fs::path& proc, pid_t pid, const std::string& file) {
     std::error_code error;
-    fs::path executable = fs::read_symlink(proc / std::to_string(pid) / "exe", error);
-    if (error) {
-        const std::vector<std::string> words = commandLineOf(proc, pid);
-        if (words.empty()) return {};
-        executable = words.front();
+    return fs::read_symlink(proc / std::to_string(pid) / file, error).string();
+}
+
+// The numbers that are names of entries.
+std::vector<pid_t> numbersIn(const fs::path& directory) {
+    std::vector<pid_t> numbers;
+    std::error_code error;
+    for (fs::directory_iterator item(directory, error), end; !error && item != end;
+         item.increment(error)) {
+        pid_t number = 0;
+        if (android::base::ParseInt(item->path().filename().string(), &number)) {
+            numbers.push_back(number);
+        }
     }
-    std::string name = executable.filename().string();
-    // A program that was replaced while it runs.
-    constexpr std::string_view kDeleted = " (deleted)";
-    if (name.ends_with(kDeleted)) name.resize(name.size() - kDeleted.size());
-    return name;
+    std::sort(numbers.begin(), numbers.end());
+    return numbers;
+}
+
+// The fields of the file stat from the third on: those behind the name, which may hold anything.
+std::vector<std::string> statOf(const fs::path& proc, pid_t pid) {
+    const std::string text = readOf(proc, pid, "stat");
+    const size_t end = text.rfind(") ");
+    if (end == std::string::npos) return {};
+    return android::base::Split(text.substr(end + 2), " ");
 }
 
 }  // namespace
 
-std::optional<pid_t> findProcess(const fs::path& proc, std::string_view executable) {
-    std::vector<pid_t> pids;
-    std::error_code error;
-    for (fs::directory_iterator item(proc, error), end; !error && item != end;
-         item.increment(error)) {
-        if (const auto pid = pidIn(item->path().filename().string())) pids.push_back(*pid);
+std::string executableOf(const fs::path& proc, pid_t pid) {
+    std::string path = linkOf(proc, pid, "exe");
+    if (path.empty()) {
+        const std::vector<std::string> words = commandLineOf(proc, pid);
+        if (!words.empty()) path = words.front();
     }
-    std::sort(pids.begin(), pids.end());
-    const auto found = std::find_if(pids.begin(), pids.end(),
-                                    [&](pid_t pid) { return nameOf(proc, pid) == executable; });
+    // A program that was replaced while it runs.
+    constexpr std::string_view kDeleted = " (deleted)";
+    if (path.ends_with(kDeleted)) path.resize(path.size() - kDeleted.size());
+    return fs::path(path).filename().string();
+}
+
+std::optional<pid_t> findProcess(const fs::path& proc, std::string_view executable) {
+    const std::vector<pid_t> pids = numbersIn(proc);
+    const auto found = std::find_if(pids.begin(), pids.end(), [&](pid_t pid) {
+        return executableOf(proc, pid) == executable;
+    });
     if (found == pids.end()) return std::nullopt;
     return *found;
 }
 
 std::optional<User> userOf(const fs::path& proc, pid_t pid) {
-    std::ifstream status(proc / std::to_string(pid) / "status");
     std::optional<User> user;
-    for (std::string line; std::getline(status, line);) {
-        std::istringstream words(line);
-        std::string key;
-        words >> key;
-        uint32_t real = 0;
-        uint32_t effective = 0;
-        if (key == "Uid:" && words >> real >> effective) {
-            if (!user) user.emplace();
-            user->uid = effective;
-        } else if (key == "Gid:" && words >> real >> effective && user) {
-            user->gid = effective;
-        } else if (key == "Groups:" && user) {
-            for (gid_t group = 0; words >> group;) user->groups.push_back(group);
+    for (const std::string& line : android::base::Split(readOf(proc, pid, "status"), "\n")) {
+        // "Uid:\treal\teffective\t...", "Groups:\t1004 1007 "
+        std::vector<std::string> words = android::base::Split(line, "\t ");
+        std::vector<uint32_t> ids;
+        for (const std::string& word : words) {
+            uint32_t id = 0;
+            if (!word.empty() && android::base::ParseUint(word, &id)) ids.push_back(id);
         }
+        if (words[0] == "Uid:" && ids.size() > 1) user = User{ids[1], 0, {}};
+        if (words[0] == "Gid:" && ids.size() > 1 && user) user->gid = ids[1];
+        if (words[0] == "Groups:" && user) user->groups.assign(ids.begin(), ids.end());
     }
     return user;
 }
 
 std::vector<std::string> commandLineOf(const fs::path& proc, pid_t pid) {
-    std::ifstream file(proc / std::to_string(pid) / "cmdline", std::ios::binary);
-    std::vector<std::string> words;
-    for (std::string word; std::getline(file, word, '\0');) words.push_back(word);
+    std::vector<std::string> words =
+            android::base::Split(readOf(proc, pid, "cmdline"), std::string(1, '\0'));
+    // Each word ends in a zero byte.
+    words.pop_back();
     return words;
+}
+
+bool isStopped(const fs::path& proc, pid_t pid) {
+    const std::vector<std::string> fields = statOf(proc, pid);
+    return !fields.empty() && (fields[0] == "T" || fields[0] == "t");
+}
+
+uint64_t startTimeOf(const fs::path& proc, pid_t pid) {
+    // The twenty-second field.
+    const std::vector<std::string> fields = statOf(proc, pid);
+    uint64_t ticks = 0;
+    if (fields.size() > 19) android::base::ParseUint(fields[19], &ticks);
+    return ticks;
+}
+
+std::string nodeInUse(const fs::path& proc, pid_t pid) {
+    for (const pid_t thread : numbersIn(proc / std::to_string(pid) / "task")) {
+        // "NUMBER ARGUMENT ..."; of the calls on a node, the first argument is its descriptor.
+        const std::string call = readOf(proc, pid, "task/" + std::to_string(thread) + "/syscall");
+        const std::vector<std::string> words = android::base::Split(call, " ");
+        int descriptor = 0;
+        if (words.size() < 2 || !android::base::ParseInt(words[1], &descriptor, 0)) continue;
+        std::string node = linkOf(proc, pid, "fd/" + std::to_string(descriptor));
+        if (node.starts_with("/sys/") || node.starts_with("/dev/input/")) return node;
+    }
+    return "";
+}
+
+std::vector<pid_t> otherViews(const fs::path& proc) {
+    std::vector<pid_t> views;
+    std::set<std::string> seen = {linkOf(proc, 1, "ns/mnt"), ""};
+    for (const pid_t pid : numbersIn(proc)) {
+        if (seen.insert(linkOf(proc, pid, "ns/mnt")).second) views.push_back(pid);
+    }
+    return views;
 }
 
 }  // namespace vibctl

@@ -41,14 +41,14 @@ def _parser() -> _Parser:
                         help="accepted: every interface here is")
     parser.add_argument("--version", metavar="N", help="the version the code reports")
     parser.add_argument("--hash", metavar="TEXT",
-                        help="the hash the code reports, or the folder to compute one of")
+                        help="the hash the code reports, or the directory to compute one of")
     parser.add_argument("--stability", metavar="vintf",
                         help="the files declare vintf-stable types only")
-    parser.add_argument("--out-headers", metavar="DIR", help="include folder to write headers to")
-    parser.add_argument("--out-sources", metavar="DIR", help="folder to write sources to")
+    parser.add_argument("--out-headers", metavar="DIR", help="include directory to write headers to")
+    parser.add_argument("--out-sources", metavar="DIR", help="directory to write sources to")
     parser.add_argument("--include", metavar="DIR", action="append", default=[],
                         help="where the package path of imported types starts")
-    parser.add_argument("--dumpapi", metavar="DIR", help="folder to write normalised files to")
+    parser.add_argument("--dumpapi", metavar="DIR", help="directory to write normalised files to")
     parser.add_argument("--checkapi", action="store_true", help="compare two versions")
     parser.add_argument("operands", metavar="FILE", nargs="*")
     return parser
@@ -114,8 +114,8 @@ def _generate(options: argparse.Namespace) -> None:
                                    f"both make {output.path}")
             outputs[output.path] = output
     for output in outputs.values():
-        folder = options.out_headers if output.is_header else options.out_sources
-        _write(pathlib.Path(folder) / output.path, output.text)
+        directory = options.out_headers if output.is_header else options.out_sources
+        _write(pathlib.Path(directory) / output.path, output.text)
 
 
 def _dump(options: argparse.Namespace) -> None:
@@ -127,22 +127,22 @@ def _dump(options: argparse.Namespace) -> None:
 
 def _check_compatibility(options: argparse.Namespace) -> None:
     if len(options.operands) != 2:
-        raise UsageError("--checkapi takes two folders: the older version and the newer one")
+        raise UsageError("--checkapi takes two directories: the older version and the newer one")
     versions = []
-    for folder in options.operands:
-        if not pathlib.Path(folder).is_dir():
-            raise UsageError(f"--checkapi {folder}: no such folder")
-        files = sorted(map(str, pathlib.Path(folder).rglob("*.aidl")))
+    for directory in options.operands:
+        if not pathlib.Path(directory).is_dir():
+            raise UsageError(f"--checkapi {directory}: no such directory")
+        files = sorted(map(str, pathlib.Path(directory).rglob("*.aidl")))
         if not files:
-            raise UsageError(f"--checkapi {folder}: there is no .aidl file in it")
-        library, documents = _load_files(files, [folder, *options.include])
+            raise UsageError(f"--checkapi {directory}: there is no .aidl file in it")
+        library, documents = _load_files(files, [directory, *options.include])
         versions += [{each.declaration.qualified_name: each for each in documents}, library]
     compatibility.check(*versions)
 
 
 def _print_hash(options: argparse.Namespace) -> None:
     if len(options.operands) != 1:
-        raise UsageError("--hash takes a folder and the number of the version before it")
+        raise UsageError("--hash takes a directory and the number of the version before it")
     print(freeze.version_hash(options.hash, options.operands[0]))
 
 
@@ -153,8 +153,8 @@ def _load(options: argparse.Namespace) -> tuple[Library, list[syntax.Document]]:
 
 
 def _load_files(files: list[str],
-                include_folders: list[str]) -> tuple[Library, list[syntax.Document]]:
-    library = Library(include_folders)
+                include_directories: list[str]) -> tuple[Library, list[syntax.Document]]:
+    library = Library(include_directories)
     documents = library.load(files)
     for document in documents:
         checks.check(document, library)

@@ -17,7 +17,7 @@ _WARNING = """\
 
 
 def path(document: syntax.Document) -> str:
-    """Where the text belongs, below the version's folder."""
+    """Where the text belongs, below the version's directory."""
     return document.declaration.qualified_name.replace(".", "/") + ".aidl"
 
 
@@ -92,7 +92,7 @@ def annotation_text(annotation: syntax.Annotation) -> str:
 
 
 def _expression(expression: syntax.Expression) -> str:
-    """An annotation's parameter as in the source, blanks aside."""
+    """An annotation's parameter as in the source, spaces aside."""
     if isinstance(expression, syntax.Literal):
         return expression.text
     if isinstance(expression, syntax.Reference):

@@ -30,7 +30,7 @@ class Options:
 
 @dataclass(frozen=True)
 class Output:
-    """A file to be written below the folder for headers or the one for sources."""
+    """A file to be written below the directory for headers or the one for sources."""
 
     is_header: bool
     path: str

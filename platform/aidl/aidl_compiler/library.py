@@ -13,11 +13,11 @@ from .parser import parse_file
 class Library:
     """Every type the run knows, by qualified name; imports are read when first asked for."""
 
-    def __init__(self, include_folders: list[str]):
-        for folder in include_folders:
-            if not pathlib.Path(folder).is_dir():
-                raise UsageError(f"--include {folder}: no such folder")
-        self._folders = [pathlib.Path(folder) for folder in include_folders]
+    def __init__(self, include_directories: list[str]):
+        for directory in include_directories:
+            if not pathlib.Path(directory).is_dir():
+                raise UsageError(f"--include {directory}: no such directory")
+        self._directories = [pathlib.Path(directory) for directory in include_directories]
         self._documents: dict[str, syntax.Document] = {}
         self._imports: dict[str, dict[str, syntax.Document]] = {}  # by the importing type
 
@@ -31,12 +31,12 @@ class Library:
         return documents
 
     def find(self, qualified_name: str) -> syntax.Document | None:
-        """The document that declares this type, read from the include folders if need be."""
+        """The document that declares this type, read from the include directories if need be."""
         if qualified_name not in self._documents:
             relative = pathlib.Path(*qualified_name.split(".")).with_suffix(".aidl")
-            for folder in self._folders:
-                if (folder / relative).is_file():
-                    document = parse_file(str(folder / relative))
+            for directory in self._directories:
+                if (directory / relative).is_file():
+                    document = parse_file(str(directory / relative))
                     self._add(document)
                     self._resolve(document)
                     break
@@ -86,8 +86,8 @@ class Library:
         reference.name = found.declaration.qualified_name
 
     def _not_found(self, name: str) -> str:
-        folders = ", ".join(map(str, self._folders)) or "none given"
-        return f"cannot find the imported type '{name}' (include folders: {folders})"
+        directories = ", ".join(map(str, self._directories)) or "none given"
+        return f"cannot find the imported type '{name}' (include directories: {directories})"
 
 
 def _check_path(document: syntax.Document) -> None:
@@ -98,7 +98,7 @@ def _check_path(document: syntax.Document) -> None:
         raise CompileError(declaration.location,
                            f"'{declaration.name}' must stand in a file named "
                            f"{declaration.name}.aidl, not {actual.name}")
-    # A relative path may leave out the folders above the current one.
+    # A relative path may leave out the directories above the current one.
     resolved = pathlib.Path(document.path).absolute().as_posix()
     if not resolved.endswith("/" + wanted):
         raise CompileError(Location(document.path, 1, 1),

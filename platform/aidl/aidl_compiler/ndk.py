@@ -43,8 +43,8 @@ def class_name(declaration: syntax.Declaration, kind: str) -> str:
 
 def header(declaration: syntax.Declaration, kind: str = "") -> str:
     """The path a header is included by."""
-    folder = declaration.package.replace(".", "/")
-    return f"aidl/{folder}/{class_name(declaration, kind)}.h"
+    directory = declaration.package.replace(".", "/")
+    return f"aidl/{directory}/{class_name(declaration, kind)}.h"
 
 
 def source(declaration: syntax.Declaration) -> str:
@@ -114,7 +114,7 @@ def _element_type(sequence: syntax.TypeReference) -> str:
 def write(of: syntax.TypeReference, parcel: str, value: str) -> str:
     """An expression that writes `value` and is a binder_status_t."""
     if of.is_sequence:
-        return f"::ndk::AParcel_writeVector({parcel}, {value})"
+        return _write_sequence(of, parcel, value)
     if of.name in _PARCEL_NAMES:
         return f"::AParcel_write{_PARCEL_NAMES[of.name]}({parcel}, {value})"
     if is_enum(of):
@@ -130,6 +130,8 @@ def read(of: syntax.TypeReference, parcel: str, target: str) -> str:
     """An expression that reads into `*target` and is a binder_status_t. Enumerations are read by
     the function readEnum, which the template must define (see `reads_enum`)."""
     if of.is_sequence:
+        if is_enum(of.element):
+            target = f"reinterpret_cast<{_backing_sequence(of)}*>({target})"
         return f"::ndk::AParcel_readVector({parcel}, {target})"
     if of.name in _PARCEL_NAMES:
         return f"::AParcel_read{_PARCEL_NAMES[of.name]}({parcel}, {target})"
@@ -139,6 +141,26 @@ def read(of: syntax.TypeReference, parcel: str, target: str) -> str:
     if isinstance(of.declaration, syntax.Interface):
         return f"{qualified(of.declaration)}::readFromParcel({parcel}, {target})"
     return f"::ndk::AParcel_read{_function_name(of)}({parcel}, {target})"
+
+
+def _write_sequence(of: syntax.TypeReference, parcel: str, value: str) -> str:
+    if not is_enum(of.element):
+        return f"::ndk::AParcel_writeVector({parcel}, {value})"
+    if of.nullable:
+        value = f"reinterpret_cast<const {_backing_sequence(of)}&>({value})"
+        return f"::ndk::AParcel_writeVector({parcel}, {value})"
+    backing = of.element.declaration.backing
+    data = f"reinterpret_cast<const {syntax.SCALARS[backing]}*>(({value}).data())"
+    return f"::AParcel_write{_PARCEL_NAMES[backing]}Array({parcel}, {data}, " \
+           f"static_cast<int32_t>(({value}).size()))"
+
+
+def _backing_sequence(of: syntax.TypeReference) -> str:
+    """The list of numbers that a list of an enumeration is: the phone's headers have no functions
+    for the latter."""
+    backing = of.element.declaration.backing
+    vector = f"std::vector<{'uint8_t' if backing == 'byte' else syntax.SCALARS[backing]}>"
+    return f"std::optional<{vector}>" if of.nullable else vector
 
 
 def reads_enum(declaration: syntax.Declaration) -> bool:

@@ -20,7 +20,7 @@ _TERMINAL_NAMES = {
     "NAME": "a name",
     "INTEGER": "a number",
     "FLOAT": "a number",
-    "STRING": "a text",
+    "STRING": "a string",
     "CHARACTER": "a character",
     "ANNOTATION_NAME": "an annotation",
     "$END": "the end of the file",
@@ -98,7 +98,7 @@ def _describe_character(rest: str, length: int = 1) -> str:
     if rest.startswith("/*"):
         return "'/*': the comment is never closed"
     if rest[:1] == '"' and length == 1:
-        return '": the text is never closed'
+        return '": the string is never closed'
     if rest[:1] == "'" and length == 1:
         return "': one character between two of these is a char"
     return f"'{rest[:length]}'"

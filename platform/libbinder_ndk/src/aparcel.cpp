@@ -1,15 +1,17 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The AParcel functions for the parcel itself, scalars, objects and the status header.
-#include <android/binder_parcel.h>
-#include <android/binder_parcel_platform.h>
 #include <fcntl.h>
 #include <unistd.h>
 
 #include <algorithm>
 #include <memory>
 
-#include "parcel.h"
-#include "status.h"
+#include <android/binder_parcel.h>
+#include <android/binder_parcel_platform.h>
+
+#include "platform/libbinder_ndk/src/parcel.h"
+#include "platform/libbinder_ndk/src/status.h"
 
 using namespace binder_ndk;
 

@@ -1,17 +1,18 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The AParcel functions for lists.
 //
 // A count that came over the wire is only an announcement. For packed lists it is held against the
 // bytes that are left before anything is allocated. In other lists every element takes a word at
 // least, so no more elements than words are left are allocated, and one more: when the count was a
 // lie, that one is where reading fails, with the status it would have failed with anyway.
-#include <android/binder_parcel.h>
-
 #include <algorithm>
 #include <cstring>
 
-#include "parcel.h"
-#include "status.h"
+#include <android/binder_parcel.h>
+
+#include "platform/libbinder_ndk/src/parcel.h"
+#include "platform/libbinder_ndk/src/status.h"
 
 using namespace binder_ndk;
 
@@ -196,7 +197,7 @@ binder_status_t AParcel_readCharArray(const AParcel* parcel, void* arrayData,
             [&](size_t index) { return AParcel_readChar(parcel, &array[index]); });
 }
 
-// ---- Lists of parcelables and texts ----
+// ---- Lists of parcelables and strings ----
 
 binder_status_t AParcel_writeParcelableArray(AParcel* parcel, const void* arrayData, int32_t length,
                                              AParcel_writeParcelableElement elementWriter) {

@@ -1,10 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
-// The AParcel functions for texts: UTF-8 for the caller, UTF-16 in the parcel.
+//
+// The AParcel functions for strings: UTF-8 for the caller, UTF-16 in the parcel.
 #include <android/binder_parcel.h>
 
-#include "parcel.h"
-#include "status.h"
-#include "utf.h"
+#include "platform/libbinder_ndk/src/parcel.h"
+#include "platform/libbinder_ndk/src/status.h"
+#include "platform/libbinder_ndk/src/utf.h"
 
 using namespace binder_ndk;
 

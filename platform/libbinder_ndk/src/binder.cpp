@@ -1,13 +1,17 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The AIBinder functions that are the same for local objects and proxies: classes, references,
 // order.
-#include "binder.h"
+#include "platform/libbinder_ndk/src/binder.h"
 
 #include <new>
 
-#include "log.h"
-#include "remote_binder.h"
-#include "utf.h"
+#include <binder_context_manager.h>
+
+#include "platform/libbinder_ndk/src/call_context.h"
+#include "platform/libbinder_ndk/src/log.h"
+#include "platform/libbinder_ndk/src/remote_binder.h"
+#include "platform/libbinder_ndk/src/utf.h"
 
 using namespace binder_ndk;
 
@@ -17,13 +21,22 @@ namespace {
 // the last defined first.
 std::atomic<AIBinder_Class*> lastClass{nullptr};
 
+// Asks an object that has no class yet, hence a proxy.
+bool isOfClass(AIBinder* binder, const AIBinder_Class* clazz) {
+    const std::u16string descriptor = binder->asRemote()->descriptor();
+    if (descriptor == clazz->descriptor16) return true;
+    logError("a remote object of interface '%s' is not one of '%s'",
+             utf16ToUtf8(descriptor).c_str(), clazz->descriptor.c_str());
+    return false;
+}
+
 }  // namespace
 
 void AIBinder::decStrong() {
     // References that are certainly not the last are counted down without asking the object.
-    int32_t count = strong_.load(std::memory_order_relaxed);
+    int32_t count = mStrong.load(std::memory_order_relaxed);
     while (count > 1) {
-        if (strong_.compare_exchange_weak(count, count - 1, std::memory_order_release,
+        if (mStrong.compare_exchange_weak(count, count - 1, std::memory_order_release,
                                           std::memory_order_relaxed))
             return;
     }
@@ -32,9 +45,9 @@ void AIBinder::decStrong() {
 }
 
 bool AIBinder::attemptIncStrong() {
-    int32_t count = strong_.load(std::memory_order_relaxed);
+    int32_t count = mStrong.load(std::memory_order_relaxed);
     while (count > 0) {
-        if (strong_.compare_exchange_weak(count, count + 1, std::memory_order_acq_rel,
+        if (mStrong.compare_exchange_weak(count, count + 1, std::memory_order_acq_rel,
                                           std::memory_order_relaxed))
             return true;
     }
@@ -42,7 +55,7 @@ bool AIBinder::attemptIncStrong() {
 }
 
 void AIBinder::decWeak() {
-    if (weak_.fetch_sub(1, std::memory_order_acq_rel) == 1) delete this;
+    if (mWeak.fetch_sub(1, std::memory_order_acq_rel) == 1) delete this;
 }
 
 AIBinder_Class* AIBinder_Class_define(const char* interfaceDescriptor,
@@ -109,13 +122,9 @@ bool AIBinder_associateClass(AIBinder* binder, const AIBinder_Class* clazz) {
 
     const AIBinder_Class* current = binder->clazz.load(std::memory_order_acquire);
     if (current == nullptr) {
-        // Only a proxy is without a class.
-        const std::u16string descriptor = binder->asRemote()->descriptor();
-        if (descriptor != clazz->descriptor16) {
-            logError("a remote object of interface '%s' is not one of '%s'",
-                     utf16ToUtf8(descriptor).c_str(), clazz->descriptor.c_str());
-            return false;
-        }
+        // What a caller hands over is taken on trust: its process could keep this thread waiting for
+        // the answer, or nest calls in it. An object of another interface refuses the calls itself.
+        if (!CallContext::current().isServing() && !isOfClass(binder, clazz)) return false;
         if (binder->clazz.compare_exchange_strong(current, clazz)) return true;
     }
     if (current == clazz) return true;

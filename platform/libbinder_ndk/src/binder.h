@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Binder objects: what AIBinder is, and the local kind.
 //
 // An object's memory has two counts. Strong references keep it working; when the last one goes, a
@@ -7,12 +8,12 @@
 // whether the object still works.
 #pragma once
 
-#include <android/binder_ibinder.h>
-#include <android/binder_shell.h>
-
 #include <atomic>
 #include <cstdint>
 #include <string>
+
+#include <android/binder_ibinder.h>
+#include <android/binder_shell.h>
 
 namespace binder_ndk {
 class LocalBinder;
@@ -45,13 +46,13 @@ struct AIBinder {
     virtual binder_status_t transact(uint32_t code, const binder_ndk::Parcel& request,
                                      binder_ndk::Parcel* reply, uint32_t flags) = 0;
 
-    void incStrong() { strong_.fetch_add(1, std::memory_order_relaxed); }
+    void incStrong() { mStrong.fetch_add(1, std::memory_order_relaxed); }
     void decStrong();
     // Takes a strong reference if there still is one.
     bool attemptIncStrong();
-    void incWeak() { weak_.fetch_add(1, std::memory_order_relaxed); }
+    void incWeak() { mWeak.fetch_add(1, std::memory_order_relaxed); }
     void decWeak();
-    int32_t strongCount() const { return strong_.load(std::memory_order_relaxed); }
+    int32_t strongCount() const { return mStrong.load(std::memory_order_relaxed); }
 
     // Set for good when a local object is made or a proxy is associated.
     std::atomic<const AIBinder_Class*> clazz{nullptr};
@@ -68,10 +69,10 @@ struct AIBinder {
     // gone.
     virtual bool dropStrong() = 0;
 
-    std::atomic<int32_t> strong_{1};
+    std::atomic<int32_t> mStrong{1};
 
   private:
-    std::atomic<int32_t> weak_{1};
+    std::atomic<int32_t> mWeak{1};
 };
 
 // A reference that keeps the memory.
@@ -91,18 +92,18 @@ class LocalBinder final : public AIBinder {
     binder_status_t transact(uint32_t code, const Parcel& request, Parcel* reply,
                              uint32_t flags) override;
 
-    void* userData() const { return userData_; }
+    void* userData() const { return mUserData; }
 
     // A strong reference is taken. No lock: attached before the object is shared.
     void setExtension(AIBinder* extension);
-    AIBinder* extension() const { return extension_; }
+    AIBinder* extension() const { return mExtension; }
 
-    void setRequestingSid(bool requesting) { requestingSid_ = requesting; }
-    bool requestingSid() const { return requestingSid_; }
+    void setRequestingSid(bool requesting) { mRequestingSid = requesting; }
+    bool requestingSid() const { return mRequestingSid; }
 
     // What stands for this object in the driver: a key, unique while anyone refers to the object,
     // and the object's own address.
-    uint64_t key() const { return reinterpret_cast<uint64_t>(&strong_); }
+    uint64_t key() const { return reinterpret_cast<uint64_t>(&mStrong); }
     uint64_t cookie() const { return reinterpret_cast<uint64_t>(this); }
 
     // The object behind a cookie of the driver's, which only ever hands back what it was given.
@@ -119,9 +120,9 @@ class LocalBinder final : public AIBinder {
     binder_status_t transactUser(uint32_t code, const Parcel& request, Parcel* reply);
     binder_status_t transactReserved(uint32_t code, const Parcel& request, Parcel* reply);
 
-    void* const userData_;
-    AIBinder* extension_ = nullptr;
-    bool requestingSid_ = false;
+    void* const mUserData;
+    AIBinder* mExtension = nullptr;
+    bool mRequestingSid = false;
 };
 
 // Codes with a meaning of their own. They carry no interface token.

@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Who is calling: what a thread knows about the transaction it serves.
 #pragma once
 
@@ -21,6 +22,9 @@ struct CallContext {
     uint32_t strictModePolicy = 0;
     // TF_ flags of the transaction.
     uint32_t flags = 0;
+
+    // Whether the thread serves a call.
+    bool isServing() const { return pid != kOwnPid; }
 
     // The calling thread's.
     static CallContext& current() {

@@ -1,16 +1,19 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Becoming the service manager.
-#include "context_manager.h"
+#include "platform/libbinder_ndk/src/context_manager.h"
 
-#include <binder_context_manager.h>
 #include <errno.h>
 
 #include <atomic>
 #include <cstring>
 
-#include "binder.h"
-#include "driver.h"
-#include "log.h"
+#include <binder_context_manager.h>
+
+#include "platform/libbinder_ndk/src/binder.h"
+#include "platform/libbinder_ndk/src/driver.h"
+#include "platform/libbinder_ndk/src/log.h"
+#include "platform/libbinder_ndk/src/remote_binder.h"
 
 namespace binder_ndk {
 namespace {
@@ -48,4 +51,11 @@ binder_status_t ABinderProcess_becomeContextManager(AIBinder* binder) {
     managerObject = nullptr;
     binder->decStrong();
     return error;
+}
+
+binder_status_t AIBinder_countHolders(AIBinder* binder, uint32_t* count) {
+    if (binder == nullptr || count == nullptr) return STATUS_UNEXPECTED_NULL;
+    const RemoteBinder* const proxy = binder->asRemote();
+    if (proxy == nullptr) return STATUS_INVALID_OPERATION;
+    return Driver::instance().countStrongReferences(proxy->handle(), count);
 }

@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The object behind handle 0, when it is this process's.
 #pragma once
 

@@ -1,8 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Death links. The driver is asked once for each proxy with links, under a cookie that is never
 // used again, so a notice that was already on its way when its request was taken back is
 // recognised.
-#include "death.h"
+#include "platform/libbinder_ndk/src/death.h"
 
 #include <algorithm>
 #include <atomic>
@@ -11,9 +12,11 @@
 #include <mutex>
 #include <vector>
 
-#include "kernel.h"
-#include "log.h"
-#include "remote_binder.h"
+#include <android-base/thread_annotations.h>
+
+#include "platform/libbinder_ndk/src/kernel.h"
+#include "platform/libbinder_ndk/src/log.h"
+#include "platform/libbinder_ndk/src/remote_binder.h"
 
 // Shared with the notice that is being delivered while the recipient is deleted.
 struct AIBinder_DeathRecipient {
@@ -47,25 +50,26 @@ class Registry {
     }
 
     binder_status_t link(RemoteBinder* proxy, Link link) {
-        const std::lock_guard<std::mutex> lock(mutex_);
+        const std::lock_guard<std::mutex> lock(mMutex);
         // Only a delivered notice refuses links: a proxy that merely failed still gets its notice.
         if (proxy->deathReported) return STATUS_DEAD_OBJECT;
         const auto watch = find(proxy);
-        if (watch != watches_.end()) {
+        if (watch != mWatches.end()) {
             watch->second.links.push_back(std::move(link));
             return STATUS_OK;
         }
-        const uint64_t cookie = ++lastCookie_;
-        watches_[cookie] = {proxy, {std::move(link)}};
+        const uint64_t cookie = ++mLastCookie;
+        mWatches[cookie] = {proxy, {std::move(link)}};
+        proxy->deathCookie = cookie;
         kernel::requestDeathNotification(proxy->handle(), cookie);
         return STATUS_OK;
     }
 
     binder_status_t unlink(RemoteBinder* proxy, const AIBinder_DeathRecipient::State* recipient,
                            const void* cookie) {
-        const std::lock_guard<std::mutex> lock(mutex_);
+        const std::lock_guard<std::mutex> lock(mMutex);
         const auto watch = find(proxy);
-        if (watch == watches_.end()) return STATUS_NAME_NOT_FOUND;
+        if (watch == mWatches.end()) return STATUS_NAME_NOT_FOUND;
         auto& links = watch->second.links;
         const auto newest = std::find_if(links.rbegin(), links.rend(), [&](const Link& link) {
             return link.recipient.get() == recipient && link.cookie == cookie;
@@ -77,14 +81,14 @@ class Registry {
     }
 
     void forget(RemoteBinder* proxy) {
-        const std::lock_guard<std::mutex> lock(mutex_);
+        const std::lock_guard<std::mutex> lock(mMutex);
         const auto watch = find(proxy);
-        if (watch != watches_.end()) drop(watch);
+        if (watch != mWatches.end()) drop(watch);
     }
 
     void forget(const AIBinder_DeathRecipient::State* recipient) {
-        const std::lock_guard<std::mutex> lock(mutex_);
-        for (auto watch = watches_.begin(); watch != watches_.end();) {
+        const std::lock_guard<std::mutex> lock(mMutex);
+        for (auto watch = mWatches.begin(); watch != mWatches.end();) {
             auto& links = watch->second.links;
             links.erase(std::remove_if(links.begin(), links.end(),
                                        [&](const Link& link) {
@@ -97,9 +101,9 @@ class Registry {
 
     // The links to fire for a notice.
     std::vector<Link> takeDead(uint64_t cookie) {
-        const std::lock_guard<std::mutex> lock(mutex_);
-        const auto watch = watches_.find(cookie);
-        if (watch == watches_.end()) return {};
+        const std::lock_guard<std::mutex> lock(mMutex);
+        const auto watch = mWatches.find(cookie);
+        if (watch == mWatches.end()) return {};
         watch->second.proxy->markDead();
         watch->second.proxy->deathReported = true;
         std::vector<Link> links = std::move(watch->second.links);
@@ -110,19 +114,19 @@ class Registry {
   private:
     using Watches = std::map<uint64_t, Watch>;
 
-    Watches::iterator find(const RemoteBinder* proxy) {
-        return std::find_if(watches_.begin(), watches_.end(),
-                            [&](const auto& entry) { return entry.second.proxy == proxy; });
+    Watches::iterator find(const RemoteBinder* proxy) REQUIRES(mMutex) {
+        return mWatches.find(proxy->deathCookie);
     }
 
-    Watches::iterator drop(Watches::iterator watch) {
+    Watches::iterator drop(Watches::iterator watch) REQUIRES(mMutex) {
         kernel::clearDeathNotification(watch->second.proxy->handle(), watch->first);
-        return watches_.erase(watch);
+        watch->second.proxy->deathCookie = 0;
+        return mWatches.erase(watch);
     }
 
-    std::mutex mutex_;
-    uint64_t lastCookie_ = 0;
-    Watches watches_;  // by the driver's cookie
+    std::mutex mMutex;
+    uint64_t mLastCookie GUARDED_BY(mMutex) = 0;
+    Watches mWatches GUARDED_BY(mMutex);  // by the driver's cookie
 };
 
 }  // namespace

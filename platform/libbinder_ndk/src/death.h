@@ -1,10 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Death notices: who wants to know of which proxy's death.
 #pragma once
 
-#include <android/binder_ibinder.h>
-
 #include <cstdint>
+
+#include <android/binder_ibinder.h>
 
 namespace binder_ndk {
 

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Opening the binder driver and its ioctls.
-#include "driver.h"
+#include "platform/libbinder_ndk/src/driver.h"
 
 #include <errno.h>
 #include <fcntl.h>
@@ -12,7 +13,7 @@
 #include <atomic>
 #include <cstring>
 
-#include "log.h"
+#include "platform/libbinder_ndk/src/log.h"
 
 namespace binder_ndk {
 namespace {
@@ -69,15 +70,15 @@ bool Driver::isForkedCopy() {
 
 Driver::Driver() {
     const char* name = nullptr;
-    fd_ = openDevice(&name);
-    if (fd_ < 0) {
+    mFd = openDevice(&name);
+    if (mFd < 0) {
         const int error = errno;
         fatal("cannot open the binder driver %s: %s; %s", name, std::strerror(error),
               helpForOpen(error));
     }
 
     binder_version version = {};
-    if (ioctl(fd_, BINDER_VERSION, &version) != 0) {
+    if (ioctl(mFd, BINDER_VERSION, &version) != 0) {
         fatal("%s does not answer as a binder driver: %s; it has to be the kernel's binder node",
               name, std::strerror(errno));
     }
@@ -89,10 +90,10 @@ Driver::Driver() {
     // Refusals of these two are harmless.
     setMaxThreads(kInitialMaxThreads);
     uint32_t enable = 1;
-    ioctl(fd_, BINDER_ENABLE_ONEWAY_SPAM_DETECTION, &enable);
+    ioctl(mFd, BINDER_ENABLE_ONEWAY_SPAM_DETECTION, &enable);
 
     void* const mapping =
-            mmap(nullptr, mappingSize(), PROT_READ, MAP_PRIVATE | MAP_NORESERVE, fd_, 0);
+            mmap(nullptr, mappingSize(), PROT_READ, MAP_PRIVATE | MAP_NORESERVE, mFd, 0);
     if (mapping == MAP_FAILED) {
         fatal("cannot map %zu bytes of the binder driver %s: %s; only the process that opened it "
               "may, "
@@ -109,14 +110,14 @@ int Driver::writeRead(binder_write_read& exchange) const {
     int error = 0;
     do {
         // The driver notes in `exchange` what it has taken so far.
-        error = ioctl(fd_, BINDER_WRITE_READ, &exchange) != 0 ? -errno : 0;
+        error = ioctl(mFd, BINDER_WRITE_READ, &exchange) != 0 ? -errno : 0;
     } while (error == -EINTR);
     handedOver.load(std::memory_order_acquire);
     return error;
 }
 
 bool Driver::setMaxThreads(uint32_t count) const {
-    if (ioctl(fd_, BINDER_SET_MAX_THREADS, &count) == 0) return true;
+    if (ioctl(mFd, BINDER_SET_MAX_THREADS, &count) == 0) return true;
     logError("the binder driver refuses %u as the number of threads: %s", count,
              std::strerror(errno));
     return false;
@@ -128,13 +129,21 @@ int Driver::becomeContextManager() const {
     if (access("/sys/fs/selinux/enforce", F_OK) == 0) {
         object.flags = FLAT_BINDER_FLAG_TXN_SECURITY_CTX;
     }
-    if (ioctl(fd_, BINDER_SET_CONTEXT_MGR_EXT, &object) == 0) return 0;
+    if (ioctl(mFd, BINDER_SET_CONTEXT_MGR_EXT, &object) == 0) return 0;
     int32_t unused = 0;
-    return ioctl(fd_, BINDER_SET_CONTEXT_MGR, &unused) == 0 ? 0 : -errno;
+    return ioctl(mFd, BINDER_SET_CONTEXT_MGR, &unused) == 0 ? 0 : -errno;
+}
+
+int Driver::countStrongReferences(uint32_t handle, uint32_t* count) const {
+    binder_node_info_for_ref info = {};
+    info.handle = handle;
+    if (ioctl(mFd, BINDER_GET_NODE_INFO_FOR_REF, &info) != 0) return -errno;
+    *count = info.strong_count;
+    return 0;
 }
 
 void Driver::exitThread() const {
-    ioctl(fd_, BINDER_THREAD_EXIT, 0);
+    ioctl(mFd, BINDER_THREAD_EXIT, 0);
 }
 
 }  // namespace binder_ndk

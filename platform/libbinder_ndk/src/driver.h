@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The open binder driver: its descriptor and the mapping it puts received buffers into.
 #pragma once
 
@@ -19,7 +20,7 @@ class Driver {
     static bool isForkedCopy();
 
     // The descriptor, for polling.
-    int fd() const { return fd_; }
+    int fd() const { return mFd; }
 
     // BINDER_WRITE_READ, repeated while a signal interrupts it. 0 or a negative errno; the counts
     // in `exchange` are right in both cases.
@@ -31,13 +32,16 @@ class Driver {
     // BINDER_SET_CONTEXT_MGR_EXT, or without EXT for older drivers. 0 or a negative errno.
     int becomeContextManager() const;
 
+    // BINDER_GET_NODE_INFO_FOR_REF. 0 or a negative errno.
+    int countStrongReferences(uint32_t handle, uint32_t* count) const;
+
     // BINDER_THREAD_EXIT: the driver forgets the calling thread.
     void exitThread() const;
 
   private:
     Driver();
 
-    int fd_ = -1;
+    int mFd = -1;
 };
 
 }  // namespace binder_ndk

@@ -1,12 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // What the library asks of the driver, as plain functions. Everything above works with these alone;
 // thread_state.cpp carries them out on the calling thread. The first one to be called opens the
 // driver.
 #pragma once
 
-#include <android/binder_status.h>
-
 #include <cstdint>
+
+#include <android/binder_status.h>
 
 namespace binder_ndk {
 

@@ -1,32 +1,35 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Objects of this process: their life, and what they answer to a transaction.
 #include <unistd.h>
 
-#include "binder.h"
-#include "call_context.h"
-#include "log.h"
-#include "parcel.h"
-#include "shell_command.h"
-#include "status.h"
-#include "token.h"
+#include <android/binder_ibinder_platform.h>
+
+#include "platform/libbinder_ndk/src/binder.h"
+#include "platform/libbinder_ndk/src/call_context.h"
+#include "platform/libbinder_ndk/src/log.h"
+#include "platform/libbinder_ndk/src/parcel.h"
+#include "platform/libbinder_ndk/src/shell_command.h"
+#include "platform/libbinder_ndk/src/status.h"
+#include "platform/libbinder_ndk/src/token.h"
 
 namespace binder_ndk {
 
-LocalBinder::LocalBinder(const AIBinder_Class* type, void* userData) : userData_(userData) {
+LocalBinder::LocalBinder(const AIBinder_Class* type, void* userData) : mUserData(userData) {
     clazz.store(type, std::memory_order_release);
 }
 
 bool LocalBinder::dropStrong() {
-    if (strong_.fetch_sub(1, std::memory_order_acq_rel) != 1) return false;
-    clazz.load()->onDestroy(userData_);
-    if (extension_ != nullptr) extension_->decStrong();
+    if (mStrong.fetch_sub(1, std::memory_order_acq_rel) != 1) return false;
+    clazz.load()->onDestroy(mUserData);
+    if (mExtension != nullptr) mExtension->decStrong();
     return true;
 }
 
 void LocalBinder::setExtension(AIBinder* extension) {
     extension->incStrong();
-    AIBinder* const old = extension_;
-    extension_ = extension;
+    AIBinder* const old = mExtension;
+    mExtension = extension;
     if (old != nullptr) old->decStrong();
 }
 
@@ -45,7 +48,7 @@ binder_status_t LocalBinder::transactReserved(uint32_t code, const Parcel& reque
         case kPingTransaction:
             return STATUS_OK;
         case kExtensionTransaction:
-            return reply->writeStrongBinder(extension_);
+            return reply->writeStrongBinder(mExtension);
         case kDebugPidTransaction:
             return reply->write(static_cast<int32_t>(getpid()));
         case kInterfaceTransaction:

@@ -1,12 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The library's log lines.
-#include "log.h"
+#include "platform/libbinder_ndk/src/log.h"
 
-#include <android/log.h>
 #include <errno.h>
 #include <stdarg.h>
 
 #include <cstdlib>
+
+#include <android/log.h>
 
 namespace binder_ndk {
 namespace {

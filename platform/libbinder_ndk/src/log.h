@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The library's log lines, all under one tag.
 #pragma once
 

@@ -1,11 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // A parcel's memory and its plain data. Objects are in parcel_objects.cpp.
-#include "parcel.h"
+#include "platform/libbinder_ndk/src/parcel.h"
 
 #include <algorithm>
 #include <cstdlib>
 
-#include "log.h"
+#include "platform/libbinder_ndk/src/log.h"
 
 namespace binder_ndk {
 namespace {
@@ -17,92 +18,92 @@ constexpr size_t roundUp(size_t length) {
 }  // namespace
 
 Parcel::~Parcel() {
-    adopted_ ? releaseAdopted() : releaseOwned();
+    mAdopted ? releaseAdopted() : releaseOwned();
 }
 
 void Parcel::reset() {
-    adopted_ ? releaseAdopted() : releaseOwned();
+    mAdopted ? releaseAdopted() : releaseOwned();
     clear();
 }
 
 void Parcel::clear() {
-    data_ = inline_;
-    size_ = 0;
-    capacity_ = kInlineCapacity;
-    position_ = 0;
-    adopted_ = false;
-    adoptedOffsets_ = nullptr;
-    adoptedOffsetCount_ = 0;
-    release_ = nullptr;
-    offsets_.clear();
-    held_.clear();
+    mData = mInline;
+    mSize = 0;
+    mCapacity = kInlineCapacity;
+    mPosition = 0;
+    mAdopted = false;
+    mAdoptedOffsets = nullptr;
+    mAdoptedOffsetCount = 0;
+    mRelease = nullptr;
+    mOffsets.clear();
+    mHeld.clear();
 }
 
 void Parcel::releaseOwned() {
-    for (AIBinder* const binder : held_)
+    for (AIBinder* const binder : mHeld)
         if (binder != nullptr) AIBinder_decStrong(binder);
     closeDescriptors();
-    if (sensitive_) explicit_bzero(data_, size_);
-    if (data_ != inline_) std::free(data_);
+    if (mSensitive) explicit_bzero(mData, mSize);
+    if (mData != mInline) std::free(mData);
 }
 
 void Parcel::releaseAdopted() {
     closeDescriptors();
-    release_(data_);
+    mRelease(mData);
 }
 
 binder_status_t Parcel::grow(size_t needed) {
-    if (needed <= capacity_) return STATUS_OK;
-    const size_t capacity = std::min(kMaxSize + 1, std::max(needed, capacity_ * 2));
+    if (needed <= mCapacity) return STATUS_OK;
+    const size_t capacity = std::min(kMaxSize + 1, std::max(needed, mCapacity * 2));
     auto* const memory = static_cast<uint8_t*>(std::malloc(capacity));
     if (memory == nullptr) return STATUS_NO_MEMORY;
-    std::memcpy(memory, data_, size_);
-    if (sensitive_) explicit_bzero(data_, size_);
-    if (data_ != inline_) std::free(data_);
-    data_ = memory;
-    capacity_ = capacity;
+    std::memcpy(memory, mData, mSize);
+    if (mSensitive) explicit_bzero(mData, mSize);
+    if (mData != mInline) std::free(mData);
+    mData = memory;
+    mCapacity = capacity;
     return STATUS_OK;
 }
 
 void Parcel::adoptFrom(Parcel& other) {
     reset();
-    data_ = other.data_;
-    size_ = other.size_;
-    capacity_ = other.size_;
-    adopted_ = true;
-    adoptedOffsets_ = other.adoptedOffsets_;
-    adoptedOffsetCount_ = other.adoptedOffsetCount_;
-    release_ = other.release_;
+    mData = other.mData;
+    mSize = other.mSize;
+    mCapacity = other.mSize;
+    mAdopted = true;
+    mAdoptedOffsets = other.mAdoptedOffsets;
+    mAdoptedOffsetCount = other.mAdoptedOffsetCount;
+    mRelease = other.mRelease;
 
     other.clear();
 }
 
 // A received buffer is mapped read-only: a parcel that is written to after all gets its own memory.
 binder_status_t Parcel::makeOwned() {
-    const size_t position = position_;
+    const size_t position = mPosition;
     Parcel received;
     received.adoptFrom(*this);
-    const binder_status_t status = append(received, 0, received.size_);
-    position_ = position;
+    const binder_status_t status = append(received, 0, received.mSize);
+    mPosition = position;
     return status;
 }
 
 binder_status_t Parcel::reserve(size_t length, uint8_t** out) {
-    if (adopted_) {
+    if (mAdopted) {
         if (const auto status = makeOwned(); status != STATUS_OK) return status;
     }
-    if (length > kMaxSize || position_ > kMaxSize) return STATUS_BAD_VALUE;
-    const size_t end = position_ + roundUp(length);
+    if (length > kMaxSize || mPosition > kMaxSize) return STATUS_BAD_VALUE;
+    const size_t end = mPosition + roundUp(length);
     if (end > kMaxSize) return STATUS_BAD_VALUE;
-    if (touchesObject(position_, end)) return STATUS_PERMISSION_DENIED;
+    if (touchesObject(mPosition, end)) return STATUS_PERMISSION_DENIED;
     if (const auto status = grow(end); status != STATUS_OK) return status;
 
     // Nothing of the process's memory may travel: neither a gap nor padding is left as it was.
-    if (position_ > size_) std::memset(data_ + size_, 0, position_ - size_);
-    std::memset(data_ + position_ + length, 0, end - position_ - length);
-    *out = data_ + position_;
-    position_ = end;
-    size_ = std::max(size_, end);
+    if (mPosition > mSize) std::memset(mData + mSize, 0, mPosition - mSize);
+    std::memset(mData + mPosition + length, 0, end - mPosition - length);
+    *out = mData + mPosition;
+    mPosition = end;
+    mSize = std::max(mSize, end);
     return STATUS_OK;
 }
 
@@ -128,10 +129,10 @@ binder_status_t Parcel::writeString16(std::u16string_view text) {
 
 binder_status_t Parcel::take(size_t length, const uint8_t** bytes) const {
     if (length > available()) return STATUS_NOT_ENOUGH_DATA;
-    const size_t begin = position_;
-    position_ += length;
-    if (touchesObject(begin, position_)) return STATUS_PERMISSION_DENIED;
-    *bytes = data_ + begin;
+    const size_t begin = mPosition;
+    mPosition += length;
+    if (touchesObject(begin, mPosition)) return STATUS_PERMISSION_DENIED;
+    *bytes = mData + begin;
     return STATUS_OK;
 }
 
@@ -149,7 +150,7 @@ bool Parcel::readString16(std::u16string_view* text) const {
     if (begin == nullptr || reinterpret_cast<uintptr_t>(begin) % alignof(char16_t) != 0)
         return false;
     if (begin[bytes] != 0 || begin[bytes + 1] != 0) {
-        logWarning("a text of %d units has no terminator", units);
+        logWarning("a string of %d units has no terminator", units);
         return false;
     }
     *text = {static_cast<const char16_t*>(static_cast<const void*>(begin)),

@@ -1,19 +1,21 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The bytes and objects of one request or reply.
 //
 // A parcel either owns its memory and is written to, or has adopted a buffer the driver filled and
 // is read from. What is read may come from anyone: every length is held against what is there
 // before anything is allocated or touched.
 //
-//   data     | token | 100 | object, 24 bytes | stability | ...      rounded up to 4 bytes, zero
-//   padded offsets  | 92 |                                                  where the objects are,
-//   ascending
+//   data      | token ... | i32 100 | object, 24 bytes | stability | ...
+//             0           88        92                 116         120
+//
+//   offsets   | 92 |                      where the objects are, ascending
+//
+// Every value is padded with zeros to a multiple of 4 bytes.
 //
 // Not thread-safe. Reading moves the position of a const parcel, as in the C interface.
 #pragma once
 
-#include <android/binder_ibinder.h>
-#include <android/binder_status.h>
 #include <linux/android/binder.h>
 
 #include <cstddef>
@@ -22,6 +24,9 @@
 #include <string_view>
 #include <type_traits>
 #include <vector>
+
+#include <android/binder_ibinder.h>
+#include <android/binder_status.h>
 
 namespace binder_ndk {
 
@@ -33,7 +38,7 @@ class Parcel {
     // Sizes and positions stay below this.
     static constexpr size_t kMaxSize = INT32_MAX;
 
-    Parcel() {}  // leaves inline_ as it is
+    Parcel() {}  // leaves mInline as it is
     ~Parcel();
     Parcel(const Parcel&) = delete;
     Parcel& operator=(const Parcel&) = delete;
@@ -51,17 +56,17 @@ class Parcel {
     void reset();
 
     // Zero the memory before it is freed.
-    void markSensitive() const { sensitive_ = true; }
+    void markSensitive() const { mSensitive = true; }
 
-    const uint8_t* data() const { return data_; }
-    size_t size() const { return size_; }
-    const binder_size_t* offsets() const { return adopted_ ? adoptedOffsets_ : offsets_.data(); }
-    size_t offsetCount() const { return adopted_ ? adoptedOffsetCount_ : offsets_.size(); }
+    const uint8_t* data() const { return mData; }
+    size_t size() const { return mSize; }
+    const binder_size_t* offsets() const { return mAdopted ? mAdoptedOffsets : mOffsets.data(); }
+    size_t offsetCount() const { return mAdopted ? mAdoptedOffsetCount : mOffsets.size(); }
 
     // Where the next read or write happens; may lie past the end, where reads fail.
-    size_t position() const { return position_; }
-    void setPosition(size_t position) const { position_ = position; }
-    size_t available() const { return position_ < size_ ? size_ - position_ : 0; }
+    size_t position() const { return mPosition; }
+    void setPosition(size_t position) const { mPosition = position; }
+    size_t available() const { return mPosition < mSize ? mSize - mPosition : 0; }
 
     // ---- Writing. An object already there may not be overwritten: STATUS_PERMISSION_DENIED. ----
 
@@ -105,7 +110,7 @@ class Parcel {
     // `length` bytes and their padding, in place; null when they are not there or not plain data.
     const uint8_t* readInPlace(size_t length) const;
 
-    // False for null and for anything that is not a text. The view ends with the buffer.
+    // False for null and for anything that is not a string. The view ends with the buffer.
     bool readString16(std::u16string_view* text) const;
 
     // One strong reference for the caller, or null.
@@ -142,22 +147,22 @@ class Parcel {
     // Calls fit in here as a rule; larger ones move to the heap.
     static constexpr size_t kInlineCapacity = 320;
 
-    uint8_t* data_ = inline_;
-    size_t size_ = 0;
-    size_t capacity_ = kInlineCapacity;
-    mutable size_t position_ = 0;
-    mutable bool sensitive_ = false;
+    uint8_t* mData = mInline;
+    size_t mSize = 0;
+    size_t mCapacity = kInlineCapacity;
+    mutable size_t mPosition = 0;
+    mutable bool mSensitive = false;
 
-    bool adopted_ = false;
-    const binder_size_t* adoptedOffsets_ = nullptr;
-    size_t adoptedOffsetCount_ = 0;
-    ReleaseBuffer release_ = nullptr;
+    bool mAdopted = false;
+    const binder_size_t* mAdoptedOffsets = nullptr;
+    size_t mAdoptedOffsetCount = 0;
+    ReleaseBuffer mRelease = nullptr;
 
     // Of a parcel that owns its memory: objects in ascending order, and the reference behind each.
-    std::vector<binder_size_t> offsets_;
-    std::vector<AIBinder*> held_;
+    std::vector<binder_size_t> mOffsets;
+    std::vector<AIBinder*> mHeld;
 
-    alignas(8) uint8_t inline_[kInlineCapacity];
+    alignas(8) uint8_t mInline[kInlineCapacity];
 };
 
 }  // namespace binder_ndk
@@ -166,19 +171,19 @@ class Parcel {
 // the binder the parcel belongs to (null for AParcel_create).
 struct AParcel {
   public:
-    explicit AParcel(const AIBinder* binder) : binder_(binder) {}
+    explicit AParcel(const AIBinder* binder) : mBinder(binder) {}
     AParcel(const AIBinder* binder, const binder_ndk::Parcel& borrowed)
         // The functions that change a parcel take a non-const AParcel.
-        : binder_(binder), parcel_(const_cast<binder_ndk::Parcel&>(borrowed)) {}
+        : mBinder(binder), mParcel(const_cast<binder_ndk::Parcel&>(borrowed)) {}
 
-    const AIBinder* binder() const { return binder_; }
-    binder_ndk::Parcel& operator*() { return parcel_; }
-    const binder_ndk::Parcel& operator*() const { return parcel_; }
-    binder_ndk::Parcel* operator->() { return &parcel_; }
-    const binder_ndk::Parcel* operator->() const { return &parcel_; }
+    const AIBinder* binder() const { return mBinder; }
+    binder_ndk::Parcel& operator*() { return mParcel; }
+    const binder_ndk::Parcel& operator*() const { return mParcel; }
+    binder_ndk::Parcel* operator->() { return &mParcel; }
+    const binder_ndk::Parcel* operator->() const { return &mParcel; }
 
   private:
-    const AIBinder* const binder_;
-    binder_ndk::Parcel own_;
-    binder_ndk::Parcel& parcel_ = own_;
+    const AIBinder* const mBinder;
+    binder_ndk::Parcel mOwn;
+    binder_ndk::Parcel& mParcel = mOwn;
 };

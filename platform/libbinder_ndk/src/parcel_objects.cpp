@@ -1,15 +1,16 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // A parcel's objects: binders and file descriptors.
 #include <fcntl.h>
 #include <unistd.h>
 
 #include <algorithm>
 
-#include "binder.h"
-#include "log.h"
-#include "parcel.h"
-#include "remote_binder.h"
-#include "stability.h"
+#include "platform/libbinder_ndk/src/binder.h"
+#include "platform/libbinder_ndk/src/log.h"
+#include "platform/libbinder_ndk/src/parcel.h"
+#include "platform/libbinder_ndk/src/remote_binder.h"
+#include "platform/libbinder_ndk/src/stability.h"
 
 namespace binder_ndk {
 namespace {
@@ -54,33 +55,33 @@ int descriptorOf(const flat_binder_object& object) {
 void Parcel::adopt(const uint8_t* data, size_t size, const binder_size_t* offsets,
                    size_t offsetCount, ReleaseBuffer release) {
     reset();
-    // Never written through while adopted_ is set.
-    data_ = const_cast<uint8_t*>(data);  // NOLINT(cppcoreguidelines-pro-type-const-cast)
-    size_ = size;
-    capacity_ = size;
-    adopted_ = true;
-    release_ = release;
+    // Never written through while mAdopted is set.
+    mData = const_cast<uint8_t*>(data);  // NOLINT(cppcoreguidelines-pro-type-const-cast)
+    mSize = size;
+    mCapacity = size;
+    mAdopted = true;
+    mRelease = release;
     if (!adoptOffsets(offsets, offsetCount)) {
         logError("a received parcel of %zu bytes has a bad object list, which is dropped", size);
         closeDescriptors();
-        adoptedOffsets_ = nullptr;
-        adoptedOffsetCount_ = 0;
+        mAdoptedOffsets = nullptr;
+        mAdoptedOffsetCount = 0;
     }
 }
 
 // Takes over as much of the list as is in order; false when that is not all of it, or not all of it
 // is of a known kind.
 bool Parcel::adoptOffsets(const binder_size_t* offsets, size_t count) {
-    adoptedOffsets_ = offsets;
+    mAdoptedOffsets = offsets;
     bool known = true;
     size_t free = 0;
     for (size_t i = 0; i < count; ++i) {
         const binder_size_t offset = offsets[i];
-        if (offset < free || offset % 4 != 0 || size_ < kObjectSize || offset > size_ - kObjectSize)
+        if (offset < free || offset % 4 != 0 || mSize < kObjectSize || offset > mSize - kObjectSize)
             return false;
         known = known && isKnownType(objectAt(offset).hdr.type);
         free = offset + kObjectSize;
-        adoptedOffsetCount_ = i + 1;
+        mAdoptedOffsetCount = i + 1;
     }
     return known;
 }
@@ -89,14 +90,14 @@ void Parcel::closeDescriptors() const {
     for (size_t i = 0; i < offsetCount(); ++i) {
         const flat_binder_object object = objectAt(offsets()[i]);
         // A received descriptor is always ours; one written here only when it was given away.
-        if (object.hdr.type == BINDER_TYPE_FD && (adopted_ || object.cookie != 0))
+        if (object.hdr.type == BINDER_TYPE_FD && (mAdopted || object.cookie != 0))
             close(descriptorOf(object));
     }
 }
 
 flat_binder_object Parcel::objectAt(size_t offset) const {
     flat_binder_object object;
-    std::memcpy(&object, data_ + offset, kObjectSize);
+    std::memcpy(&object, mData + offset, kObjectSize);
     return object;
 }
 
@@ -116,14 +117,14 @@ bool Parcel::touchesObject(size_t begin, size_t end) const {
 }
 
 void Parcel::listObject(size_t offset, AIBinder* held) {
-    const auto at = std::lower_bound(offsets_.begin(), offsets_.end(), offset);
-    held_.insert(held_.begin() + (at - offsets_.begin()), held);
-    offsets_.insert(at, offset);
+    const auto at = std::lower_bound(mOffsets.begin(), mOffsets.end(), offset);
+    mHeld.insert(mHeld.begin() + (at - mOffsets.begin()), held);
+    mOffsets.insert(at, offset);
 }
 
 binder_status_t Parcel::writeObject(const flat_binder_object& object, AIBinder* held) {
     if (const auto status = writeBytes(&object, kObjectSize); status != STATUS_OK) return status;
-    listObject(position_ - kObjectSize, held);
+    listObject(mPosition - kObjectSize, held);
     return STATUS_OK;
 }
 
@@ -156,9 +157,9 @@ binder_status_t Parcel::writeFileDescriptor(int fd, bool owned) {
 
 bool Parcel::takeObject(flat_binder_object* object, size_t* offset) const {
     if (available() < kObjectSize) return false;
-    *offset = position_;
-    *object = objectAt(position_);
-    position_ += kObjectSize;
+    *offset = mPosition;
+    *object = objectAt(mPosition);
+    mPosition += kObjectSize;
     return true;
 }
 
@@ -226,7 +227,7 @@ binder_status_t Parcel::append(const Parcel& from, size_t start, size_t length) 
     if (start > from.size() || length > from.size() - start) return STATUS_BAD_VALUE;
     if (length == 0) return STATUS_OK;
 
-    const size_t base = position_;
+    const size_t base = mPosition;
     uint8_t* to = nullptr;
     if (const auto status = reserve(length, &to); status != STATUS_OK) return status;
     // `from` may be this parcel, whose memory may just have moved: it is asked only now.
@@ -244,7 +245,7 @@ binder_status_t Parcel::append(const Parcel& from, size_t start, size_t length) 
         // addresses.
         if (status != STATUS_OK) object = {};
         const size_t offset = base + (fromOffset - start);
-        std::memcpy(data_ + offset, &object, kObjectSize);
+        std::memcpy(mData + offset, &object, kObjectSize);
         if (status == STATUS_OK) listObject(offset, held);
     }
     return status;

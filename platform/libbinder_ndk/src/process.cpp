@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The ABinderProcess functions and the pool of serving threads.
-#include "process.h"
+#include "platform/libbinder_ndk/src/process.h"
 
-#include <android/binder_process.h>
 #include <sys/prctl.h>
 #include <unistd.h>
 
@@ -11,17 +11,21 @@
 #include <mutex>
 #include <thread>
 
-#include "driver.h"
-#include "log.h"
-#include "thread_state.h"
+#include <android-base/thread_annotations.h>
+#include <android/binder_process.h>
+
+#include "platform/libbinder_ndk/src/driver.h"
+#include "platform/libbinder_ndk/src/log.h"
+#include "platform/libbinder_ndk/src/thread_state.h"
 
 namespace binder_ndk {
 namespace {
 
 struct Pool {
     std::mutex mutex;
-    bool started = false;
-    uint32_t maxThreads = 15;  // what the driver is told when it is opened
+    bool started GUARDED_BY(mutex) = false;
+    // What the driver is told when it is opened.
+    uint32_t maxThreads GUARDED_BY(mutex) = 15;
     std::atomic<unsigned> lastNumber{0};
 
     static Pool& instance() {

@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The process's pool of serving threads.
 #pragma once
 

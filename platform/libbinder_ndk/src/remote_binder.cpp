@@ -1,15 +1,16 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Proxies and the table that keeps them unique.
-#include "remote_binder.h"
-
-#include <android/binder_stability.h>
+#include "platform/libbinder_ndk/src/remote_binder.h"
 
 #include <unordered_map>
 
-#include "death.h"
-#include "kernel.h"
-#include "parcel.h"
-#include "stability.h"
+#include <android/binder_stability.h>
+
+#include "platform/libbinder_ndk/src/death.h"
+#include "platform/libbinder_ndk/src/kernel.h"
+#include "platform/libbinder_ndk/src/parcel.h"
+#include "platform/libbinder_ndk/src/stability.h"
 
 namespace binder_ndk {
 namespace {
@@ -20,7 +21,7 @@ namespace {
 // number the driver gives out anew is never mixed up with its former life.
 struct ProxyTable {
     std::mutex mutex;
-    std::unordered_map<uint32_t, RemoteBinder*> proxies;
+    std::unordered_map<uint32_t, RemoteBinder*> proxies GUARDED_BY(mutex);
 
     // Never destroyed: threads serve on while the process exits.
     static ProxyTable& instance() {
@@ -28,8 +29,8 @@ struct ProxyTable {
         return *table;
     }
 
-    // With the lock held. One strong reference, or null.
-    RemoteBinder* find(uint32_t handle) const {
+    // One strong reference, or null.
+    RemoteBinder* find(uint32_t handle) const REQUIRES(mutex) {
         const auto entry = proxies.find(handle);
         if (entry == proxies.end()) return nullptr;
         entry->second->incStrong();
@@ -37,13 +38,20 @@ struct ProxyTable {
     }
 };
 
+}  // namespace
+
 bool isServiceManagerThere() {
     const Parcel request;
     Parcel reply;
     return kernel::transact(0, kPingTransaction, request, &reply, 0) != STATUS_DEAD_OBJECT;
 }
 
-}  // namespace
+// The driver needs no reference to handle 0 for calls to it.
+AIBinder* newServiceManagerProxy() {
+    auto* const proxy = new RemoteBinder(0, u"android.os.IServiceManager");
+    markServiceManagerStability(proxy);
+    return proxy;
+}
 
 AIBinder* strongProxy(uint32_t handle) {
     ProxyTable& table = ProxyTable::instance();
@@ -67,10 +75,10 @@ AIBinder* strongProxy(uint32_t handle) {
 bool RemoteBinder::dropStrong() {
     ProxyTable& table = ProxyTable::instance();
     const std::lock_guard<std::mutex> lock(table.mutex);
-    if (strong_.fetch_sub(1, std::memory_order_acq_rel) != 1) return false;
-    table.proxies.erase(handle_);
+    if (mStrong.fetch_sub(1, std::memory_order_acq_rel) != 1) return false;
+    table.proxies.erase(mHandle);
     forgetDeathLinks(this);
-    kernel::release(handle_);
+    kernel::release(mHandle);
     return true;
 }
 
@@ -79,15 +87,15 @@ binder_status_t RemoteBinder::transact(uint32_t code, const Parcel& request, Par
     if (!isAlive()) return STATUS_DEAD_OBJECT;
     if (isUserCode(code) && !mayCall(this, flags)) return STATUS_BAD_TYPE;
     const binder_status_t status = kernel::transact(
-            handle_, code, request, reply, flags & ~static_cast<uint32_t>(FLAG_PRIVATE_VENDOR));
+            mHandle, code, request, reply, flags & ~static_cast<uint32_t>(FLAG_PRIVATE_VENDOR));
     if (status == STATUS_DEAD_OBJECT) markDead();
     return status;
 }
 
 std::u16string RemoteBinder::descriptor() {
     {
-        const std::lock_guard<std::mutex> lock(mutex_);
-        if (!descriptor_.empty()) return descriptor_;
+        const std::lock_guard<std::mutex> lock(mMutex);
+        if (!mDescriptor.empty()) return mDescriptor;
     }
     const Parcel request;
     Parcel reply;
@@ -95,9 +103,9 @@ std::u16string RemoteBinder::descriptor() {
     if (transact(kInterfaceTransaction, request, &reply, 0) != STATUS_OK) return {};
     reply.setPosition(0);
     if (!reply.readString16(&answer)) return {};
-    const std::lock_guard<std::mutex> lock(mutex_);
-    if (descriptor_.empty()) descriptor_ = answer;
-    return descriptor_;
+    const std::lock_guard<std::mutex> lock(mMutex);
+    if (mDescriptor.empty()) mDescriptor = answer;
+    return mDescriptor;
 }
 
 }  // namespace binder_ndk

@@ -1,18 +1,19 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Dump and shell commands, both sides.
-#include "shell_command.h"
+#include "platform/libbinder_ndk/src/shell_command.h"
 
 #include <linux/android/binder.h>
 
 #include <string>
 #include <vector>
 
-#include "binder.h"
-#include "call_context.h"
-#include "parcel.h"
-#include "status.h"
-#include "token.h"
-#include "utf.h"
+#include "platform/libbinder_ndk/src/binder.h"
+#include "platform/libbinder_ndk/src/call_context.h"
+#include "platform/libbinder_ndk/src/parcel.h"
+#include "platform/libbinder_ndk/src/status.h"
+#include "platform/libbinder_ndk/src/token.h"
+#include "platform/libbinder_ndk/src/utf.h"
 
 namespace binder_ndk {
 namespace {
@@ -25,7 +26,7 @@ struct Arguments {
     std::vector<std::string> texts;
     std::vector<const char*> pointers;
 
-    // Reads as many as the request holds of those it announces. What is not a text counts as "".
+    // Reads as many as the request holds of those it announces. What is not a string counts as "".
     explicit Arguments(const Parcel& request) {
         int32_t count = 0;
         request.read(&count);
@@ -50,26 +51,26 @@ int readDescriptorOrNone(const Parcel& request) {
 // Someone of the shell's who waits for the result.
 class ResultReceiver {
   public:
-    explicit ResultReceiver(const Parcel& request) { request.readStrongBinder(&binder_); }
+    explicit ResultReceiver(const Parcel& request) { request.readStrongBinder(&mBinder); }
     ~ResultReceiver() {
-        if (binder_ != nullptr) binder_->decStrong();
+        if (mBinder != nullptr) mBinder->decStrong();
     }
     ResultReceiver(const ResultReceiver&) = delete;
     ResultReceiver& operator=(const ResultReceiver&) = delete;
 
     void send(int32_t result) const {
         constexpr uint32_t kSend = FIRST_CALL_TRANSACTION;
-        if (binder_ == nullptr) return;
+        if (mBinder == nullptr) return;
         Parcel request;
         Parcel reply;
         if (writeInterfaceToken(request, u"com.android.internal.os.IResultReceiver") == STATUS_OK &&
             request.write(result) == STATUS_OK) {
-            binder_->transact(kSend, request, &reply, FLAG_ONEWAY);
+            mBinder->transact(kSend, request, &reply, FLAG_ONEWAY);
         }
     }
 
   private:
-    AIBinder* binder_ = nullptr;
+    AIBinder* mBinder = nullptr;
 };
 
 }  // namespace
@@ -79,7 +80,7 @@ binder_status_t serveDump(LocalBinder* binder, const Parcel& request) {
     if (onDump == nullptr) return STATUS_OK;
     const int fd = readDescriptorOrNone(request);
     Arguments arguments(request);
-    return knownStatus(onDump(binder, fd, arguments.data(), arguments.size()));
+    return onDump(binder, fd, arguments.data(), arguments.size());
 }
 
 binder_status_t serveShellCommand(LocalBinder* binder, const Parcel& request) {
@@ -104,8 +105,7 @@ binder_status_t serveShellCommand(LocalBinder* binder, const Parcel& request) {
         receiver.send(-1);
         return STATUS_BAD_VALUE;
     }
-    const binder_status_t status =
-            knownStatus(handle(binder, in, out, err, arguments.data(), arguments.size()));
+    const binder_status_t status = handle(binder, in, out, err, arguments.data(), arguments.size());
     receiver.send(status);
     return status;
 }

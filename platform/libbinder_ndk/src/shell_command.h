@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Dump and shell commands to a local object.
 #pragma once
 
@@ -9,10 +10,10 @@ namespace binder_ndk {
 class LocalBinder;
 class Parcel;
 
-// Request: descriptor, count, texts.
+// Request: descriptor, count, strings.
 binder_status_t serveDump(LocalBinder* binder, const Parcel& request);
 
-// Request: three descriptors, count, texts, the shell's callback, the receiver of the result.
+// Request: three descriptors, count, strings, the shell's callback, the receiver of the result.
 binder_status_t serveShellCommand(LocalBinder* binder, const Parcel& request);
 
 }  // namespace binder_ndk

@@ -1,12 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Stability marks and checks.
-#include "stability.h"
+#include "platform/libbinder_ndk/src/stability.h"
 
 #include <android/binder_stability.h>
+#include <binder_context_manager.h>
 
-#include "binder.h"
-#include "binder_context_manager.h"
-#include "log.h"
+#include "platform/libbinder_ndk/src/binder.h"
+#include "platform/libbinder_ndk/src/log.h"
 
 namespace binder_ndk {
 namespace {

@@ -1,12 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Stability levels and the word that carries them behind every binder in a parcel:
 //
 //   byte 0: wire version, 1 | bytes 1-2: zero | byte 3: level
 #pragma once
 
-#include <android/binder_ibinder.h>
-
 #include <cstdint>
+
+#include <android/binder_ibinder.h>
 
 namespace binder_ndk {
 

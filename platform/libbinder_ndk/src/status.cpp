@@ -1,10 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The AStatus functions, and the names of status codes and exceptions.
-#include "status.h"
+#include "platform/libbinder_ndk/src/status.h"
 
 #include <cstring>
 
-#include "log.h"
+#include "platform/libbinder_ndk/src/log.h"
 
 namespace binder_ndk {
 namespace {

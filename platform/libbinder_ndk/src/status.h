@@ -1,10 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Status codes, exceptions and AStatus; how an outcome opens a reply.
 #pragma once
 
-#include <android/binder_status.h>
-
 #include <string>
+
+#include <android/binder_status.h>
 
 // An outcome. The exception is kept as it came, also an unknown one: its number shows in the
 // description, while getExceptionCode answers EX_TRANSACTION_FAILED.

@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The status header: the first thing in the reply of every generated method.
 //
 //   exception i32 | message String16, never null | stack trace size i32 = 0 | more for two
@@ -8,9 +9,9 @@
 // a size, before a success.
 #include <string_view>
 
-#include "parcel.h"
-#include "status.h"
-#include "utf.h"
+#include "platform/libbinder_ndk/src/parcel.h"
+#include "platform/libbinder_ndk/src/status.h"
+#include "platform/libbinder_ndk/src/utf.h"
 
 namespace binder_ndk {
 namespace {

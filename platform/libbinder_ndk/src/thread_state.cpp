@@ -1,16 +1,17 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Sending: the command queue, transactions out of this process, and waiting for their end.
-#include "thread_state.h"
+#include "platform/libbinder_ndk/src/thread_state.h"
 
 #include <errno.h>
 #include <pthread.h>
 
 #include <cstring>
 
-#include "driver.h"
-#include "kernel.h"
-#include "log.h"
-#include "parcel.h"
+#include "platform/libbinder_ndk/src/driver.h"
+#include "platform/libbinder_ndk/src/kernel.h"
+#include "platform/libbinder_ndk/src/log.h"
+#include "platform/libbinder_ndk/src/parcel.h"
 
 namespace binder_ndk {
 namespace {
@@ -65,7 +66,7 @@ void ThreadState::append(const void* bytes, size_t length) {
     // A forked child's references were never the driver's to count.
     if (Driver::isForkedCopy()) return;
     const auto* const begin = static_cast<const uint8_t*>(bytes);
-    queue_.insert(queue_.end(), begin, begin + length);
+    mQueue.insert(mQueue.end(), begin, begin + length);
 }
 
 void ThreadState::flush() {
@@ -75,7 +76,7 @@ void ThreadState::flush() {
 }
 
 void ThreadState::flushUnlessServing() {
-    if (!isLooper_ && serving_ == 0) flush();
+    if (!mIsLooper && mServing == 0) flush();
 }
 
 binder_status_t ThreadState::talk(bool read) {
@@ -84,21 +85,21 @@ binder_status_t ThreadState::talk(bool read) {
     binder_write_read exchange = {};
     // While commands are left only a flush may write: they may ask for answers that come first.
     if (!read || wantsRead) {
-        exchange.write_size = queue_.size();
-        exchange.write_buffer = reinterpret_cast<binder_uintptr_t>(queue_.data());
+        exchange.write_size = mQueue.size();
+        exchange.write_buffer = reinterpret_cast<binder_uintptr_t>(mQueue.data());
     }
     if (wantsRead) {
-        exchange.read_size = sizeof in_;
-        exchange.read_buffer = reinterpret_cast<binder_uintptr_t>(in_);
+        exchange.read_size = sizeof mIn;
+        exchange.read_buffer = reinterpret_cast<binder_uintptr_t>(mIn);
     }
     if (exchange.write_size == 0 && exchange.read_size == 0) return STATUS_OK;
 
     const int error = Driver::instance().writeRead(exchange);
     // The driver stops behind a transaction that failed; the rest goes with the next write.
-    queue_.erase(queue_.begin(), queue_.begin() + static_cast<ptrdiff_t>(exchange.write_consumed));
+    mQueue.erase(mQueue.begin(), mQueue.begin() + static_cast<ptrdiff_t>(exchange.write_consumed));
     if (wantsRead) {
-        received_ = 0;
-        receivedSize_ = error == 0 ? exchange.read_consumed : 0;
+        mReceived = 0;
+        mReceivedSize = error == 0 ? exchange.read_consumed : 0;
     }
     return error;
 }
@@ -117,11 +118,11 @@ void ThreadState::queueTransaction(uint32_t command, uint32_t handle, uint32_t c
 }
 
 void ThreadState::queueStatusReply(binder_status_t status, uint32_t flags) {
-    statusReply_ = status;
+    mStatusReply = status;
     binder_transaction_data transaction = {};
     transaction.flags = flags | TF_STATUS_CODE;
-    transaction.data_size = sizeof statusReply_;
-    transaction.data.ptr.buffer = reinterpret_cast<binder_uintptr_t>(&statusReply_);
+    transaction.data_size = sizeof mStatusReply;
+    transaction.data.ptr.buffer = reinterpret_cast<binder_uintptr_t>(&mStatusReply);
     queue(BC_REPLY, transaction);
 }
 
@@ -133,7 +134,7 @@ binder_status_t ThreadState::transact(uint32_t handle, uint32_t code, const Parc
     queueTransaction(BC_TRANSACTION, handle, code, flags | TF_ACCEPT_FDS, request);
     const binder_status_t status =
             waitFor((flags & TF_ONE_WAY) != 0 ? Until::kSent : Until::kReplied, reply);
-    if (!isLooper_ && serving_ == 0 && !hasReceived()) dropReleased();
+    if (!mIsLooper && mServing == 0 && !hasReceived()) dropReleased();
     return status;
 }
 

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // One thread's conversation with the driver: commands it has queued, commands it has received.
 #pragma once
 
-#include <android/binder_status.h>
 #include <linux/android/binder.h>
 
 #include <algorithm>
@@ -11,7 +11,9 @@
 #include <cstring>
 #include <vector>
 
-#include "binder.h"
+#include <android/binder_status.h>
+
+#include "platform/libbinder_ndk/src/binder.h"
 
 namespace binder_ndk {
 
@@ -54,6 +56,10 @@ class ThreadState {
     binder_status_t handlePolled();
 
   private:
+    // A caller that is called back may call again while this thread waits for it, each time deeper
+    // in this thread's stack. More than this at a time is an attack on the stack.
+    static constexpr int kMaxNestedCalls = 32;
+
     // What ends a wait: our transaction was taken, or its reply is there.
     enum class Until { kSent, kReplied };
 
@@ -62,12 +68,12 @@ class ThreadState {
     template <typename T>
     T receive() {
         T value = {};
-        if (receivedSize_ - received_ >= sizeof value)
-            std::memcpy(&value, in_ + received_, sizeof value);
-        received_ = std::min(receivedSize_, received_ + sizeof value);
+        if (mReceivedSize - mReceived >= sizeof value)
+            std::memcpy(&value, mIn + mReceived, sizeof value);
+        mReceived = std::min(mReceivedSize, mReceived + sizeof value);
         return value;
     }
-    bool hasReceived() const { return received_ < receivedSize_; }
+    bool hasReceived() const { return mReceived < mReceivedSize; }
 
     void queueTransaction(uint32_t command, uint32_t handle, uint32_t code, uint32_t flags,
                           const Parcel& data);
@@ -85,27 +91,28 @@ class ThreadState {
     void serveTransaction(const binder_transaction_data& transaction, const char* sid);
     binder_status_t callTarget(const binder_transaction_data& transaction, const Parcel& request,
                                Parcel* reply);
+    binder_status_t refuseNesting();
     void sendReply(binder_status_t status, const Parcel& reply, uint32_t requestFlags);
 
     // Drops the references the driver gave back; only between read buffers, because user code runs.
     void dropReleased();
 
-    std::vector<uint8_t> queue_;
+    std::vector<uint8_t> mQueue;
 
     // The platform's size. The driver needs no more than 80 bytes for a command of its own.
-    alignas(8) uint8_t in_[256];
-    size_t received_ = 0;
-    size_t receivedSize_ = 0;
+    alignas(8) uint8_t mIn[256];
+    size_t mReceived = 0;
+    size_t mReceivedSize = 0;
 
     // A looper's queue goes with its next read.
-    bool isLooper_ = false;
-    int serving_ = 0;
+    bool mIsLooper = false;
+    int mServing = 0;
 
     // What a status reply points at until the driver has copied it.
-    int32_t statusReply_ = 0;
+    int32_t mStatusReply = 0;
 
-    std::vector<LocalBinder*> releasedStrong_;
-    std::vector<LocalBinder*> releasedWeak_;
+    std::vector<LocalBinder*> mReleasedStrong;
+    std::vector<LocalBinder*> mReleasedWeak;
 };
 
 }  // namespace binder_ndk

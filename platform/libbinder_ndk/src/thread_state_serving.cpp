@@ -1,18 +1,20 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Receiving: transactions into this process, references the driver takes and gives back, notices.
 #include <errno.h>
 
 #include <cstring>
+#include <mutex>
 
-#include "call_context.h"
-#include "context_manager.h"
-#include "death.h"
-#include "driver.h"
-#include "kernel.h"
-#include "log.h"
-#include "parcel.h"
-#include "process.h"
-#include "thread_state.h"
+#include "platform/libbinder_ndk/src/call_context.h"
+#include "platform/libbinder_ndk/src/context_manager.h"
+#include "platform/libbinder_ndk/src/death.h"
+#include "platform/libbinder_ndk/src/driver.h"
+#include "platform/libbinder_ndk/src/kernel.h"
+#include "platform/libbinder_ndk/src/log.h"
+#include "platform/libbinder_ndk/src/parcel.h"
+#include "platform/libbinder_ndk/src/process.h"
+#include "platform/libbinder_ndk/src/thread_state.h"
 
 namespace binder_ndk {
 
@@ -46,10 +48,10 @@ binder_status_t ThreadState::execute(uint32_t command) {
             return STATUS_OK;
         }
         case BR_RELEASE:
-            releasedStrong_.push_back(LocalBinder::fromCookie(receive<binder_ptr_cookie>().cookie));
+            mReleasedStrong.push_back(LocalBinder::fromCookie(receive<binder_ptr_cookie>().cookie));
             return STATUS_OK;
         case BR_DECREFS:
-            releasedWeak_.push_back(LocalBinder::fromCookie(receive<binder_ptr_cookie>().cookie));
+            mReleasedWeak.push_back(LocalBinder::fromCookie(receive<binder_ptr_cookie>().cookie));
             return STATUS_OK;
         case BR_DEAD_BINDER: {
             const auto cookie = receive<binder_uintptr_t>();
@@ -74,7 +76,7 @@ binder_status_t ThreadState::execute(uint32_t command) {
 // A command's number says how long its payload is.
 binder_status_t ThreadState::skipUnknown(uint32_t command) {
     logError("the binder driver sent the unknown command 0x%x", command);
-    received_ = std::min(receivedSize_, received_ + _IOC_SIZE(command));
+    mReceived = std::min(mReceivedSize, mReceived + _IOC_SIZE(command));
     return STATUS_UNKNOWN_ERROR;
 }
 
@@ -89,16 +91,15 @@ void ThreadState::serveTransaction(const binder_transaction_data& transaction, c
 
     CallContext& context = CallContext::current();
     const CallContext saved = context;
-    context = {};
-    context.pid = transaction.sender_pid;  // the driver says 0 for a oneway call
-    context.uid = transaction.sender_euid;
-    context.sid = sid;
-    context.flags = transaction.flags;
-    ++serving_;
+    // The driver says pid 0 for a oneway call.
+    context = {transaction.sender_pid, transaction.sender_euid, sid, 0, transaction.flags};
+    ++mServing;
 
     {
         Parcel reply;
-        const binder_status_t status = callTarget(transaction, request, &reply);
+        const binder_status_t status = mServing <= kMaxNestedCalls
+                                               ? callTarget(transaction, request, &reply)
+                                               : refuseNesting();
         if (!isOneway) {
             sendReply(status, reply, transaction.flags);
         } else if (status != STATUS_OK) {
@@ -106,8 +107,20 @@ void ThreadState::serveTransaction(const binder_transaction_data& transaction, c
         }
     }
 
-    --serving_;
+    --mServing;
     context = saved;
+}
+
+binder_status_t ThreadState::refuseNesting() {
+    static std::once_flag said;
+    const CallContext& context = CallContext::current();
+    std::call_once(said, [&] {
+        logError(
+                "process %d of user %u nests calls more than %d deep; this one and all like it are "
+                "refused",
+                context.pid, context.uid, kMaxNestedCalls);
+    });
+    return STATUS_FAILED_TRANSACTION;
 }
 
 binder_status_t ThreadState::callTarget(const binder_transaction_data& transaction,
@@ -140,11 +153,11 @@ void ThreadState::sendReply(binder_status_t status, const Parcel& reply, uint32_
 
 void ThreadState::dropReleased() {
     // What runs here may release more.
-    while (!releasedStrong_.empty() || !releasedWeak_.empty()) {
+    while (!mReleasedStrong.empty() || !mReleasedWeak.empty()) {
         std::vector<LocalBinder*> strong;
         std::vector<LocalBinder*> weak;
-        strong.swap(releasedStrong_);
-        weak.swap(releasedWeak_);
+        strong.swap(mReleasedStrong);
+        weak.swap(mReleasedWeak);
         for (LocalBinder* const binder : strong) binder->decStrong();
         for (LocalBinder* const binder : weak) binder->decWeak();
     }
@@ -157,7 +170,7 @@ binder_status_t ThreadState::executeNext() {
 }
 
 void ThreadState::serve(bool isMain) {
-    isLooper_ = true;
+    mIsLooper = true;
     queue(isMain ? BC_ENTER_LOOPER : BC_REGISTER_LOOPER);
     for (;;) {
         if (!hasReceived()) dropReleased();
@@ -171,11 +184,11 @@ void ThreadState::serve(bool isMain) {
     }
     queue(BC_EXIT_LOOPER);
     flush();
-    isLooper_ = false;
+    mIsLooper = false;
 }
 
 void ThreadState::enterPolling() {
-    isLooper_ = true;
+    mIsLooper = true;
     queue(BC_ENTER_LOOPER);
     flush();
 }

@@ -1,13 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The interface token.
-#include "token.h"
+#include "platform/libbinder_ndk/src/token.h"
 
 #include <linux/android/binder.h>
 
-#include "call_context.h"
-#include "log.h"
-#include "parcel.h"
-#include "utf.h"
+#include "platform/libbinder_ndk/src/call_context.h"
+#include "platform/libbinder_ndk/src/log.h"
+#include "platform/libbinder_ndk/src/parcel.h"
+#include "platform/libbinder_ndk/src/utf.h"
 
 namespace binder_ndk {
 namespace {

@@ -1,12 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // The interface token: what every request for a user method starts with.
 //
 //   strict-mode policy | work source uid, -1 | header 'SYST' | descriptor String16
 #pragma once
 
-#include <android/binder_status.h>
-
 #include <string_view>
+
+#include <android/binder_status.h>
 
 namespace binder_ndk {
 

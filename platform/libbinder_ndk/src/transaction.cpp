@@ -1,15 +1,16 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // Transactions through the C interface: preparing and sending one, and handing one that came in to
 // the class.
+#include <memory>
+
 #include <android/binder_ibinder_platform.h>
 #include <android/binder_stability.h>
 
-#include <memory>
-
-#include "binder.h"
-#include "parcel.h"
-#include "status.h"
-#include "token.h"
+#include "platform/libbinder_ndk/src/binder.h"
+#include "platform/libbinder_ndk/src/parcel.h"
+#include "platform/libbinder_ndk/src/status.h"
+#include "platform/libbinder_ndk/src/token.h"
 
 namespace binder_ndk {
 

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // UTF-8 and UTF-16.
-#include "utf.h"
+#include "platform/libbinder_ndk/src/utf.h"
 
 #include <cstring>
 

@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+//
 // UTF-8 in memory, UTF-16 in parcels.
 //
 // The conversions are as tolerant as the platform's: a lead byte alone decides how many bytes are

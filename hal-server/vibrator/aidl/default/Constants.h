@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 //
 // The driver's fixed names, shared by the hardware layer and both services: node paths that do not
-// depend on the device class, the folder commands, the motor types and the driver's feature words.
+// depend on the device class, the posture commands, the motor types and the driver's feature words.
 // All of it is there before main() runs.
 #pragma once
 
@@ -43,20 +43,32 @@ inline constexpr char TIMED_OUTPUT_USE_KYP_INDEX[] =
         "/sys/class/timed_output/vibrator/use_kyp_index";
 inline constexpr char INPUTFF_USE_KYP_INDEX[] = "/sys/class/qvx_vib_inputff/control/use_kyp_index";
 
-// Posture commands of a foldable device, line feed included, written as they stand to
+// Posture commands of a foldable device, newline included, written as they stand to
 // THE_DEVICE_EVENT_CMD.
 inline constexpr char FOLDER_OPEN[] = "FOLDER_OPEN\n";
 inline constexpr char FOLDER_CLOSE[] = "FOLDER_CLOSE\n";
 inline constexpr char FOLDER_TENT_OPEN[] = "FOLDER_TENT_OPEN\n";
 inline constexpr char FOLDER_TENT_CLOSE[] = "FOLDER_TENT_CLOSE\n";
 
-// Motor index by the name that the driver's motor_type node reports.
-inline const std::map<std::string, int32_t, std::less<>> MOTOR_TYPE_NAMES = {
-        {"NONE", 0},           {"COINDC", 1},       {"LINEAR", 2},           {"COINDC_PMIC", 3},
-        {"COINDC_INDEX", 4},   {"LINEAR_INDEX", 5}, {"LINEAR_0832RC", 6},    {"LINEAR_1040", 7},
-        {"LINEAR_RCVMOT", 8},  {"LINEAR_1030", 9},  {"LINEAR_INDEX_RC", 10}, {"LINEAR_WATCH", 11},
-        {"LINEAR_ACTIVE", 12},
+// Motor indices, which the driver's tables count by, and the names that its motor_type node reports.
+// MOTOR_NONE also stands for an unknown motor.
+// clang-format off
+enum MotorIndex : int32_t {
+    MOTOR_NONE = 0,          MOTOR_COINDC = 1,         MOTOR_LINEAR = 2,        MOTOR_COINDC_PMIC = 3,
+    MOTOR_COINDC_INDEX = 4,  MOTOR_LINEAR_INDEX = 5,   MOTOR_LINEAR_0832RC = 6, MOTOR_LINEAR_1040 = 7,
+    MOTOR_LINEAR_RCVMOT = 8, MOTOR_LINEAR_1030 = 9,    MOTOR_LINEAR_INDEX_RC = 10,
+    MOTOR_LINEAR_WATCH = 11, MOTOR_LINEAR_ACTIVE = 12,
 };
+inline const std::map<std::string, int32_t, std::less<>> MOTOR_TYPE_NAMES = {
+    {"NONE", MOTOR_NONE},                 {"COINDC", MOTOR_COINDC},
+    {"LINEAR", MOTOR_LINEAR},             {"COINDC_PMIC", MOTOR_COINDC_PMIC},
+    {"COINDC_INDEX", MOTOR_COINDC_INDEX}, {"LINEAR_INDEX", MOTOR_LINEAR_INDEX},
+    {"LINEAR_0832RC", MOTOR_LINEAR_0832RC}, {"LINEAR_1040", MOTOR_LINEAR_1040},
+    {"LINEAR_RCVMOT", MOTOR_LINEAR_RCVMOT}, {"LINEAR_1030", MOTOR_LINEAR_1030},
+    {"LINEAR_INDEX_RC", MOTOR_LINEAR_INDEX_RC}, {"LINEAR_WATCH", MOTOR_LINEAR_WATCH},
+    {"LINEAR_ACTIVE", MOTOR_LINEAR_ACTIVE},
+};
+// clang-format on
 
 // The motor index of exactly this name, upper case included; empty when there is no such motor.
 inline std::optional<int32_t> findMotorIndex(std::string_view name) {

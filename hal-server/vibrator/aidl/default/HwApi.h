@@ -4,9 +4,11 @@
 //
 // The one HwApi object of the process is built at start-up, decides which of three drivers this
 // phone has (the legacy timed_output class, the LED class or a force-feedback input device) and
-// then serves both binder services along that road. The operations are defined by subject:
+// then serves both binder services on that driver. What both of them do to it in their own words
+// (queued strings, packets, stored patterns) is written once, beside the operations in hwapi/:
 //
 //   NodeIo.cpp            writing, reading and testing nodes
+//   DriverWriter.h        what is done to the driver in more than one place
 //   NodeStreams.cpp       the streams of the audio and GPIO nodes
 //   Probing.cpp           choosing the device class and its node paths
 //   BasicControl.cpp      on, off, amplitude, caller check
@@ -16,16 +18,17 @@
 //   HapticEngine.cpp      packet sequences
 //   PrebakedPatterns.cpp  patterns that the driver or the motor's wavetable holds
 //   ForceFeedback.cpp     the force-feedback input device
-//   CompositeWaveform.h   the compiler of composite waveform texts
+//   Dump.cpp              what dumpsys shows
+//   CompositeWaveform.h   the compiler of composite waveforms
 //   WavetableUpload.cpp   composite waveforms for that device
 //
-// Failures are values: false, -1, 0 or an empty text, after one log line. Unless an operation says
+// Failures are values: false, -1, 0 or an empty string, after one log line. Unless an operation says
 // otherwise nothing throws, nothing is retried except an interrupted system call, and nothing
 // already written is undone.
 //
 // Threads: calls come from the binder thread and from short-lived worker threads. There are no
 // locks; every node access opens a descriptor of its own, and what is promised is the order of one
-// caller's writes. The process-wide values below are written by the constructor alone, except the
+// caller's writes. The process-wide values at the end are written by the constructor alone, except the
 // force-feedback descriptor.
 #pragma once
 
@@ -39,42 +42,11 @@
 #include <aidl/android/hardware/vibrator/Effect.h>
 #include <aidl/android/hardware/vibrator/EffectStrength.h>
 
-#include "CompositeWaveform.h"
+#include "hwapi/CompositeWaveform.h"
+
+struct ff_effect;  // <linux/input.h>
 
 namespace aidl::android::hardware::vibrator {
-
-// Node paths of the chosen device class. Empty: this device class has no such node, or no device
-// was found; every access to an empty path then fails as a missing node does.
-extern std::string THE_DEVICE_FF;                       // event device of the force-feedback motor
-extern std::string THE_DEVICE_INTENSITY;                // amplitude, 1 to 10000
-extern std::string THE_DEVICE_FORCE_TOUCH_INTENSITY;    // amplitude of force-touch feedback
-extern std::string THE_DEVICE_MULTI_FREQ;               // frequency type
-extern std::string THE_DEVICE_HAPTIC_ENGINE;            // packet text
-extern std::string THE_DEVICE_HAPTIC_ENGINE_INDEX;      // index of a prebaked pattern
-extern std::string THE_DEVICE_HAPTIC_PLAYBACK_QUEUE;    // queue text
-extern std::string THE_DEVICE_HAPTIC_ENGINE_NUM_WAVES;  // number of prebaked patterns
-extern std::string THE_DEVICE_MOTOR_TYPE;               // name of the motor's type
-extern std::string THE_DEVICE_EVENT_CMD;                // commands such as the folder's posture
-extern std::string THE_DEVICE_PATTERN_LENGTH;           // duration of a prebaked pattern
-extern std::string THE_DEVICE_EXT_CONTROL;              // external control; left to the driver
-extern std::string THE_DEVICE_CAL_INTENSITIES;          // intensity list
-extern std::string THE_DEVICE_CAL_HAPTIC_INTENSITIES;   // haptic intensity list
-extern std::string THE_DEVICE_FIFO_HAPTIC_ENGINE;       // number of a FIFO pattern
-extern std::string THE_DEVICE_HYBRID_HAPTIC_ENGINE;     // hybrid packet text
-extern std::string THE_DEVICE_ASP_ENABLE;               // audio stream switch
-extern std::string THE_DEVICE_GPIO1_FALL_INDEX;         // pattern and scale of the falling edge
-extern std::string THE_DEVICE_GPIO1_FALL_DIG_SCALE;
-extern std::string THE_DEVICE_GPIO1_RISE_INDEX;  // pattern and scale of the rising edge
-extern std::string THE_DEVICE_GPIO1_RISE_DIG_SCALE;
-extern std::string THE_DEVICE_VIB_STATE;  // what the driver is doing
-
-extern bool useLedsClass;           // the LED class was chosen
-extern bool useForceFeedback;       // the force-feedback input device was chosen
-extern bool useKypIndex;            // the driver was asked for the platform's pattern numbers
-extern int32_t motorPerformMethod;  // one of the PERFORM_ values
-
-// Descriptor of the force-feedback input device; -1 until an upload or event opens it.
-extern int inputFD;
 
 // How effects are played; getMotorPerformMethod() chooses.
 inline constexpr int32_t PERFORM_NONE = 0;            // not at all: requests fail
@@ -109,10 +81,10 @@ struct HapticEnginePacket {
 
 // Create it with std::make_shared: a double click keeps the object alive until its second pulse.
 //
-// The order of the virtual operations is fixed; so are the texts passed by value.
+// The order of the virtual operations is fixed; so are the strings passed by value.
 class HwApi : public std::enable_shared_from_this<HwApi> {
   public:
-    // Probes the driver, fills the process-wide values above and opens the six streams. Never
+    // Probes the driver, fills the process-wide values below and opens the six streams. Never
     // fails: what is missing is logged, and the operations that need it fail later.
     HwApi();
     HwApi(const HwApi&) = delete;
@@ -125,7 +97,7 @@ class HwApi : public std::enable_shared_from_this<HwApi> {
     virtual bool hasAspEnable();
     // Reads the switch from its start ("0" or "1") into `out`; false when that fails.
     virtual bool getAspEnable(bool* out);
-    // Each writes the value in decimal and a line feed; false when that fails.
+    // Each writes the value in decimal and a newline; false when that fails.
     virtual bool setAspEnable(bool value);
     virtual bool setGpioFallIndex(uint32_t value);
     virtual bool setGpioFallScale(uint32_t value);
@@ -135,11 +107,11 @@ class HwApi : public std::enable_shared_from_this<HwApi> {
     // Has nothing to say; `fd` is not written.
     virtual void debug(int fd);
 
-    // Writes the value in decimal and a line feed, opening the node read-write. False when the
-    // node cannot be opened or takes less than the whole text.
+    // Writes the value in decimal and a newline, opening the node read-write. False when the
+    // node cannot be opened or takes less than the whole string.
     virtual bool writeNode(std::string node, int value);
-    // The same with a text of at most 18 characters, opening the node write-only. A longer text is
-    // refused: false, with the node left alone.
+    // The same with a string of at most 18 characters, opening the node write-only. A longer one is
+    // refused: false, with the node left alone. The string ends at its first zero byte.
     virtual bool writeNodeByStringOnlyForWriting(std::string node, std::string value);
     // The number that the node's first seven characters begin with; 0 when they are no number, -1
     // when the node cannot be opened or read.
@@ -207,16 +179,16 @@ class HwApi : public std::enable_shared_from_this<HwApi> {
     // Sets the drive amplitude, 1 to 10000; false outside that range or when the write fails.
     virtual bool setAmplitude(int amplitude);
 
-    // Compiles a composite waveform text, uploads it and starts it. Force feedback only.
+    // Compiles a composite waveform string, uploads it and starts it. Force feedback only.
     virtual bool setAndTriggerOwt_primitve(std::string text);
 
     // Appends the driver's intensity list (true) or haptic intensity list (false) to `list`; false
     // when there is none or `list` stays empty. A piece that is no 32-bit number is left out.
     virtual bool getDynamicIntensityList(bool isDefaultType, std::vector<int>& list);
 
-    // The text after "Handlers=" (key 'H') or "Sysfs=" (key 'S') in a line of the input-device
+    // The string after "Handlers=" (key 'H') or "Sysfs=" (key 'S') in a line of the input-device
     // list, whose last character is cut off in place; null for another key or a line without it.
-    // The caller releases the text with free().
+    // The caller releases the string with free().
     virtual char* parse_field(char* line, char key);
 
     // 1 when the driver lists the feature's word, also as a part of a longer word; 0 when not; -1
@@ -224,10 +196,10 @@ class HwApi : public std::enable_shared_from_this<HwApi> {
     virtual int hasFeature(qvx_features feature);
 
     // The field (key as for parse_field) of the motor's block in the input-device list; null when
-    // there is none. The caller releases the text with free().
+    // there is none. The caller releases the string with free().
     virtual char* get_input_field_value(char key);
 
-    // The text without white space at its end.
+    // The string without white space at its end.
     virtual std::string rtrim(const std::string& text);
 
     // Puts the process's one effect record and event back to their first state.
@@ -250,6 +222,39 @@ class HwApi : public std::enable_shared_from_this<HwApi> {
     // argument is not used. Force feedback only.
     bool setAndTriggerOwt(int index, int unused);
 
+    // Which of the platform's predefined effects are played; the list is in the order of their
+    // numbers.
+    static bool isPlayed(Effect effect);
+    static std::vector<Effect> playedEffects();
+
+    // Sends the amplitude, 1 to 10000, to whatever takes it on this device class.
+    bool sendAmplitude(int amplitude);
+
+    // Closes the force-feedback device if it is open. inputFD keeps its value: this is for the end.
+    static void closeInputDevice();
+
+    // The composite waveform compiler: hwapi/CompositeWaveform.h has the grammar and the layout.
+    //
+    // Compiles `text`, cutting it up, into `out`, which holds WT_TYPE10_COMP_BUFFER_SIZE zero bytes.
+    // Returns the number of bytes written, a multiple of 4 from 4 on, or -EINVAL.
+    static int wt_type10_comp_str_to_bin(char* text, uint8_t* out);
+
+    // Applies one token, of the kind given, to the composite. Returns 0 or -EINVAL.
+    static int wt_type10_comp_decode(wt_type10_comp* comp, wt_type10_comp_specifier kind,
+                                     char* token);
+
+    // Parses a waveform token. Returns 0, or -EINVAL with `out` left alone.
+    static int wt_type10_comp_waveform_get(char* token, wt_type10_comp_wvfrm* out);
+
+    // Writes the binary layout of `nsections` sections into `size` bytes at `out`, as many whole words
+    // as fit. Returns the number of bytes written.
+    static int wt_type10_comp_to_buffer(wt_type10_comp* comp, int size, void* out);
+
+    // Writes to `fd` what was chosen at start-up and what the driver offers now, for people who bring
+    // up a phone. Only for root, system and shell; false for others and when `fd` takes no more. Logs
+    // nothing.
+    bool dump(int uid, int fd);
+
     // Opens the stream on mPath + `name` without creating or truncating anything: read-write (the
     // write streams too) or read-only. A stream that is open already, or cannot be opened, stays
     // failed and is logged.
@@ -258,6 +263,14 @@ class HwApi : public std::enable_shared_from_this<HwApi> {
     void HwApiopen(const std::string& name, std::ifstream* stream);
 
   private:
+    // Sends `record` to the driver, after removing the effect that it holds of this process, and
+    // keeps the new effect's id as the process's.
+    bool upload(ff_effect& record);
+    // Compiles `text`, cutting it up, and plays it. `operation` begins the log lines.
+    bool playComposite(const char* operation, char* text);
+
+    std::string describeChoice() const;
+
     void selectTimedOutput();
     void selectLeds();
     void selectForceFeedback();
@@ -278,8 +291,43 @@ class HwApi : public std::enable_shared_from_this<HwApi> {
     std::ofstream mGpioRiseIndex;
     std::ofstream mGpioRiseScale;
     std::ifstream mVibState;
+    int mTimedOutputError = 0;  // why each class was not chosen, as errno
+    int mLedsError = 0;
     std::string mPath;                              // before every stream's node name; empty here
     std::map<const std::ios*, std::string> mNames;  // stream to node name, for failure messages
 };
+
+// Node paths of the chosen device class. Empty: this device class has no such node, or no device
+// was found; every access to an empty path then fails as a missing node does.
+extern std::string THE_DEVICE_FF;                       // event device of the force-feedback motor
+extern std::string THE_DEVICE_INTENSITY;                // amplitude, 1 to 10000
+extern std::string THE_DEVICE_FORCE_TOUCH_INTENSITY;    // amplitude of force-touch feedback
+extern std::string THE_DEVICE_MULTI_FREQ;               // frequency type
+extern std::string THE_DEVICE_HAPTIC_ENGINE;            // packet string
+extern std::string THE_DEVICE_HAPTIC_ENGINE_INDEX;      // index of a prebaked pattern
+extern std::string THE_DEVICE_HAPTIC_PLAYBACK_QUEUE;    // queue string
+extern std::string THE_DEVICE_HAPTIC_ENGINE_NUM_WAVES;  // number of prebaked patterns
+extern std::string THE_DEVICE_MOTOR_TYPE;               // name of the motor's type
+extern std::string THE_DEVICE_EVENT_CMD;                // commands, such as postures
+extern std::string THE_DEVICE_PATTERN_LENGTH;           // duration of a prebaked pattern
+extern std::string THE_DEVICE_EXT_CONTROL;              // external control; left to the driver
+extern std::string THE_DEVICE_CAL_INTENSITIES;          // intensity list
+extern std::string THE_DEVICE_CAL_HAPTIC_INTENSITIES;   // haptic intensity list
+extern std::string THE_DEVICE_FIFO_HAPTIC_ENGINE;       // number of a FIFO pattern
+extern std::string THE_DEVICE_HYBRID_HAPTIC_ENGINE;     // hybrid packet string
+extern std::string THE_DEVICE_ASP_ENABLE;               // audio stream switch
+extern std::string THE_DEVICE_GPIO1_FALL_INDEX;         // pattern and scale of the falling edge
+extern std::string THE_DEVICE_GPIO1_FALL_DIG_SCALE;
+extern std::string THE_DEVICE_GPIO1_RISE_INDEX;  // pattern and scale of the rising edge
+extern std::string THE_DEVICE_GPIO1_RISE_DIG_SCALE;
+extern std::string THE_DEVICE_VIB_STATE;  // what the driver is doing
+
+inline bool useLedsClass = false;      // the LED class was chosen
+inline bool useForceFeedback = false;  // the force-feedback input device was chosen
+inline bool useKypIndex = false;       // the driver was asked for the platform's pattern numbers
+inline int32_t motorPerformMethod = PERFORM_NONE;  // one of the PERFORM_ values
+
+// Descriptor of the force-feedback input device; -1 until an upload or event opens it.
+inline int inputFD = -1;
 
 }  // namespace aidl::android::hardware::vibrator

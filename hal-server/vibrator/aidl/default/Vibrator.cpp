@@ -7,26 +7,17 @@
 
 #include "Vibrator.h"
 
-#include <algorithm>
-#include <iterator>
 #include <utility>
+#include <vector>
 
 #include <android-base/logging.h>
+#include <android/binder_ibinder.h>
 
-#include "Amplitude.h"
 #include "ServiceStatus.h"
-#include "SystemCalls.h"
+#include "hwapi/DriverWriter.h"
 
 namespace aidl::android::hardware::vibrator {
 namespace {
-
-// The effects that perform() plays.
-constexpr Effect kSupportedEffects[] = {
-        Effect::CLICK,
-        Effect::DOUBLE_CLICK,
-        Effect::TICK,
-        Effect::HEAVY_CLICK,
-};
 
 // The driver's amplitude for 1.0.
 constexpr float kFullAmplitude = 10000.0F;
@@ -34,11 +25,6 @@ constexpr float kFullAmplitude = 10000.0F;
 ndk::ScopedAStatus declined(const char* operation) {
     LOG(ERROR) << "V_2_0: " << operation << "unsupported";
     return exception(EX_UNSUPPORTED_OPERATION);
-}
-
-bool isSupported(Effect effect) {
-    return std::find(std::begin(kSupportedEffects), std::end(kSupportedEffects), effect) !=
-           std::end(kSupportedEffects);
 }
 
 }  // namespace
@@ -50,7 +36,7 @@ Vibrator::Vibrator(std::shared_ptr<HwApi> hwApi) : mHwApi(std::move(hwApi)) {
 Vibrator::~Vibrator() {
     LOG(ERROR) << "V_2_0: Vibrator::~Vibrator()";
     if (inputFD >= 0) {
-        kernel::close(inputFD);
+        HwApi::closeInputDevice();
         LOG(ERROR) << "V_2_0: inputFD close";
     }
 }
@@ -79,10 +65,7 @@ ndk::ScopedAStatus Vibrator::off() {
 ndk::ScopedAStatus Vibrator::on(int32_t timeoutMs,
                                 const std::shared_ptr<IVibratorCallback>& callback) {
     LOG(ERROR) << "V_2_0: Vibrator on for timeoutMs: " << timeoutMs;
-    if (callback != nullptr) {
-        LOG(ERROR) << "Not support on() callback";
-        return exception(EX_UNSUPPORTED_OPERATION);
-    }
+    if (callback != nullptr) return refuse(EX_UNSUPPORTED_OPERATION, "Not support on() callback");
     return okOrIllegalState(mHwApi->do_on(timeoutMs));
 }
 
@@ -92,25 +75,20 @@ ndk::ScopedAStatus Vibrator::perform(Effect effect, EffectStrength strength,
     LOG(ERROR) << "V_2_0: Vibrator perform Effect : " << static_cast<int>(effect)
                << " EffectStrength : " << static_cast<int>(strength);
     if (motorPerformMethod == PERFORM_NONE) {
-        LOG(ERROR) << "V_2_0: performEffect PERFORM_NONE";
-        return exception(EX_UNSUPPORTED_OPERATION);
+        return refuse(EX_UNSUPPORTED_OPERATION, "V_2_0: performEffect PERFORM_NONE");
     }
     if (callback != nullptr) {
-        LOG(ERROR) << "Not support perform() callback";
-        return exception(EX_UNSUPPORTED_OPERATION);
+        return refuse(EX_UNSUPPORTED_OPERATION, "Not support perform() callback");
     }
-    if (!isSupported(effect)) {
-        LOG(ERROR) << "V_2_0: Unsupport vibrator perform effect";
-        return exception(EX_UNSUPPORTED_OPERATION);
+    if (!HwApi::isPlayed(effect)) {
+        return refuse(EX_UNSUPPORTED_OPERATION, "V_2_0: Unsupport vibrator perform effect");
     }
     if (static_cast<uint8_t>(strength) > static_cast<uint8_t>(EffectStrength::STRONG)) {
-        LOG(ERROR) << "V_2_0: Unsupport vibrator perform strength";
-        return exception(EX_UNSUPPORTED_OPERATION);
+        return refuse(EX_UNSUPPORTED_OPERATION, "V_2_0: Unsupport vibrator perform strength");
     }
     const int amplitude = mHwApi->setPerformAmplitude(strength);
     if (amplitude < 1) {
-        LOG(ERROR) << "V_2_0: performEffect not support real amplitude";
-        return exception(EX_UNSUPPORTED_OPERATION);
+        return refuse(EX_UNSUPPORTED_OPERATION, "V_2_0: performEffect not support real amplitude");
     }
     int durationMs = 0;
     if (!mHwApi->preparePerform(effect, amplitude, durationMs)) return exception(EX_ILLEGAL_STATE);
@@ -121,24 +99,18 @@ ndk::ScopedAStatus Vibrator::perform(Effect effect, EffectStrength strength,
 
 ndk::ScopedAStatus Vibrator::getSupportedEffects(std::vector<Effect>* _aidl_return) {
     LOG(ERROR) << "V_2_0: getSupportedEffects";
-    if (mHwApi->isAmplitudeControlExist()) {
-        _aidl_return->assign(std::begin(kSupportedEffects), std::end(kSupportedEffects));
-    } else {
-        _aidl_return->clear();
-    }
+    const bool offered = mHwApi->isAmplitudeControlExist();
+    *_aidl_return = offered ? HwApi::playedEffects() : std::vector<Effect>();
     return ok();
 }
 
 ndk::ScopedAStatus Vibrator::setAmplitude(float amplitude) {
     LOG(ERROR) << "V_2_0: Vibrator set amplitude: " << amplitude;
     if (!mHwApi->isAmplitudeControlExist()) {
-        LOG(ERROR) << "V_2_0: Vibrator setAmplitude not supprot";
-        return exception(EX_UNSUPPORTED_OPERATION);
+        return refuse(EX_UNSUPPORTED_OPERATION, "V_2_0: Vibrator setAmplitude not supprot");
     }
     if (amplitude <= 0.0F || amplitude > 1.0F) return exception(EX_ILLEGAL_ARGUMENT);
-    const int intensity = toDriverAmplitude(amplitude, kFullAmplitude);
-    return okOrIllegalState(useForceFeedback ? mHwApi->setForceFeedbackAmplitude(intensity)
-                                             : mHwApi->writeNode(THE_DEVICE_INTENSITY, intensity));
+    return okOrIllegalState(mHwApi->sendAmplitude(toDriverAmplitude(amplitude, kFullAmplitude)));
 }
 
 ndk::ScopedAStatus Vibrator::setExternalControl(bool enabled) {
@@ -194,6 +166,16 @@ ndk::ScopedAStatus Vibrator::getPwleCompositionSizeMax(int32_t* /*_aidl_return*/
 
 ndk::ScopedAStatus Vibrator::getSupportedBraking(std::vector<Braking>* /*_aidl_return*/) {
     return declined("[getSupportedBraking]");
+}
+
+ndk::ScopedAStatus Vibrator::refuse(binder_exception_t code, const char* line) {
+    LOG(ERROR) << line;
+    return exception(code);
+}
+
+binder_status_t Vibrator::dump(int fd, const char** /*args*/, uint32_t /*numArgs*/) {
+    const auto uid = static_cast<int>(AIBinder_getCallingUid());
+    return mHwApi->dump(uid, fd) ? STATUS_OK : STATUS_PERMISSION_DENIED;
 }
 
 }  // namespace aidl::android::hardware::vibrator

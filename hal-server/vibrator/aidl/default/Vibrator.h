@@ -5,7 +5,6 @@
 
 #include <cstdint>
 #include <memory>
-#include <string>
 #include <vector>
 
 #include <aidl/android/hardware/vibrator/BnVibrator.h>
@@ -78,9 +77,12 @@ class Vibrator : public BnVibrator {
     // NOOP has none: EX_ILLEGAL_ARGUMENT; another number is EX_UNSUPPORTED_OPERATION.
     ndk::ScopedAStatus getPrimitiveDetails(CompositePrimitive primitive, uint32_t* index);
 
+    // What dumpsys shows, for root, system and shell; HwApi::dump() says it all.
+    binder_status_t dump(int fd, const char** args, uint32_t numArgs) override;
+
   private:
-    // Plays a composition's text through the driver's pattern queue; false when the driver fails.
-    bool queueComposition(const std::string& composition);
+    // Logs the line and answers with the exception.
+    static ndk::ScopedAStatus refuse(binder_exception_t code, const char* line);
 
     const std::shared_ptr<HwApi> mHwApi;
 };

@@ -1,9 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 //
-// The maker's vibrator interface, served on the hardware layer and reached as the binder extension
+// The vendor's vibrator interface, served on the hardware layer and reached as the binder extension
 // of the standard service.
 #pragma once
 
+#include <array>
 #include <cstdint>
 #include <memory>
 #include <string>
@@ -22,7 +23,7 @@ namespace core = ::aidl::android::hardware::vibrator;
 // A query that the driver's feature list answers, and what answers it for drivers without a list.
 struct FeatureQuery;
 
-// A query that the text of the event_cmd node answers: yes when it holds any of the letters.
+// A query that the string of the event_cmd node answers: yes when it holds any of the letters.
 struct LetterQuery;
 
 // A translator without state, like the standard service; every answer comes from the driver as it
@@ -52,7 +53,7 @@ class Vibrator : public BnZelVibrator {
     ndk::ScopedAStatus supportsFrequencyControl(bool* _aidl_return) override;
     ndk::ScopedAStatus supportsHapticEngine(bool* _aidl_return) override;
     ndk::ScopedAStatus supportsPrebakedHapticPattern(bool* _aidl_return) override;
-    // True when the text of the event_cmd node has any of the letters D, F, L, O.
+    // True when the string of the event_cmd node has any of the letters D, F, L, O.
     ndk::ScopedAStatus supportsFolderStatusSetting(bool* _aidl_return) override;
     ndk::ScopedAStatus supportsEnhancedQuorvanHapticPattern(bool* _aidl_return) override;
 
@@ -90,11 +91,11 @@ class Vibrator : public BnZelVibrator {
     ndk::ScopedAStatus supportsEnhancedHybridHapticPattern(bool* _aidl_return) override;
 
     ndk::ScopedAStatus performFifoHapticEngine(ZelFifoType type) override;
-    // A text that the driver does not take whole is ok too, but starts no vibration.
+    // A string that the driver does not take whole is ok too, but starts no vibration.
     ndk::ScopedAStatus performHybridHapticEngine(
             const std::vector<ZelHybridHapticEnginePacket>& packets, int32_t amplitude) override;
 
-    // True when the text of the event_cmd node has any of the letters E, N, T.
+    // True when the string of the event_cmd node has any of the letters E, N, T.
     ndk::ScopedAStatus supportsFolderTentModeStatusSetting(bool* _aidl_return) override;
     ndk::ScopedAStatus setFolderTentModeStatus(ZelFolderTentModeStatus status) override;
 
@@ -103,17 +104,25 @@ class Vibrator : public BnZelVibrator {
     // Whether the driver lists exactly this word. A refused caller is EX_SECURITY, with false.
     ndk::ScopedAStatus hasFeature(const std::string& featureName, bool* _aidl_return) override;
 
+    // What dumpsys shows, for root, system and shell; HwApi::dump() says it all.
+    binder_status_t dump(int fd, const char** args, uint32_t numArgs) override;
+
   private:
     // Whether the caller of the transaction being served may use the service. A refused one is
     // logged, behind `prefix`.
     bool isCallerAllowed(const char* prefix = "") const;
 
+    // Logs the line and answers with the exception.
+    static ndk::ScopedAStatus refuse(binder_exception_t code, const char* line);
+
     // A query from its entry line to its status, which is always ok.
     ndk::ScopedAStatus answer(const FeatureQuery& query, bool* result) const;
     ndk::ScopedAStatus answer(const LetterQuery& query, bool* result) const;
 
-    // Sends the event_cmd node one of the posture commands.
-    ndk::ScopedAStatus sendPosture(const char* operation, std::string_view command) const;
+    // A posture request from its entry line to its status. The event_cmd node gets the command that
+    // stands at `status`.
+    ndk::ScopedAStatus setPosture(const char* operation, int32_t status,
+                                  const std::array<std::string_view, 2>& commands) const;
 
     const std::shared_ptr<core::HwApi> mHwApi;
 };

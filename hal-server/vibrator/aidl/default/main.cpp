@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 //
 // The vibrator service's process: one hardware layer, the standard service registered by name, and
-// the maker's extension attached to it.
+// the vendor's extension attached to it.
 //
 // The two checks below stand at lines 42 and 45, each on one line: a failing check names its line
 // and expression in the crash report, and reports are grouped by that text across releases. Keep

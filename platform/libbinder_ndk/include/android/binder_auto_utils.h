@@ -1,36 +1,37 @@
 // SPDX-License-Identifier: Apache-2.0
-/*
- * Owners for what the C functions hand out: each releases its resource when it goes out of scope.
- * Values are taken over on construction and `set`; `get` only looks; `getR` is for out parameters
- * and expects the owner to be empty.
- */
+//
+// Owners for what the C functions hand out: each releases its resource when it goes out of scope.
+// Values are taken over on construction and `set`; `get` only looks; `getR` is for out parameters
+// and expects the owner to be empty.
 #pragma once
 
-#include <android/binder_bionic_compat.h>
-#include <android/binder_ibinder.h>
-#include <android/binder_internal_logging.h>
-#include <android/binder_parcel.h>
-#include <android/binder_status.h>
+#include <assert.h>
 #include <unistd.h>
 
 #include <cstddef>
 #include <string>
 #include <utility>
 
+#include <android/binder_bionic_compat.h>
+#include <android/binder_ibinder.h>
+#include <android/binder_internal_logging.h>
+#include <android/binder_parcel.h>
+#include <android/binder_status.h>
+
 namespace ndk {
 
-/** A strong reference to a binder, or none. */
+// A strong reference to a binder, or none.
 class SpAIBinder {
   public:
     SpAIBinder() : mBinder(nullptr) {}
 
-    /** Takes over a reference the caller holds. */
+    // Takes over a reference the caller holds.
     explicit SpAIBinder(AIBinder* binder) : mBinder(binder) {}
 
-    /** No binder; lets functions take and return nullptr. */
+    // No binder; lets functions take and return nullptr.
     SpAIBinder(std::nullptr_t) : SpAIBinder() {}  // NOLINT(google-explicit-constructor)
 
-    /** Takes a reference of its own. */
+    // Takes a reference of its own.
     SpAIBinder(const SpAIBinder& other) : mBinder(other.mBinder) { AIBinder_incStrong(mBinder); }
 
     ~SpAIBinder() { set(nullptr); }
@@ -42,7 +43,7 @@ class SpAIBinder {
         return *this;
     }
 
-    /** Releases the reference held and takes over the caller's. */
+    // Releases the reference held and takes over the caller's.
     void set(AIBinder* binder) {
         AIBinder* const old = mBinder;
         mBinder = binder;
@@ -77,7 +78,7 @@ inline bool operator>=(const SpAIBinder& a, const SpAIBinder& b) {
 
 namespace impl {
 
-/** A move-only owner of a T that `Destroy` releases; `DEFAULT` stands for none. */
+// A move-only owner of a T that `Destroy` releases; `DEFAULT` stands for none.
 template <typename T, void (*Destroy)(T), T DEFAULT>
 class ScopedAResource {
   public:
@@ -93,7 +94,7 @@ class ScopedAResource {
         return *this;
     }
 
-    /** Releases what is held and takes over `t`. */
+    // Releases what is held and takes over `t`.
     void set(const T& t) {
         const T old = std::exchange(mT, t);
         if (old != DEFAULT) Destroy(old);
@@ -103,7 +104,7 @@ class ScopedAResource {
     const T get() const { return mT; }  // NOLINT(readability-const-return-type)
     T* getR() { return &mT; }
 
-    /** Gives up ownership without releasing. */
+    // Gives up ownership without releasing.
     [[nodiscard]] T release() { return std::exchange(mT, DEFAULT); }
 
   private:
@@ -112,7 +113,7 @@ class ScopedAResource {
 
 }  // namespace impl
 
-/** Owns a parcel. */
+// Owns a parcel.
 class ScopedAParcel : public impl::ScopedAResource<AParcel*, AParcel_delete, nullptr> {
   public:
     ScopedAParcel() = default;
@@ -129,7 +130,7 @@ class ScopedAParcel : public impl::ScopedAResource<AParcel*, AParcel_delete, nul
     bool operator>=(const ScopedAParcel& rhs) const { return get() >= rhs.get(); }
 };
 
-/** Owns a status. A default-constructed one holds none; nothing but isOk may be asked of it. */
+// Owns a status. A default-constructed one holds none; nothing but isOk may be asked of it.
 class ScopedAStatus : public impl::ScopedAResource<AStatus*, AStatus_delete, nullptr> {
   public:
     ScopedAStatus() = default;
@@ -138,17 +139,17 @@ class ScopedAStatus : public impl::ScopedAResource<AStatus*, AStatus_delete, nul
     ~ScopedAStatus() = default;
     ScopedAStatus& operator=(ScopedAStatus&&) = default;
 
-    /** As AStatus_isOk; false when empty. */
+    // As AStatus_isOk; false when empty.
     bool isOk() const { return get() != nullptr && AStatus_isOk(get()); }
-    /** As AStatus_getExceptionCode. */
+    // As AStatus_getExceptionCode.
     binder_exception_t getExceptionCode() const { return AStatus_getExceptionCode(get()); }
-    /** As AStatus_getServiceSpecificError. */
+    // As AStatus_getServiceSpecificError.
     int32_t getServiceSpecificError() const { return AStatus_getServiceSpecificError(get()); }
-    /** As AStatus_getStatus. */
+    // As AStatus_getStatus.
     binder_status_t getStatus() const { return AStatus_getStatus(get()); }
-    /** As AStatus_getMessage. */
+    // As AStatus_getMessage.
     const char* getMessage() const { return AStatus_getMessage(get()); }
-    /** As AStatus_getDescription. */
+    // As AStatus_getDescription.
     std::string getDescription() const {
         const char* const text = AStatus_getDescription(get());
         std::string description(text);
@@ -156,7 +157,7 @@ class ScopedAStatus : public impl::ScopedAResource<AStatus*, AStatus_delete, nul
         return description;
     }
 
-    /** As the AStatus function of the same name. */
+    // As the AStatus function of the same name.
     static ScopedAStatus ok() { return ScopedAStatus(AStatus_newOk()); }
     static ScopedAStatus fromExceptionCode(binder_exception_t exception) {
         return ScopedAStatus(AStatus_fromExceptionCode(exception));
@@ -177,7 +178,7 @@ class ScopedAStatus : public impl::ScopedAResource<AStatus*, AStatus_delete, nul
     }
 };
 
-/** Owns a death recipient. */
+// Owns a death recipient.
 class ScopedAIBinder_DeathRecipient
     : public impl::ScopedAResource<AIBinder_DeathRecipient*, AIBinder_DeathRecipient_delete,
                                    nullptr> {
@@ -190,7 +191,7 @@ class ScopedAIBinder_DeathRecipient
     ScopedAIBinder_DeathRecipient& operator=(ScopedAIBinder_DeathRecipient&&) = default;
 };
 
-/** Owns a weak reference. */
+// Owns a weak reference.
 class ScopedAIBinder_Weak
     : public impl::ScopedAResource<AIBinder_Weak*, AIBinder_Weak_delete, nullptr> {
   public:
@@ -200,13 +201,13 @@ class ScopedAIBinder_Weak
     ~ScopedAIBinder_Weak() = default;
     ScopedAIBinder_Weak& operator=(ScopedAIBinder_Weak&&) = default;
 
-    /** A strong reference, empty when the object is gone. */
+    // A strong reference, empty when the object is gone.
     SpAIBinder promote() { return SpAIBinder(AIBinder_Weak_promote(get())); }
 };
 
 namespace internal {
 
-/** Closes a descriptor; -1 is none. A failure is worth a line: the number was not ours to close. */
+// Closes a descriptor; -1 is none. A failure is worth a line: the number was not ours to close.
 inline void closeWithError(int fd) {
     if (fd == -1) return;
     if (close(fd) != 0) syslog(LOG_ERR, "could not close descriptor %d: %m", fd);
@@ -214,7 +215,7 @@ inline void closeWithError(int fd) {
 
 }  // namespace internal
 
-/** Owns a file descriptor. */
+// Owns a file descriptor.
 class ScopedFileDescriptor : public impl::ScopedAResource<int, internal::closeWithError, -1> {
   public:
     ScopedFileDescriptor() = default;

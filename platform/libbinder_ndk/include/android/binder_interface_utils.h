@@ -1,12 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
-/*
- * What generated C++ interfaces are built on. ICInterface is any interface, BnCInterface a local
- * implementation, BpCInterface a proxy:
- *
- *     service object <-- shared_ptr -- AIBinder (local)      the binder keeps the object alive,
- *            '- - - - - - weak - - - - - - ^                 the object does not keep its binder
- */
+//
+// What generated C++ interfaces are built on. ICInterface is any interface, BnCInterface a local
+// implementation, BpCInterface a proxy:
+//
+//     service object <-- shared_ptr -- AIBinder (local)      the binder keeps the object alive,
+//            '- - - - - - weak - - - - - - ^                 the object does not keep its binder
 #pragma once
+
+#include <assert.h>
 
 #include <android/binder_auto_utils.h>
 #include <android/binder_bionic_compat.h>
@@ -24,7 +25,7 @@
 
 namespace ndk {
 
-/** An object owned by a shared_ptr that it can hand out itself. Made with make() only. */
+// An object owned by a shared_ptr that it can hand out itself. Made with make() only.
 class SharedRefBase {
   public:
     SharedRefBase() = default;
@@ -36,7 +37,7 @@ class SharedRefBase {
         std::call_once(mOwned, [] { __assert(__FILE__, __LINE__, "SharedRefBase: never owned"); });
     }
 
-    /** The owner. The first call makes it from `this`. */
+    // The owner. The first call makes it from `this`.
     std::shared_ptr<SharedRefBase> ref() {
         std::shared_ptr<SharedRefBase> first;
         std::call_once(mOwned, [&] {
@@ -46,13 +47,13 @@ class SharedRefBase {
         return first != nullptr ? first : mThis.lock();
     }
 
-    /** The owner as one of CHILD, which the object must be. */
+    // The owner as one of CHILD, which the object must be.
     template <typename CHILD>
     std::shared_ptr<CHILD> ref() {
         return std::static_pointer_cast<CHILD>(ref());
     }
 
-    /** A new T and its owner. */
+    // A new T and its owner.
     template <class T, class... Args>
     static std::shared_ptr<T> make(Args&&... args) {
         T* const object = new T(std::forward<Args>(args)...);
@@ -76,38 +77,38 @@ class SharedRefBase {
     std::weak_ptr<SharedRefBase> mThis;
 };
 
-/** An interface: the functions every local implementation and every proxy has. */
+// An interface: the functions every local implementation and every proxy has.
 class ICInterface : public SharedRefBase {
   public:
     ICInterface() = default;
     ~ICInterface() override = default;
 
-    /** The implementation behind a local binder whose class came from defineClass; null for null
-     * and for a proxy. The class is not checked. */
+    // The implementation behind a local binder whose class came from defineClass; null for null
+    // and for a proxy. The class is not checked.
     static inline std::shared_ptr<ICInterface> asInterface(AIBinder* binder);
 
-    /** The binder of this object; never empty. */
+    // The binder of this object; never empty.
     virtual SpAIBinder asBinder() = 0;
 
-    /** True when this is a proxy. */
+    // True when this is a proxy.
     virtual bool isRemote() = 0;
 
-    /** Reports to `fd`, which stays the caller's; `args` holds `numArgs` texts. */
+    // Reports to `fd`, which stays the caller's; `args` holds `numArgs` strings.
     virtual inline binder_status_t dump(int fd, const char** args, uint32_t numArgs);
 
 #ifdef HAS_BINDER_SHELL_COMMAND
-    /** Carries out a shell command; the descriptors stay the caller's. */
+    // Carries out a shell command; the descriptors stay the caller's.
     virtual inline binder_status_t handleShellCommand(int in, int out, int err, const char** argv,
                                                       uint32_t argc);
 #endif
 
-    /** A class whose objects are made with an ICInterface* as argument and forward dump and shell
-     * commands to it. */
+    // A class whose objects are made with an ICInterface* as argument and forward dump and shell
+    // commands to it.
     static inline AIBinder_Class* defineClass(const char* interfaceDescriptor,
                                               AIBinder_Class_onTransact onTransact);
 
   private:
-    /** The user data of such a binder: it keeps the implementation alive. */
+    // The user data of such a binder: it keeps the implementation alive.
     struct UserData {
         std::shared_ptr<ICInterface> interface;
 
@@ -131,21 +132,21 @@ class ICInterface : public SharedRefBase {
     };
 };
 
-/** A local implementation of INTERFACE. */
+// A local implementation of INTERFACE.
 template <typename INTERFACE>
 class BnCInterface : public INTERFACE {
   public:
     BnCInterface() = default;
     ~BnCInterface() override = default;
 
-    /** The binder of this object. When all references to it went away meanwhile, it is a new one.
-     */
+    // The binder of this object. When all references to it went away meanwhile, it is a new one.
+
     SpAIBinder asBinder() override;
 
     bool isRemote() override { return false; }
 
   protected:
-    /** A new binder for this object. */
+    // A new binder for this object.
     virtual SpAIBinder createBinder() = 0;
 
   private:
@@ -153,7 +154,7 @@ class BnCInterface : public INTERFACE {
     ScopedAIBinder_Weak mWeakBinder;
 };
 
-/** A proxy of INTERFACE. */
+// A proxy of INTERFACE.
 template <typename INTERFACE>
 class BpCInterface : public INTERFACE {
   public:

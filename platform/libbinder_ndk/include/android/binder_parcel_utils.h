@@ -1,17 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
-/*
- * Parcel functions for C++ types. Three layers, lowest first: allocators and accessors that let the
- * C functions fill standard containers; texts, binders, descriptors and parcelables; lists.
- *
- * A reader that fails leaves its target valid but unspecified. "Nullable" forms take std::optional,
- * an empty binder or a descriptor of -1; the others answer STATUS_UNEXPECTED_NULL to a null, lists
- * STATUS_NO_MEMORY.
- */
+//
+// Parcel functions for C++ types. Three layers, lowest first: allocators and accessors that let the
+// C functions fill standard containers; strings, binders, descriptors and parcelables; lists.
+//
+// A reader that fails leaves its target valid but unspecified. "Nullable" forms take std::optional,
+// an empty binder or a descriptor of -1; the others answer STATUS_UNEXPECTED_NULL to a null, lists
+// STATUS_NO_MEMORY.
 #pragma once
-
-#include <android/binder_auto_utils.h>
-#include <android/binder_bionic_compat.h>
-#include <android/binder_parcel.h>
 
 #include <cstdint>
 #include <limits>
@@ -21,13 +16,17 @@
 #include <utility>
 #include <vector>
 
+#include <android/binder_auto_utils.h>
+#include <android/binder_bionic_compat.h>
+#include <android/binder_parcel.h>
+
 namespace ndk {
 
 // ---- Allocators and accessors for the C functions ----
 
 namespace internal {
 
-/** Makes `container` hold `length` elements; false when that is negative. */
+// Makes `container` hold `length` elements; false when that is negative.
 template <typename C>
 bool resize(C* container, int32_t length) {
     if (length < 0) return false;
@@ -35,7 +34,7 @@ bool resize(C* container, int32_t length) {
     return true;
 }
 
-/** As above for a container that may be null, which -1 makes it. */
+// As above for a container that may be null, which -1 makes it.
 template <typename C>
 bool resizeNullable(std::optional<C>* container, int32_t length) {
     if (length < -1) return false;
@@ -45,7 +44,7 @@ bool resizeNullable(std::optional<C>* container, int32_t length) {
     return true;
 }
 
-/** The length a C function takes for a container. */
+// The length a C function takes for a container.
 template <typename C>
 int32_t lengthOf(const C& container) {
     return container.size() > static_cast<size_t>(std::numeric_limits<int32_t>::max())
@@ -55,7 +54,7 @@ int32_t lengthOf(const C& container) {
 
 }  // namespace internal
 
-/** Fills a std::vector<T>; null is refused. */
+// Fills a std::vector<T>; null is refused.
 template <typename T>
 bool AParcel_stdVectorAllocator(void* vectorData, int32_t length, T** outBuffer) {
     auto* const vec = static_cast<std::vector<T>*>(vectorData);
@@ -64,7 +63,7 @@ bool AParcel_stdVectorAllocator(void* vectorData, int32_t length, T** outBuffer)
     return true;
 }
 
-/** Fills a std::optional<std::vector<T>>. */
+// Fills a std::optional<std::vector<T>>.
 template <typename T>
 bool AParcel_nullableStdVectorAllocator(void* vectorData, int32_t length, T** outBuffer) {
     auto* const vec = static_cast<std::optional<std::vector<T>>*>(vectorData);
@@ -73,44 +72,44 @@ bool AParcel_nullableStdVectorAllocator(void* vectorData, int32_t length, T** ou
     return true;
 }
 
-/** Sizes a std::vector<T> whose elements are read one by one; null is refused. */
+// Sizes a std::vector<T> whose elements are read one by one; null is refused.
 template <typename T>
 bool AParcel_stdVectorExternalAllocator(void* vectorData, int32_t length) {
     return internal::resize(static_cast<std::vector<T>*>(vectorData), length);
 }
 
-/** As above for a std::optional<std::vector<T>>. */
+// As above for a std::optional<std::vector<T>>.
 template <typename T>
 bool AParcel_nullableStdVectorExternalAllocator(void* vectorData, int32_t length) {
     return internal::resizeNullable(static_cast<std::optional<std::vector<T>>*>(vectorData),
                                     length);
 }
 
-/** The element at `index` of a std::vector<T>. */
+// The element at `index` of a std::vector<T>.
 template <typename T>
 T AParcel_stdVectorGetter(const void* vectorData, size_t index) {
     return (*static_cast<const std::vector<T>*>(vectorData))[index];
 }
 
-/** As above for a std::optional<std::vector<T>> that is not null. */
+// As above for a std::optional<std::vector<T>> that is not null.
 template <typename T>
 T AParcel_nullableStdVectorGetter(const void* vectorData, size_t index) {
     return (**static_cast<const std::optional<std::vector<T>>*>(vectorData))[index];
 }
 
-/** Sets the element at `index` of a std::vector<T>. */
+// Sets the element at `index` of a std::vector<T>.
 template <typename T>
 void AParcel_stdVectorSetter(void* vectorData, size_t index, T value) {
     (*static_cast<std::vector<T>*>(vectorData))[index] = value;
 }
 
-/** As above for a std::optional<std::vector<T>> that is not null. */
+// As above for a std::optional<std::vector<T>> that is not null.
 template <typename T>
 void AParcel_nullableStdVectorSetter(void* vectorData, size_t index, T value) {
     (**static_cast<std::optional<std::vector<T>>*>(vectorData))[index] = value;
 }
 
-/** Fills a std::string; null is refused. `length` counts the terminating zero. */
+// Fills a std::string; null is refused. `length` counts the terminating zero.
 inline bool AParcel_stdStringAllocator(void* stringData, int32_t length, char** buffer) {
     if (length <= 0) return false;
     auto* const text = static_cast<std::string*>(stringData);
@@ -119,7 +118,7 @@ inline bool AParcel_stdStringAllocator(void* stringData, int32_t length, char** 
     return true;
 }
 
-/** Fills a std::optional<std::string>. */
+// Fills a std::optional<std::string>.
 inline bool AParcel_nullableStdStringAllocator(void* stringData, int32_t length, char** buffer) {
     auto* const text = static_cast<std::optional<std::string>*>(stringData);
     if (length <= 0) {
@@ -130,25 +129,25 @@ inline bool AParcel_nullableStdStringAllocator(void* stringData, int32_t length,
     return AParcel_stdStringAllocator(&**text, length, buffer);
 }
 
-/** Sizes a std::vector<std::string>; null is refused. */
+// Sizes a std::vector<std::string>; null is refused.
 inline bool AParcel_stdVectorStringAllocator(void* vectorData, int32_t length) {
     return AParcel_stdVectorExternalAllocator<std::string>(vectorData, length);
 }
 
-/** Sizes a std::optional<std::vector<std::optional<std::string>>>. */
+// Sizes a std::optional<std::vector<std::optional<std::string>>>.
 inline bool AParcel_nullableStdVectorStringAllocator(void* vectorData, int32_t length) {
     return AParcel_nullableStdVectorExternalAllocator<std::optional<std::string>>(vectorData,
                                                                                   length);
 }
 
-/** Fills the text at `index` of a std::vector<std::string>. */
+// Fills the string at `index` of a std::vector<std::string>.
 inline bool AParcel_stdVectorStringElementAllocator(void* vectorData, size_t index, int32_t length,
                                                     char** buffer) {
     auto* const vec = static_cast<std::vector<std::string>*>(vectorData);
     return AParcel_stdStringAllocator(&(*vec)[index], length, buffer);
 }
 
-/** Fills the text at `index` of a std::optional<std::vector<std::optional<std::string>>>. */
+// Fills the string at `index` of a std::optional<std::vector<std::optional<std::string>>>.
 inline bool AParcel_nullableStdVectorStringElementAllocator(void* vectorData, size_t index,
                                                             int32_t length, char** buffer) {
     auto* const vec =
@@ -156,7 +155,7 @@ inline bool AParcel_nullableStdVectorStringElementAllocator(void* vectorData, si
     return AParcel_nullableStdStringAllocator(&(**vec)[index], length, buffer);
 }
 
-/** The text at `index` of a std::vector<std::string>. */
+// The string at `index` of a std::vector<std::string>.
 inline const char* AParcel_stdVectorStringElementGetter(const void* vectorData, size_t index,
                                                         int32_t* outLength) {
     const auto& element = (*static_cast<const std::vector<std::string>*>(vectorData))[index];
@@ -164,7 +163,7 @@ inline const char* AParcel_stdVectorStringElementGetter(const void* vectorData, 
     return element.c_str();
 }
 
-/** The text at `index` of a std::optional<std::vector<std::optional<std::string>>>. */
+// The string at `index` of a std::optional<std::vector<std::optional<std::string>>>.
 inline const char* AParcel_nullableStdVectorStringElementGetter(const void* vectorData,
                                                                 size_t index, int32_t* outLength) {
     const auto& element =
@@ -178,7 +177,7 @@ inline const char* AParcel_nullableStdVectorStringElementGetter(const void* vect
     return element->c_str();
 }
 
-// ---- Texts ----
+// ---- Strings ----
 
 inline binder_status_t AParcel_writeString(AParcel* parcel, const std::string& str) {
     return ::AParcel_writeString(parcel, str.c_str(), internal::lengthOf(str));
@@ -283,7 +282,7 @@ binder_status_t AParcel_readNullableParcelable(const AParcel* parcel, std::optio
 
 // ---- Lists ----
 
-/** Writes the size of a list that the callee fills. */
+// Writes the size of a list that the callee fills.
 template <typename T>
 binder_status_t AParcel_writeVectorSize(AParcel* parcel, const std::vector<T>& vec) {
     const int32_t length = internal::lengthOf(vec);
@@ -298,13 +297,13 @@ binder_status_t AParcel_writeVectorSize(AParcel* parcel, const std::optional<std
 
 namespace internal {
 
-/** A list of this many elements the caller wants filled: its reply could hold no more. */
+// A list of this many elements the caller wants filled: its reply could hold no more.
 inline constexpr int32_t kMaxOutListLength = 1 << 20;
 
 }  // namespace internal
 
-/** Makes `vec` as large as the caller wants it. A negative size: STATUS_UNEXPECTED_NULL; one no
- * reply has room for: STATUS_NO_MEMORY. */
+// Makes `vec` as large as the caller wants it. A negative size: STATUS_UNEXPECTED_NULL; one no
+// reply has room for: STATUS_NO_MEMORY.
 template <typename T>
 binder_status_t AParcel_resizeVector(const AParcel* parcel, std::vector<T>* vec) {
     int32_t length = 0;
@@ -316,7 +315,7 @@ binder_status_t AParcel_resizeVector(const AParcel* parcel, std::vector<T>* vec)
     return STATUS_OK;
 }
 
-/** As above; -1 gives null. */
+// As above; -1 gives null.
 template <typename T>
 binder_status_t AParcel_resizeVector(const AParcel* parcel, std::optional<std::vector<T>>* vec) {
     int32_t length = 0;
@@ -328,24 +327,24 @@ binder_status_t AParcel_resizeVector(const AParcel* parcel, std::optional<std::v
     return STATUS_OK;
 }
 
-// Numbers, bytes, characters and enumerations: lists the parcel takes in one piece.
+// Numbers, bytes and characters: lists the parcel takes in one piece. There is nothing for lists of
+// enumerations: generated code hands them over as lists of their backing type.
 
 namespace internal {
 
-/** A list whose elements are a Wire each in the parcel, and its C functions. */
+// A list whose elements are a Wire each in the parcel, and its C functions.
 template <typename Wire, auto Write, auto Read>
 struct PackedAs : std::true_type {
     using WireType = Wire;
-    static constexpr auto write = Write;
-    static constexpr auto read = Read;
+    static constexpr auto kWrite = Write;
+    static constexpr auto kRead = Read;
 };
 
-/** How a list of T is packed; false where its elements are written one by one. */
-template <typename T, typename = void>
+// How a list of T is packed; false where its elements are written one by one.
+template <typename T>
 struct Packed : std::false_type {};
 
 // clang-format off
-template <> struct Packed<int8_t>   : PackedAs<int8_t,   AParcel_writeByteArray,   AParcel_readByteArray> {};
 template <> struct Packed<uint8_t>  : PackedAs<int8_t,   AParcel_writeByteArray,   AParcel_readByteArray> {};
 template <> struct Packed<char16_t> : PackedAs<char16_t, AParcel_writeCharArray,   AParcel_readCharArray> {};
 template <> struct Packed<int32_t>  : PackedAs<int32_t,  AParcel_writeInt32Array,  AParcel_readInt32Array> {};
@@ -355,10 +354,6 @@ template <> struct Packed<uint64_t> : PackedAs<uint64_t, AParcel_writeUint64Arra
 template <> struct Packed<float>    : PackedAs<float,    AParcel_writeFloatArray,  AParcel_readFloatArray> {};
 template <> struct Packed<double>   : PackedAs<double,   AParcel_writeDoubleArray, AParcel_readDoubleArray> {};
 // clang-format on
-
-/** Enumerations travel as lists of their backing type. */
-template <typename E>
-struct Packed<E, std::enable_if_t<std::is_enum_v<E>>> : Packed<std::underlying_type_t<E>> {};
 
 template <typename T, bool IsPacked = true>
 using IfPacked = std::enable_if_t<Packed<T>::value == IsPacked, bool>;
@@ -387,23 +382,23 @@ bool nullablePackedAllocator(void* vectorData, int32_t length, WireType<T>** out
 template <typename T, internal::IfPacked<T> = true>
 binder_status_t AParcel_writeVector(AParcel* parcel, const std::vector<T>& vec) {
     const auto* values = reinterpret_cast<const internal::WireType<T>*>(vec.data());
-    return internal::Packed<T>::write(parcel, values, internal::lengthOf(vec));
+    return internal::Packed<T>::kWrite(parcel, values, internal::lengthOf(vec));
 }
 template <typename T, internal::IfPacked<T> = true>
 binder_status_t AParcel_writeVector(AParcel* parcel, const std::optional<std::vector<T>>& vec) {
     return vec.has_value() ? AParcel_writeVector(parcel, *vec)
-                           : internal::Packed<T>::write(parcel, nullptr, -1);
+                           : internal::Packed<T>::kWrite(parcel, nullptr, -1);
 }
 template <typename T, internal::IfPacked<T> = true>
 binder_status_t AParcel_readVector(const AParcel* parcel, std::vector<T>* vec) {
-    return internal::Packed<T>::read(parcel, vec, internal::packedAllocator<T>);
+    return internal::Packed<T>::kRead(parcel, vec, internal::packedAllocator<T>);
 }
 template <typename T, internal::IfPacked<T> = true>
 binder_status_t AParcel_readVector(const AParcel* parcel, std::optional<std::vector<T>>* vec) {
-    return internal::Packed<T>::read(parcel, vec, internal::nullablePackedAllocator<T>);
+    return internal::Packed<T>::kRead(parcel, vec, internal::nullablePackedAllocator<T>);
 }
 
-// Truths and texts.
+// Booleans and strings.
 
 inline binder_status_t AParcel_writeVector(AParcel* parcel, const std::vector<bool>& vec) {
     return ::AParcel_writeBoolArray(parcel, &vec, internal::lengthOf(vec),

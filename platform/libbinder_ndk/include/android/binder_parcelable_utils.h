@@ -1,10 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-/* How stable a parcelable is, and a field that holds a parcelable of any type. */
+//
+// How stable a parcelable is, and a field that holds a parcelable of any type.
 #pragma once
-
-#include <android/binder_auto_utils.h>
-#include <android/binder_parcel.h>
-#include <android/binder_parcel_utils.h>
 
 #include <memory>
 #include <mutex>
@@ -12,28 +9,29 @@
 #include <string>
 #include <type_traits>
 
+#include <android/binder_auto_utils.h>
+#include <android/binder_parcel.h>
+#include <android/binder_parcel_utils.h>
+
 namespace ndk {
 
-/** Who may rely on the layout of a parcelable. */
+// Who may rely on the layout of a parcelable.
 typedef int32_t parcelable_stability_t;
 enum {
     STABILITY_LOCAL,
     STABILITY_VINTF,
 };
 
-/** Base of parcelables with virtual functions; generated ones have none. */
+// Base of parcelables with virtual functions; generated ones have none.
 class AParcelable {
   public:
     virtual ~AParcelable() = default;
     virtual binder_status_t writeToParcel(AParcel* parcel) const = 0;
     virtual binder_status_t readFromParcel(const AParcel* parcel) = 0;
 };
-
-/**
- * Holds a parcelable of a type the interface does not name. One that came over the wire stays in
- * its parcel until it is asked for. In the parcel: stability, then the size of what follows (0:
- * nothing), the type's name, the parcelable.
- */
+// Holds a parcelable of a type the interface does not name. One that came over the wire stays in
+// its parcel until it is asked for. In the parcel: stability, then the size of what follows (0:
+// nothing), the type's name, the parcelable.
 class AParcelableHolder {
   public:
     AParcelableHolder() = delete;
@@ -86,7 +84,7 @@ class AParcelableHolder {
         return ::AParcel_setDataPosition(parcel, start + size);
     }
 
-    /** Stores a copy. STATUS_BAD_VALUE when T is less stable than the holder. */
+    // Stores a copy. STATUS_BAD_VALUE when T is less stable than the holder.
     template <typename T>
     binder_status_t setParcelable(const T& parcelable) {
         if (mStability > T::_aidl_stability) return STATUS_BAD_VALUE;
@@ -99,7 +97,7 @@ class AParcelableHolder {
         return parcelable.writeToParcel(mParcel.get());
     }
 
-    /** What is stored, or none when it is of another type. */
+    // What is stored, or none when it is of another type.
     template <typename T>
     binder_status_t getParcelable(std::optional<T>* parcelable) const {
         parcelable->reset();
@@ -115,7 +113,7 @@ class AParcelableHolder {
         return status;
     }
 
-    /** Forgets what is stored. */
+    // Forgets what is stored.
     void reset() { ::AParcel_reset(mParcel.get()); }
 
     bool operator!=(const AParcelableHolder& rhs) const { return this != &rhs; }

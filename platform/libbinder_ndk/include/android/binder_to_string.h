@@ -1,16 +1,18 @@
 // SPDX-License-Identifier: Apache-2.0
-/* android::internal::ToString: how generated toString() functions print a field. */
+//
+// android::internal::ToString: how generated toString() functions print a field.
 #pragma once
+
+#include <memory>
+#include <optional>
+#include <sstream>
+#include <string>
+#include <type_traits>
+#include <utility>
 
 #include <android/binder_auto_utils.h>
 #include <android/binder_interface_utils.h>
 #include <android/binder_parcelable_utils.h>
-
-#include <memory>
-#include <optional>
-#include <string>
-#include <type_traits>
-#include <utility>
 
 namespace android {
 namespace internal {
@@ -53,7 +55,7 @@ inline constexpr bool kIsPointerLike =
         std::is_pointer_v<T> || IsInstanceOf<T, std::optional>::value ||
         IsInstanceOf<T, std::shared_ptr>::value;
 
-/** One UTF-16 unit as UTF-8; a lone surrogate has none. */
+// One UTF-16 unit as UTF-8; a lone surrogate has none.
 inline std::string Utf8(char16_t unit) {
     const auto byte = [](unsigned value) { return static_cast<char>(value); };
     const unsigned code = unit;
@@ -78,7 +80,7 @@ std::string List(const T& values) {
 
 }  // namespace to_string
 
-/** `value` as a text; the first rule that fits counts. */
+// `value` as a string; the first rule that fits counts.
 template <typename T>
 std::string ToString(const T& value) {
     using namespace to_string;  // NOLINT(google-build-using-namespace)

@@ -206,14 +206,14 @@ interface IZelVibrator {
      * Plays a sequence of patterns that the driver holds, each at its own level.
      *
      * @param packets the patterns in the order of playing: 1 to 200.
-     * @param repeat whether repeatCount counts; false plays the sequence once.
-     * @param repeatCount with repeat, the number of repetitions given to the driver: 0 or more, 0
+     * @param repeat whether repeatCnt counts; false plays the sequence once.
+     * @param repeatCnt with repeat, the number of repetitions given to the driver: 0 or more, 0
      *     meaning without end. Not looked at without repeat.
      * @throws EX_ILLEGAL_ARGUMENT when there are no packets or more than 200, or repeat is given
      *     with a negative count.
      * @throws EX_ILLEGAL_STATE when the driver did not take the whole sequence.
      */
-    void performPlaybackEngine(in ZelPlaybackPacket[] packets, boolean repeat, int repeatCount);
+    void performPlaybackEngine(in ZelPlaybackPacket[] packets, boolean repeat, int repeatCnt);
 
     /**
      * Tells whether performFifoHapticEngine works. Feature word FIFO_HAPTIC_ENGINE, else the node

@@ -22,7 +22,7 @@ interface IZelVibrator {
   void performPrebakedHapticPattern(int patternIndex, int amplitude, boolean repeat);
   int[] getAmplitudeList(vendor.quorvan.hardware.vibrator.ZelAmplitudeType type);
   int perform(android.hardware.vibrator.Effect effect, int amplitude, android.hardware.vibrator.IVibratorCallback callback);
-  void performPlaybackEngine(in vendor.quorvan.hardware.vibrator.ZelPlaybackPacket[] packets, boolean repeat, int repeatCount);
+  void performPlaybackEngine(in vendor.quorvan.hardware.vibrator.ZelPlaybackPacket[] packets, boolean repeat, int repeatCnt);
   boolean supportsFifoHapticEngine();
   boolean supportsHybridHapticEngine();
   boolean supportsEnhancedHybridHapticPattern();

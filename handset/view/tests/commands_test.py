@@ -1,0 +1,103 @@
+# SPDX-License-Identifier: Apache-2.0
+"""handset/picture and handset/trace as commands."""
+
+import json
+import struct
+import subprocess
+import unittest
+
+from run_files import Directory
+from view_path import HANDSET
+
+
+def command(*words):
+    return subprocess.run([HANDSET / words[0], *words[1:]], capture_output=True, text=True,
+                          check=False)
+
+
+def small_run(test):
+    directory = Directory(test)
+    directory.call(1000, 20, "std on 500", uid=1000)
+    directory.write(1005, "state", "1\n")
+    directory.write(1009, "duration", "500\n")
+    directory.write(1012, "activate", "1\n")
+    directory.call(1190, 700, "std off", exception=-5)
+    directory.write(1800, "activate", "0\n", result="EIO", fault={"errno": "EIO"}, took=600_000)
+    return directory
+
+
+class Picture(unittest.TestCase):
+    def test_has_a_lane_for_each_client_node_and_fault(self):
+        directory = small_run(self)
+        done = command("picture", directory.path)
+        self.assertEqual((done.returncode, done.stderr), (0, ""))
+        self.assertEqual(done.stdout.split(), [str(directory.path / name)
+                                               for name in ("run.svg", "run.png")])
+        drawn = (directory.path / "run.svg").read_text("utf-8")
+        for text in ("uid 1000", "std on 500: ok", "uid 0", "std off: EX_ILLEGAL_STATE", "state",
+                     "duration", "activate: write EIO, held 600 ms", "500 ms", "drive"):
+            self.assertIn(f">{text}<", drawn)
+
+    def test_is_1200_pixels_wide(self):
+        directory = small_run(self)
+        file = directory.path / "a.png"
+        self.assertEqual(command("picture", directory.path, "--out", file).returncode, 0)
+        self.assertEqual(struct.unpack_from(">I", file.read_bytes(), 16)[0], 1200)
+
+    def test_of_the_same_run_is_the_same(self):
+        directory = small_run(self)
+        drawn = []
+        for name in ("a.svg", "b.svg"):
+            command("picture", directory.path, "--out", directory.path / name)
+            drawn.append((directory.path / name).read_bytes())
+        self.assertEqual(*drawn)
+
+    def test_of_an_empty_run_is_drawn(self):
+        self.assertEqual(command("picture", Directory(self).path).returncode, 0)
+
+    def test_is_refused_in_one_line(self):
+        directory = Directory(self)
+        for words, said in (((directory.path / "missing",), "no journal.jsonl there"),
+                            ((directory.path, "--out", "a.gif"), "ends in .svg or .png"),
+                            ((directory.path, "--out", "/missing/a.svg"), "does not exist"),
+                            ((), "required: DIR")):
+            done = command("picture", *words)
+            self.assertEqual((done.returncode, done.stdout, done.stderr.count("\n")), (2, "", 1))
+            self.assertIn(said, done.stderr)
+
+
+class Trace(unittest.TestCase):
+    def setUp(self):
+        directory = small_run(self)
+        directory.upload(2000, 0, "00000200" "00640100" "00000032" "00327c00" "00000000")
+        directory.event(2010, 0, 1)
+        directory.call(1990, 40, "std compose 0,CLICK,1 --callback", callback=400)
+        done = command("trace", directory.path)
+        self.assertEqual((done.returncode, done.stderr), (0, ""))
+        file = directory.path / "trace.json"
+        self.assertEqual(done.stdout, f"{file}\n")
+        self.events = json.loads(file.read_text("utf-8"))["traceEvents"]
+
+    def test_has_clients_driver_and_motor_as_tracks(self):
+        names = [event["args"]["name"] for event in self.events if event["ph"] == "M" and
+                 event["name"].endswith("_name")]
+        self.assertEqual(names, ["clients", "service", "driver", "motor", "uid 1000", "uid 0",
+                                 "state", "duration", "activate", "motor"])
+        slices = [(event["name"], event["ts"], event["dur"]) for event in self.events
+                  if event["ph"] == "X" and event["pid"] == 4]
+        self.assertEqual(slices, [("500 ms", 1012000, 500000), ("pattern 1", 2010000, 20000),
+                                  ("pattern 124", 2080000, 300000)])
+
+    def test_leads_from_a_call_to_its_writes_and_its_callback(self):
+        flows = {}
+        for event in self.events:
+            if event["ph"] in "stf":
+                flows.setdefault(event["id"], []).append((event["ph"], event["ts"]))
+        self.assertEqual(flows, {
+            1: [("s", 1000000), ("t", 1005000), ("t", 1009000), ("t", 1012000)],
+            2: [("s", 1190000), ("t", 1200000)],
+            3: [("s", 1990000), ("t", 2000000), ("t", 2010000), ("f", 2390000)]})
+
+
+if __name__ == "__main__":
+    unittest.main()

@@ -1,0 +1,6 @@
+package p;
+union Foo {
+    int a = 7;
+    String b;
+    @nullable float[] c;
+}

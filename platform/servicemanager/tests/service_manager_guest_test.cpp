@@ -1,0 +1,483 @@
+// SPDX-License-Identifier: Apache-2.0
+//
+// The service manager over the kernel's binder: every method with every rule, asked by clients of
+// several users through the library.
+#include <signal.h>
+#include <unistd.h>
+
+#include <string>
+#include <vector>
+
+#include <android/binder_manager.h>
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include "platform/servicemanager/tests/manager_client.h"
+#include "platform/servicemanager/tests/processes.h"
+#include "tests/support/kernel_log.h"
+
+namespace {
+
+using namespace client;  // NOLINT(google-build-using-namespace)
+using processes::as;
+using processes::eventually;
+using processes::Server;
+using ::testing::ElementsAre;
+using ::testing::HasSubstr;
+using ::testing::IsEmpty;
+using ::testing::Not;
+
+constexpr uid_t kRoot = 0;
+constexpr uid_t kSystem = 1000;
+constexpr uid_t kApp = 10123;
+constexpr uid_t kIsolated = 90001;
+
+constexpr const char* kVibrator = "android.hardware.vibrator.IVibrator/default";
+
+// Who may register what in these tests, beside root.
+constexpr const char* kRules =
+        "android.hardware.vibrator.IVibrator/default 1000\n"
+        "android.hardware.vibrator.IVibrator/default 1002\n"
+        "test.service 1000\n"
+        "test.service 2000\n"
+        "test.service 9999\n"
+        "test.service 101000\n"
+        "test.own 1000\n"
+        "test.other 1000\n"
+        "test.lazy 1000\n"
+        "test.pack.IFoo/default 1000\n"
+        "test.pack.IFoo/other 1000\n";
+
+class ServiceManagerTest : public ::testing::Test {
+  protected:
+    processes::TemporaryFolder mFolder;
+    processes::Manager mManager{mFolder.path(), kRules};
+};
+
+// The service of an ended process has left its name free.
+void awaitFree(const char* name) {
+    EXPECT_TRUE(eventually([name] { return AServiceManager_checkService(name) == nullptr; }));
+}
+
+using ContextManager = ServiceManagerTest;
+
+TEST_F(ContextManager, RegistersItself) {
+    as(kSystem, [] {
+        const ndk::SpAIBinder found(AServiceManager_checkService("manager"));
+        EXPECT_NE(found.get(), nullptr);
+        EXPECT_TRUE(AIBinder_isRemote(found.get()));
+    });
+}
+
+TEST_F(ContextManager, ASecondOneSaysWhyAndEndsWithStatus1) {
+    const qvx::test::ExpectBinderComplaints expected;
+    std::string output;
+    EXPECT_EQ(processes::runManager(kRoot, output), 1);
+    EXPECT_THAT(output, HasSubstr("servicemanager: cannot become the context manager: "
+                                  "another service manager is running\n"));
+    EXPECT_TRUE(mManager.answers());
+}
+
+TEST(AnotherUsersContextManager, SaysWhyAndEndsWithStatus1) {
+    {
+        const processes::TemporaryFolder folder;
+        const processes::Manager first(folder.path());
+    }
+    const qvx::test::ExpectBinderComplaints expected;
+    std::string output;
+    EXPECT_EQ(processes::runManager(kSystem, output), 1);
+    EXPECT_THAT(output, HasSubstr("servicemanager: cannot become the context manager: "
+                                  "only the user who ran the first one may\n"));
+}
+
+using AddService = ServiceManagerTest;
+
+TEST_F(AddService, IsOpenToRootAndToTheUsersOfARule) {
+    for (const uid_t uid : {kRoot, kSystem, uid_t{2000}, uid_t{9999}, uid_t{101000}}) {
+        as(uid, [] {
+            awaitFree("test.service");
+            const ndk::SpAIBinder object = makeObject();
+            EXPECT_EQ(AServiceManager_addService(object.get(), "test.service"), EX_NONE);
+            const ndk::SpAIBinder found(AServiceManager_checkService("test.service"));
+            EXPECT_EQ(found.get(), object.get());
+        });
+    }
+}
+
+TEST_F(AddService, IsClosedToUsersWithoutARule) {
+    as(kSystem, [] { EXPECT_EQ(add("test.unruly", makeObject()), EX_SECURITY); });
+    as(1001, [] { EXPECT_EQ(add("test.service", makeObject()), EX_SECURITY); });
+    EXPECT_THAT(mManager.log(),
+                HasSubstr(", uid 1001: no rule lets this user register the name\n"));
+}
+
+// With a rule, without one and as root: whoever asks for the name gets the first service's process.
+TEST_F(AddService, OfAnotherUserNeverReplacesALivingVibrator) {
+    const Server vibrator(kSystem, [] { EXPECT_EQ(add(kVibrator, makeObject()), EX_NONE); });
+    for (const uid_t uid : {uid_t{1001}, uid_t{1002}, kRoot}) {
+        as(uid, [] { EXPECT_EQ(add(kVibrator, makeObject()), EX_SECURITY); });
+    }
+    as(kApp, [&vibrator] {
+        const ndk::SpAIBinder found(AServiceManager_checkService(kVibrator));
+        EXPECT_EQ(AIBinder_ping(found.get()), STATUS_OK);
+        std::vector<DebugInfo> infos;
+        EXPECT_EQ(debugInfo(infos), EX_NONE);
+        ASSERT_EQ(infos.size(), 2u);
+        EXPECT_EQ(infos[0].name, kVibrator);
+        EXPECT_EQ(infos[0].pid, vibrator.pid());
+    });
+}
+
+TEST_F(AddService, IsClosedToApps) {
+    for (const uid_t uid : {uid_t{10000}, kApp, uid_t{65534}, kIsolated, uid_t{110000}}) {
+        as(uid, [] {
+            EXPECT_EQ(AServiceManager_addService(makeObject().get(), "test.service"), EX_SECURITY);
+        });
+    }
+    EXPECT_THAT(mManager.log(), HasSubstr("servicemanager: addService \"test.service\" refused to "
+                                          "pid "));
+    EXPECT_THAT(mManager.log(), HasSubstr(", uid 10123: apps may not register services\n"));
+}
+
+TEST_F(AddService, RefusesBadNames) {
+    as(kRoot, [] {
+        const ndk::SpAIBinder object = makeObject();
+        EXPECT_EQ(add("", object), EX_ILLEGAL_ARGUMENT);
+        EXPECT_EQ(add("a b", object), EX_ILLEGAL_ARGUMENT);
+        EXPECT_EQ(add("caf\xc3\xa9", object), EX_ILLEGAL_ARGUMENT);
+        EXPECT_EQ(add(std::string("a\0b", 3), object), EX_ILLEGAL_ARGUMENT);
+        EXPECT_EQ(add(std::string(128, 'a'), object), EX_ILLEGAL_ARGUMENT);
+        EXPECT_EQ(add(std::string(127, 'a'), object), EX_NONE);
+        EXPECT_EQ(add("a-Z_0.9/x", object), EX_NONE);
+    });
+}
+
+TEST_F(AddService, ShowsAHostileNameOnOneLineOfTheLog) {
+    as(kRoot, [] { EXPECT_EQ(add("a\nb", makeObject()), EX_ILLEGAL_ARGUMENT); });
+    EXPECT_THAT(mManager.log(), HasSubstr("addService \"a\\nb\" refused to pid "));
+}
+
+TEST_F(AddService, AnswersANullBinderWithNullPointer) {
+    as(kSystem, [] { EXPECT_EQ(add("test.service", nullptr), EX_NULL_POINTER); });
+    as(kApp, [] { EXPECT_EQ(add("", nullptr), EX_NULL_POINTER); });
+}
+
+constexpr const char* kManifest =
+        "<manifest version=\"1.0\" type=\"device\"><hal format=\"aidl\"><name>test.pack</name>"
+        "<fqname>IFoo/default</fqname><fqname>IFoo/another</fqname></hal>"
+        "<hal format=\"aidl\" updatable-via-apex=\"com.test\"><name>test.pack</name>"
+        "<fqname>IBar/default</fqname></hal></manifest>";
+
+TEST_F(AddService, WantsAVintfObjectDeclared) {
+    as(kSystem, [] {
+        EXPECT_EQ(add("test.pack.IFoo/default", makeVintfObject()), EX_ILLEGAL_ARGUMENT);
+        EXPECT_EQ(add("test.pack.IFoo/default", makeObject()), EX_NONE);
+    });
+    EXPECT_THAT(mManager.log(), HasSubstr("a VINTF-stable service must be declared in a manifest"));
+    mFolder.put("vendor/etc/vintf/manifest/test.xml", kManifest);
+    as(kSystem, [] {
+        EXPECT_EQ(add("test.pack.IFoo/default", makeVintfObject()), EX_NONE);
+        EXPECT_EQ(add("test.pack.IFoo/other", makeVintfObject()), EX_ILLEGAL_ARGUMENT);
+    });
+}
+
+TEST_F(AddService, NamesAFaultyManifestInTheLog) {
+    mFolder.put("vendor/etc/vintf/manifest/test.xml", "<manifest");
+    as(kSystem,
+       [] { EXPECT_EQ(add("test.pack.IFoo/default", makeVintfObject()), EX_ILLEGAL_ARGUMENT); });
+    EXPECT_THAT(mManager.log(),
+                HasSubstr("servicemanager: manifest " +
+                          (mFolder.path() / "vendor/etc/vintf/manifest/test.xml").string() +
+                          " is passed over: line 1: "));
+}
+
+TEST_F(AddService, ReplacesAnOlderOneOfTheName) {
+    as(kSystem, [] {
+        const ndk::SpAIBinder first = makeObject();
+        const ndk::SpAIBinder second = makeObject();
+        EXPECT_EQ(add("test.service", first), EX_NONE);
+        EXPECT_EQ(add("test.service", second), EX_NONE);
+        const ndk::SpAIBinder found(AServiceManager_checkService("test.service"));
+        EXPECT_EQ(found.get(), second.get());
+    });
+}
+
+using FindService = ServiceManagerTest;
+
+TEST_F(FindService, AnUnknownNameIsNullInAnOkReplyAtOnce) {
+    as(kApp, [] {
+        for (const Code code : {kGetService, kCheckService}) {
+            ndk::SpAIBinder found;
+            EXPECT_EQ(find(code, "test.unknown", found), EX_NONE);
+            EXPECT_EQ(found.get(), nullptr);
+            EXPECT_EQ(find(code, "", found), EX_NONE);
+            EXPECT_EQ(found.get(), nullptr);
+        }
+    });
+}
+
+TEST_F(FindService, IsOpenToAppsAndLimitedForIsolatedOnes) {
+    const Server server(kRoot, [] {
+        EXPECT_EQ(add("test.closed", makeObject(), false), EX_NONE);
+        EXPECT_EQ(add("test.open", makeObject(), true), EX_NONE);
+    });
+    for (const Code code : {kGetService, kCheckService}) {
+        as(kApp, [code] {
+            ndk::SpAIBinder found;
+            EXPECT_EQ(find(code, "test.closed", found), EX_NONE);
+            EXPECT_NE(found.get(), nullptr);
+        });
+    }
+    as(kIsolated, [] {
+        EXPECT_EQ(AServiceManager_checkService("test.closed"), nullptr);
+        EXPECT_EQ(AServiceManager_checkService("manager"), nullptr);
+        const ndk::SpAIBinder found(AServiceManager_checkService("test.open"));
+        EXPECT_NE(found.get(), nullptr);
+    });
+}
+
+using ListServices = ServiceManagerTest;
+
+TEST_F(ListServices, GivesNamesInByteOrderWhosePriorityMatches) {
+    as(kRoot, [] {
+        const ndk::SpAIBinder object = makeObject();
+        EXPECT_EQ(add("b", object, false, 1), EX_NONE);
+        EXPECT_EQ(add("a", object, false, 2), EX_NONE);
+        EXPECT_EQ(add("B", object, false, 8), EX_NONE);
+        std::vector<std::string> names;
+        EXPECT_EQ(list(15, names), EX_NONE);
+        EXPECT_THAT(names, ElementsAre("B", "a", "b", "manager"));
+        EXPECT_EQ(list(3, names), EX_NONE);
+        EXPECT_THAT(names, ElementsAre("a", "b"));
+        EXPECT_EQ(list(16, names), EX_NONE);
+        EXPECT_THAT(names, IsEmpty());
+    });
+}
+
+using Notifications = ServiceManagerTest;
+
+TEST_F(Notifications, TellAtOnceAndAtEveryLaterRegistration) {
+    as(kSystem, [] {
+        RegistrationCallback callback;
+        const ndk::SpAIBinder first = makeObject();
+        const ndk::SpAIBinder second = makeObject();
+        EXPECT_EQ(add("test.service", first), EX_NONE);
+        EXPECT_EQ(notify(kRegisterForNotifications, "test.service", callback.binder), EX_NONE);
+        EXPECT_TRUE(eventually([&] { return callback.calls == 1; }));
+        EXPECT_EQ(callback.name, "test.service");
+        EXPECT_EQ(callback.service.get(), first.get());
+        EXPECT_EQ(add("test.service", second), EX_NONE);
+        EXPECT_TRUE(eventually([&] { return callback.calls == 2; }));
+        EXPECT_EQ(callback.service.get(), second.get());
+    });
+}
+
+TEST_F(Notifications, StopWhenUnregistered) {
+    as(kSystem, [] {
+        RegistrationCallback stopped;
+        RegistrationCallback witness;
+        EXPECT_EQ(notify(kRegisterForNotifications, "test.service", stopped.binder), EX_NONE);
+        EXPECT_EQ(notify(kRegisterForNotifications, "test.service", witness.binder), EX_NONE);
+        EXPECT_EQ(notify(kUnregisterForNotifications, "test.service", stopped.binder), EX_NONE);
+        EXPECT_EQ(notify(kUnregisterForNotifications, "test.service", stopped.binder),
+                  EX_ILLEGAL_STATE);
+        EXPECT_EQ(add("test.service", makeObject()), EX_NONE);
+        EXPECT_TRUE(eventually([&] { return witness.calls == 1; }));
+        EXPECT_EQ(stopped.calls, 0);
+    });
+}
+
+TEST_F(Notifications, RefuseBadNamesNullsAndTheManagerItself) {
+    as(kSystem, [] {
+        RegistrationCallback callback;
+        EXPECT_EQ(notify(kRegisterForNotifications, "a b", callback.binder), EX_ILLEGAL_ARGUMENT);
+        EXPECT_EQ(notify(kRegisterForNotifications, "test.service", nullptr), EX_NULL_POINTER);
+        EXPECT_EQ(notify(kUnregisterForNotifications, "test.service", nullptr), EX_NULL_POINTER);
+        EXPECT_EQ(notify(kUnregisterForNotifications, "test.service", callback.binder),
+                  EX_ILLEGAL_STATE);
+        EXPECT_EQ(notify(kRegisterForNotifications, "test.service", manager()), EX_ILLEGAL_STATE);
+    });
+}
+
+TEST_F(Notifications, AnObjectOfAnotherInterfaceIsAcceptedAndHarmless) {
+    as(kSystem, [] {
+        const ndk::SpAIBinder object = makeObject();
+        EXPECT_EQ(notify(kRegisterForNotifications, "test.service", object), EX_NONE);
+        // Told after the other, so that nothing is left unread when it has been told.
+        RegistrationCallback witness;
+        EXPECT_EQ(notify(kRegisterForNotifications, "test.service", witness.binder), EX_NONE);
+        EXPECT_EQ(add("test.service", object), EX_NONE);
+        EXPECT_TRUE(eventually([&] { return witness.calls == 1; }));
+        EXPECT_EQ(notify(kUnregisterForNotifications, "test.service", object), EX_NONE);
+    });
+    EXPECT_TRUE(mManager.answers());
+}
+
+TEST_F(Notifications, OfADeadClientAreForgotten) {
+    {
+        const Server client(kSystem, [] {
+            static RegistrationCallback callback;
+            EXPECT_EQ(notify(kRegisterForNotifications, "test.service", callback.binder), EX_NONE);
+        });
+    }
+    as(kSystem, [] { EXPECT_EQ(add("test.service", makeObject()), EX_NONE); });
+    EXPECT_TRUE(mManager.answers());
+}
+
+using Declarations = ServiceManagerTest;
+
+TEST_F(Declarations, ComeFromTheManifests) {
+    mFolder.put("odm/etc/vintf/manifest.xml", kManifest);
+    as(kApp, [] {
+        bool declared = false;
+        EXPECT_EQ(isDeclared("test.pack.IFoo/default", declared), EX_NONE);
+        EXPECT_TRUE(declared);
+        EXPECT_EQ(isDeclared("test.pack.IFoo/other", declared), EX_NONE);
+        EXPECT_FALSE(declared);
+        EXPECT_EQ(isDeclared("manager", declared), EX_NONE);
+        EXPECT_FALSE(declared);
+        EXPECT_TRUE(AServiceManager_isDeclared("test.pack.IBar/default"));
+
+        std::vector<std::string> instances;
+        EXPECT_EQ(getDeclaredInstances("test.pack.IFoo", instances), EX_NONE);
+        EXPECT_THAT(instances, ElementsAre("another", "default"));
+        EXPECT_EQ(getDeclaredInstances("test.pack.INone", instances), EX_NONE);
+        EXPECT_THAT(instances, IsEmpty());
+
+        std::optional<std::string> apex;
+        EXPECT_EQ(updatableViaApex("test.pack.IBar/default", apex), EX_NONE);
+        EXPECT_EQ(apex, "com.test");
+        EXPECT_EQ(updatableViaApex("test.pack.IFoo/default", apex), EX_NONE);
+        EXPECT_EQ(apex, std::nullopt);
+    });
+}
+
+using LazyServices = ServiceManagerTest;
+
+TEST_F(LazyServices, MayAskAboutTheirOwnClientsOnly) {
+    const Server server(kSystem, [] { EXPECT_EQ(add("test.other", makeObject()), EX_NONE); });
+    as(kSystem, [] {
+        const ndk::SpAIBinder object = makeObject();
+        const ndk::SpAIBinder callback = makeObject();
+        EXPECT_EQ(add("test.own", object), EX_NONE);
+        EXPECT_EQ(registerClientCallback("test.own", object, callback), EX_NONE);
+        EXPECT_EQ(registerClientCallback("test.own", callback, callback), EX_ILLEGAL_ARGUMENT);
+        EXPECT_EQ(registerClientCallback("test.none", object, callback), EX_ILLEGAL_ARGUMENT);
+        EXPECT_EQ(registerClientCallback("test.other", object, callback), EX_UNSUPPORTED_OPERATION);
+        EXPECT_EQ(registerClientCallback("test.own", object, manager()), EX_ILLEGAL_STATE);
+        EXPECT_EQ(registerClientCallback("test.own", nullptr, callback), EX_NULL_POINTER);
+        EXPECT_EQ(registerClientCallback("test.own", object, nullptr), EX_NULL_POINTER);
+    });
+}
+
+TEST_F(LazyServices, MayTakeTheirOwnNameAwayOnly) {
+    const Server server(kSystem, [] { EXPECT_EQ(add("test.other", makeObject()), EX_NONE); });
+    as(kSystem, [] {
+        const ndk::SpAIBinder object = makeObject();
+        EXPECT_EQ(add("test.own", object), EX_NONE);
+        EXPECT_EQ(tryUnregister("test.own", makeObject()), EX_ILLEGAL_STATE);
+        EXPECT_EQ(tryUnregister("test.none", object), EX_ILLEGAL_STATE);
+        EXPECT_EQ(tryUnregister("test.other", object), EX_UNSUPPORTED_OPERATION);
+        EXPECT_EQ(tryUnregister("test.own", nullptr), EX_NULL_POINTER);
+        EXPECT_EQ(tryUnregister("test.own", object), EX_NONE);
+        EXPECT_EQ(AServiceManager_checkService("test.own"), nullptr);
+    });
+}
+
+TEST_F(LazyServices, MayNotLeaveWhileClientsMayBeThere) {
+    as(kSystem, [] {
+        const ndk::SpAIBinder object = makeObject();
+        EXPECT_EQ(add("test.own", object), EX_NONE);
+        const ndk::SpAIBinder found(AServiceManager_checkService("test.own"));
+        EXPECT_EQ(tryUnregister("test.own", object), EX_ILLEGAL_STATE);
+    });
+}
+
+// What a lazy service does: it leaves, name first, when its last client has gone.
+void serveLazily() {
+    static const ndk::SpAIBinder object = makeObject();
+    static const ClientCallback callback([](bool hasClients) {
+        if (!hasClients && tryUnregister("test.lazy", object) == EX_NONE) _exit(0);
+    });
+    EXPECT_EQ(add("test.lazy", object), EX_NONE);
+    EXPECT_EQ(registerClientCallback("test.lazy", object, callback.binder), EX_NONE);
+}
+
+TEST_F(LazyServices, StayForAClientLeaveAfterItAndComeAgain) {
+    for (int round = 0; round < 2; ++round) {
+        SCOPED_TRACE(round);
+        Server service(kSystem, serveLazily);
+        as(kApp, [] {
+            const ndk::SpAIBinder found(AServiceManager_checkService("test.lazy"));
+            // Clients are counted every five seconds; the second count is the first that tells.
+            sleep(11);
+            EXPECT_EQ(AIBinder_ping(found.get()), STATUS_OK);
+        });
+        EXPECT_TRUE(eventually([&service] { return service.hasEnded(); }));
+        as(kApp, [] { EXPECT_EQ(AServiceManager_checkService("test.lazy"), nullptr); });
+    }
+}
+
+using DebugInfos = ServiceManagerTest;
+
+TEST_F(DebugInfos, NameTheProcessThatRegistered) {
+    const Server server(kSystem, [] { EXPECT_EQ(add("test.service", makeObject()), EX_NONE); });
+    as(kSystem, [&server] {
+        std::vector<DebugInfo> infos;
+        EXPECT_EQ(debugInfo(infos), EX_NONE);
+        ASSERT_EQ(infos.size(), 2u);
+        EXPECT_EQ(infos[0].name, "manager");
+        EXPECT_EQ(infos[1].name, "test.service");
+        EXPECT_EQ(infos[1].pid, server.pid());
+    });
+}
+
+using Death = ServiceManagerTest;
+
+TEST_F(Death, OfAServiceTakesAllItsNames) {
+    Server server(kRoot, [] {
+        const ndk::SpAIBinder object = makeObject();
+        EXPECT_EQ(add("test.one", object), EX_NONE);
+        EXPECT_EQ(add("test.two", object), EX_NONE);
+    });
+    as(kApp, [] {
+        std::vector<std::string> names;
+        EXPECT_EQ(list(15, names), EX_NONE);
+        EXPECT_THAT(names, ElementsAre("manager", "test.one", "test.two"));
+    });
+    server.kill();
+    as(kApp, [] {
+        EXPECT_TRUE(eventually([] {
+            std::vector<std::string> names;
+            EXPECT_EQ(list(15, names), EX_NONE);
+            return names == std::vector<std::string>{"manager"};
+        }));
+    });
+    EXPECT_THAT(mManager.log(), HasSubstr("\"test.one\" is gone: its process has died\n"));
+}
+
+TEST_F(Death, OfAReplacedServiceLeavesItsSuccessor) {
+    Server first(kSystem, [] { EXPECT_EQ(add("test.service", makeObject()), EX_NONE); });
+    const Server second(kSystem, [] { EXPECT_EQ(add("test.service", makeObject()), EX_NONE); });
+    first.kill();
+    as(kSystem, [] {
+        // A second name that dies with its process marks the moment when notices have come.
+        const ndk::SpAIBinder found(AServiceManager_checkService("test.service"));
+        EXPECT_NE(found.get(), nullptr);
+        EXPECT_EQ(AIBinder_ping(found.get()), STATUS_OK);
+    });
+    EXPECT_THAT(mManager.log(), Not(HasSubstr("is gone")));
+}
+
+TEST_F(Death, OfManyClientsInARowHarmsNothing) {
+    for (int i = 0; i < 50; ++i) {
+        as(kSystem, [] { EXPECT_EQ(add("test.service", makeObject()), EX_NONE); });
+    }
+    as(kSystem, [] {
+        EXPECT_TRUE(
+                eventually([] { return AServiceManager_checkService("test.service") == nullptr; }));
+    });
+    EXPECT_TRUE(mManager.answers());
+}
+
+}  // namespace

@@ -1,0 +1,327 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "tests/faults/requests.h"
+
+#include <unistd.h>
+
+#include <algorithm>
+#include <filesystem>
+#include <iterator>
+#include <thread>
+#include <type_traits>
+#include <utility>
+
+#include "tests/fake_motor.h"
+
+namespace faults {
+namespace {
+
+namespace hal = aidl::android::hardware::vibrator;
+namespace vendor = aidl::vendor::quorvan::hardware::vibrator;
+
+// The class's own nodes without those that a phone of the kind lacks.
+void addNodes(fake::FakeKernel& kernel, const std::string& directory,
+              const std::vector<std::string>& lacking) {
+    static constexpr struct {
+        const char* leaf;
+        const char* text;
+    } kNodes[] = {
+            {"intensity", "0\n"},
+            {"force_touch_intensity", "0\n"},
+            {"multi_freq", "0\n"},
+            {"haptic_engine", "0\n"},
+            {"cp_trigger_index", "0\n"},
+            {"cp_trigger_queue", "0\n"},
+            {"num_waves", "7\n"},
+            {"motor_type", "LINEAR_1040\n"},
+            {"event_cmd", "FOLDER TENT\n"},
+            {"intensities", "100,200\n"},
+            {"haptic_intensities", "100,200\n"},
+            {"asp_enable", "0\n"},
+            {"gpio1_fall_index", "0\n"},
+            {"gpio1_fall_dig_scale", "0\n"},
+            {"gpio1_rise_index", "0\n"},
+            {"gpio1_rise_dig_scale", "0\n"},
+            {"vibe_state", "0\n"},
+            {"fifo", "0\n"},
+            {"hybrid_haptic_engine", "0\n"},
+    };
+    for (const auto& [leaf, text] : kNodes) {
+        if (std::find(lacking.begin(), lacking.end(), leaf) == lacking.end()) {
+            kernel.addNode(directory + leaf, text);
+        }
+    }
+}
+
+template <typename Value>
+std::string textOf(const Value& value) {
+    if constexpr (std::is_enum_v<Value>) {
+        return std::to_string(static_cast<int64_t>(value));
+    } else {
+        return std::to_string(value);
+    }
+}
+
+template <typename Value>
+std::string textOf(const std::vector<Value>& values) {
+    std::string text;
+    for (const Value& value : values) text += textOf(value) + " ";
+    return text;
+}
+
+// A request without an out-value, and one with.
+template <typename Call>
+auto plain(Call call) {
+    return [call](Phone& phone) -> Answer { return {call(phone).getExceptionCode(), ""}; };
+}
+
+template <typename Value, typename Call>
+auto with(Call call) {
+    return [call](Phone& phone) -> Answer {
+        Value value = {};
+        const binder_exception_t exception = call(phone, &value).getExceptionCode();
+        return {exception, textOf(value)};
+    };
+}
+
+hal::CompositeEffect click(int32_t delayMs) {
+    hal::CompositeEffect effect;
+    effect.delayMs = delayMs;
+    effect.primitive = hal::CompositePrimitive::CLICK;
+    effect.scale = 1.0F;
+    return effect;
+}
+
+vendor::ZelHapticEnginePacket packet() {
+    vendor::ZelHapticEnginePacket packet;
+    packet.time = 7;
+    packet.intensity = 10000;
+    packet.frequency = 2050;
+    return packet;
+}
+
+vendor::ZelHybridHapticEnginePacket hybridPacket() {
+    vendor::ZelHybridHapticEnginePacket packet;
+    packet.time = 5;
+    packet.intensity = 5000;
+    packet.value = 3;
+    return packet;
+}
+
+vendor::ZelPlaybackPacket playbackPacket() {
+    vendor::ZelPlaybackPacket packet;
+    packet.patternIndex = 5;
+    packet.level = 100;
+    return packet;
+}
+
+ptrdiff_t threadsOfProcess() {
+    const std::filesystem::directory_iterator tasks("/proc/self/task");
+    return std::distance(begin(tasks), end(tasks));
+}
+
+constexpr char kNodeIsMissing[] = "a query: a node that does not open counts as missing";
+constexpr char kListIsMissing[] = "a query: a list that cannot be read counts as empty";
+constexpr char kStartDoesNotCount[] =
+        "the driver has taken the packets; its answer to the start is not looked at";
+constexpr char kDriverLogs[] = "a driver that takes less has said so in its own log";
+constexpr char kThreadIsAlone[] = "the pulses are played on a thread whose calls are not answered";
+constexpr char kEventIsNotCounted[] = "the input core takes whole events";
+constexpr char kReadIsPassedOn[] = "the driver's number is passed on as it is read";
+constexpr char kReadIsCut[] = "a node that gives less has given what it has";
+
+}  // namespace
+
+std::string nameOf(PhoneClass phoneClass) {
+    static constexpr const char* kNames[] = {"legacy",         "leds",           "leds-packets",
+                                             "leds-amplitude", "force-feedback", "none"};
+    return kNames[static_cast<size_t>(phoneClass)];
+}
+
+Phone::Phone(PhoneClass phoneClass) : mThreads(threadsOfProcess()) {
+    for (const char* leaf : {"functions", "intensities", "haptic_intensities"}) {
+        kernel.addNode(kInfo + leaf,
+                       std::string(leaf) == "functions"
+                               ? "INTENSITY PRIMITIVE_EFFECT_COMPOSE CAPABILITY_EXTERNAL_CONTROL\n"
+                               : "100,200\n",
+                       fake::Access::kReadOnly);
+    }
+    switch (phoneClass) {
+        case PhoneClass::kLegacy:
+            addLegacyClass();
+            kernel.addNode(kLegacy + "use_kyp_index");
+            addNodes(kernel, kLegacy, {});
+            break;
+        case PhoneClass::kLeds:
+            addLedsClass();
+            addNodes(kernel, kLeds, {});
+            break;
+        case PhoneClass::kLedsPackets:
+            addLedsClass();
+            addNodes(kernel, kLeds, {"cp_trigger_index"});
+            break;
+        case PhoneClass::kLedsAmplitude:
+            addLedsClass();
+            addNodes(kernel, kLeds, {"cp_trigger_index", "haptic_engine", "motor_type"});
+            break;
+        case PhoneClass::kForceFeedback:
+            kernel.addNode("/proc/bus/input/devices",
+                           "N: Name=\"qvx_vibrator_inputff\"\nH: Handlers=event7 \n\n",
+                           fake::Access::kReadOnly);
+            for (const char* leaf : {"use_kyp_index", "event_cmd", "f0_stored"}) {
+                kernel.addNode("/sys/class/qvx_vib_inputff/control/" + std::string(leaf),
+                               "FOLDER\n");
+            }
+            kernel.addNode("/efs/FactoryApp/vibrator_calibration", "137\n",
+                           fake::Access::kReadOnly);
+            kernel.addDevice("/dev/input/event7", std::make_shared<fake::FakeMotor>());
+            break;
+        case PhoneClass::kNone:
+            break;
+    }
+}
+
+Phone::~Phone() {
+    settle();
+    extension.reset();
+    standard.reset();  // closes the motor
+    hal::inputFD = -1;
+}
+
+void Phone::settle() {
+    while (threadsOfProcess() > mThreads) std::this_thread::yield();
+}
+
+void Phone::build() {
+    const auto hwApi = std::make_shared<hal::HwApi>();
+    standard = ndk::SharedRefBase::make<hal::Vibrator>(hwApi);
+    extension = ndk::SharedRefBase::make<vendor::Vibrator>(hwApi);
+}
+
+const std::vector<Request>& requests() {
+    using S = hal::Vibrator;
+    using E = vendor::Vibrator;
+    using hal::Effect;
+    using hal::EffectStrength;
+    using Effects = std::vector<Effect>;
+    using Primitives = std::vector<hal::CompositePrimitive>;
+    using Numbers = std::vector<int32_t>;
+    const auto query = [](ndk::ScopedAStatus (E::*method)(bool*)) {
+        return with<bool>([method](Phone& phone, bool* value) {
+            return (phone.extension.get()->*method)(value);
+        });
+    };
+    const auto declined = [](ndk::ScopedAStatus (S::*method)(float*)) {
+        return with<float>([method](Phone& phone, float* value) {
+            return (phone.standard.get()->*method)(value);
+        });
+    };
+    const auto perform = [](Effect effect) {
+        return with<int32_t>([effect](Phone& phone, int32_t* value) {
+            return phone.standard->perform(effect, EffectStrength::STRONG, nullptr, value);
+        });
+    };
+    const auto performExtended = [](Effect effect) {
+        return with<int32_t>([effect](Phone& phone, int32_t* value) {
+            return phone.extension->perform(effect, 5000, nullptr, value);
+        });
+    };
+    const auto pattern = [](int32_t index, bool repeat) {
+        return plain([=](Phone& phone) {
+            return phone.extension->performPrebakedHapticPattern(index, 5000, repeat);
+        });
+    };
+#define PLAIN(call) plain([](Phone& phone) { return phone.call; })
+#define WITH(Type, call) with<Type>([](Phone& phone, Type* value) { return phone.call; })
+    static const std::vector<Request> kRequests = {
+            {"std getCapabilities", WITH(int32_t, standard->getCapabilities(value)),
+             kNodeIsMissing},
+            {"std off", PLAIN(standard->off()), kEventIsNotCounted},
+            {"std on", PLAIN(standard->on(500, nullptr)), kEventIsNotCounted},
+            {"std perform CLICK", perform(Effect::CLICK), kEventIsNotCounted},
+            {"std perform DOUBLE_CLICK", perform(Effect::DOUBLE_CLICK), kThreadIsAlone},
+            {"std perform TICK", perform(Effect::TICK), kStartDoesNotCount},
+            {"std perform HEAVY_CLICK", perform(Effect::HEAVY_CLICK), kStartDoesNotCount},
+            {"std getSupportedEffects", WITH(Effects, standard->getSupportedEffects(value)),
+             kNodeIsMissing},
+            {"std setAmplitude", PLAIN(standard->setAmplitude(0.5F)), kEventIsNotCounted},
+            {"std setExternalControl", PLAIN(standard->setExternalControl(true)), kReadIsCut},
+            {"std getCompositionDelayMax", WITH(int32_t, standard->getCompositionDelayMax(value)),
+             nullptr},
+            {"std getCompositionSizeMax", WITH(int32_t, standard->getCompositionSizeMax(value)),
+             nullptr},
+            {"std getSupportedPrimitives",
+             WITH(Primitives, standard->getSupportedPrimitives(value)), kListIsMissing},
+            {"std getPrimitiveDuration",
+             WITH(int32_t, standard->getPrimitiveDuration(hal::CompositePrimitive::CLICK, value)),
+             nullptr},
+            {"std compose", PLAIN(standard->compose({click(0), click(20)}, nullptr)),
+             kEventIsNotCounted},
+            {"std getSupportedAlwaysOnEffects",
+             WITH(Effects, standard->getSupportedAlwaysOnEffects(value)), kNodeIsMissing},
+            {"std alwaysOnEnable",
+             PLAIN(standard->alwaysOnEnable(1, Effect::CLICK, EffectStrength::LIGHT)), nullptr},
+            {"std alwaysOnDisable", PLAIN(standard->alwaysOnDisable(1)), nullptr},
+            {"std getResonantFrequency", declined(&S::getResonantFrequency), nullptr},
+            {"std getQFactor", declined(&S::getQFactor), nullptr},
+            {"std getFrequencyResolution", declined(&S::getFrequencyResolution), nullptr},
+            {"std getFrequencyMinimum", declined(&S::getFrequencyMinimum), nullptr},
+            {"std composePwle", PLAIN(standard->composePwle({}, nullptr)), nullptr},
+
+            {"ext supportsAmplitudeControl", query(&E::supportsAmplitudeControl), kNodeIsMissing},
+            {"ext supportsForceTouchAmplitudeControl",
+             query(&E::supportsForceTouchAmplitudeControl), kNodeIsMissing},
+            {"ext supportsFrequencyControl", query(&E::supportsFrequencyControl), kNodeIsMissing},
+            {"ext supportsHapticEngine", query(&E::supportsHapticEngine), kNodeIsMissing},
+            {"ext supportsPrebakedHapticPattern", query(&E::supportsPrebakedHapticPattern),
+             kNodeIsMissing},
+            {"ext supportsFolderStatusSetting", query(&E::supportsFolderStatusSetting),
+             kNodeIsMissing},
+            {"ext supportsEnhancedQuorvanHapticPattern",
+             query(&E::supportsEnhancedQuorvanHapticPattern), kNodeIsMissing},
+            {"ext setAmplitude", PLAIN(extension->setAmplitude(5000)), kEventIsNotCounted},
+            {"ext setForceTouchAmplitude", PLAIN(extension->setForceTouchAmplitude(5000)), nullptr},
+            {"ext setFrequencyType",
+             PLAIN(extension->setFrequencyType(static_cast<vendor::ZelFrequencyType>(4))), nullptr},
+            {"ext setFolderStatus",
+             PLAIN(extension->setFolderStatus(static_cast<vendor::ZelFolderStatus>(1))), nullptr},
+            {"ext getNumberOfPrebakedHapticPattern",
+             WITH(int32_t, extension->getNumberOfPrebakedHapticPattern(value)), kReadIsPassedOn},
+            {"ext performHapticEngine", PLAIN(extension->performHapticEngine({packet()}, 10000)),
+             kStartDoesNotCount},
+            {"ext performPrebakedHapticPattern once", pattern(5, false), kEventIsNotCounted},
+            {"ext performPrebakedHapticPattern chosen", pattern(0, false), kEventIsNotCounted},
+            {"ext performPrebakedHapticPattern repeat", pattern(5, true), kEventIsNotCounted},
+            {"ext getAmplitudeList",
+             WITH(Numbers, extension->getAmplitudeList(vendor::ZelAmplitudeType{}, value)),
+             kNodeIsMissing},
+            {"ext perform CLICK", performExtended(Effect::CLICK), kEventIsNotCounted},
+            {"ext perform DOUBLE_CLICK", performExtended(Effect::DOUBLE_CLICK), kThreadIsAlone},
+            {"ext perform TICK", performExtended(Effect::TICK), kStartDoesNotCount},
+            {"ext performPlaybackEngine",
+             PLAIN(extension->performPlaybackEngine({playbackPacket()}, true, 2)), nullptr},
+            {"ext supportsFifoHapticEngine", query(&E::supportsFifoHapticEngine), kNodeIsMissing},
+            {"ext supportsHybridHapticEngine", query(&E::supportsHybridHapticEngine),
+             kNodeIsMissing},
+            {"ext supportsEnhancedHybridHapticPattern",
+             query(&E::supportsEnhancedHybridHapticPattern), kNodeIsMissing},
+            {"ext performFifoHapticEngine",
+             PLAIN(extension->performFifoHapticEngine(static_cast<vendor::ZelFifoType>(25))),
+             nullptr},
+            {"ext performHybridHapticEngine",
+             PLAIN(extension->performHybridHapticEngine({hybridPacket()}, 10000)), kDriverLogs},
+            {"ext supportsFolderTentModeStatusSetting",
+             query(&E::supportsFolderTentModeStatusSetting), kNodeIsMissing},
+            {"ext setFolderTentModeStatus",
+             PLAIN(extension->setFolderTentModeStatus(
+                     static_cast<vendor::ZelFolderTentModeStatus>(1))),
+             nullptr},
+            {"ext supportsHasFeature", query(&E::supportsHasFeature), kNodeIsMissing},
+            {"ext hasFeature", WITH(bool, extension->hasFeature("INTENSITY", value)),
+             kListIsMissing},
+    };
+#undef PLAIN
+#undef WITH
+    return kRequests;
+}
+
+}  // namespace faults
