@@ -180,7 +180,8 @@ TEST(MotorFault, MotorUnpluggedBeforeItsFirstUseCannotBeOpened) {
     EXPECT_EQ(phone.call({"std", "on", "500"})["exception"], kIllegalState);
     EXPECT_EQ(phone.call({"std", "on", "500"})["exception"], kIllegalState);
     EXPECT_THAT(motorRequests(phone),
-                ElementsAre("open motor O_RDWR = ENODEV", "open motor O_RDWR = ENODEV"));
+                ElementsAre("unplug motor", "open motor O_RDWR = ENODEV",
+                            "open motor O_RDWR = ENODEV"));
 }
 
 size_t openDescriptors(int pid) {
