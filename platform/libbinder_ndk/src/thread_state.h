@@ -89,6 +89,8 @@ class ThreadState {
     binder_status_t executeNext();
     binder_status_t skipUnknown(uint32_t command);
     void serveTransaction(const binder_transaction_data& transaction, const char* sid);
+    binder_status_t answerRequest(const binder_transaction_data& transaction, const char* sid,
+                                  Parcel* reply);
     binder_status_t callTarget(const binder_transaction_data& transaction, const Parcel& request,
                                Parcel* reply);
     binder_status_t refuseNesting();

@@ -81,8 +81,23 @@ binder_status_t ThreadState::skipUnknown(uint32_t command) {
 }
 
 void ThreadState::serveTransaction(const binder_transaction_data& transaction, const char* sid) {
-    const bool isOneway = (transaction.flags & TF_ONE_WAY) != 0;
-    // Outlives the identity, which refers to it, and is given back with the next write.
+    ++mServing;
+    {
+        Parcel reply;
+        const binder_status_t status = answerRequest(transaction, sid, &reply);
+        if ((transaction.flags & TF_ONE_WAY) == 0) {
+            sendReply(status, reply, transaction.flags);
+        } else if (status != STATUS_OK) {
+            logWarning("a oneway call of code %u failed with status %d", transaction.code, status);
+        }
+    }
+    --mServing;
+}
+
+binder_status_t ThreadState::answerRequest(const binder_transaction_data& transaction,
+                                           const char* sid, Parcel* reply) {
+    // Outlives the identity, which refers to it, but not this function: given back in front of the
+    // reply, so that a client with its answer finds room for another request as large.
     Parcel request;
     request.adopt(reinterpret_cast<const uint8_t*>(transaction.data.ptr.buffer),  // NOLINT
                   transaction.data_size,
@@ -93,22 +108,10 @@ void ThreadState::serveTransaction(const binder_transaction_data& transaction, c
     const CallContext saved = context;
     // The driver says pid 0 for a oneway call.
     context = {transaction.sender_pid, transaction.sender_euid, sid, 0, transaction.flags};
-    ++mServing;
-
-    {
-        Parcel reply;
-        const binder_status_t status = mServing <= kMaxNestedCalls
-                                               ? callTarget(transaction, request, &reply)
-                                               : refuseNesting();
-        if (!isOneway) {
-            sendReply(status, reply, transaction.flags);
-        } else if (status != STATUS_OK) {
-            logWarning("a oneway call of code %u failed with status %d", transaction.code, status);
-        }
-    }
-
-    --mServing;
+    const binder_status_t status =
+            mServing <= kMaxNestedCalls ? callTarget(transaction, request, reply) : refuseNesting();
     context = saved;
+    return status;
 }
 
 binder_status_t ThreadState::refuseNesting() {
