@@ -36,6 +36,12 @@ set(analyzer_options --extra-arg=-Xclang --extra-arg=-analyzer-config
 set(thread_options --extra-arg=-stdlib=libc++
                    --extra-arg=-D_LIBCPP_ENABLE_THREAD_SAFETY_ANNOTATIONS
                    --extra-arg=-Wthread-safety)
+# Clang reads headers as they stand, not as another compiler has precompiled them.
+set(lint_commands ${CMAKE_BINARY_DIR}/lint/compile_commands.json)
+add_custom_command(OUTPUT ${lint_commands}
+    COMMAND sed "s| -Winvalid-pch -include .*/cmake_pch.hxx||" ${CMAKE_BINARY_DIR}/compile_commands.json
+            > ${lint_commands}
+    DEPENDS ${CMAKE_BINARY_DIR}/compile_commands.json VERBATIM)
 foreach(file IN LISTS lint_sources)
     file(RELATIVE_PATH name ${CMAKE_SOURCE_DIR} ${file})
     string(REPLACE "/" "_" stamp ${name})
@@ -46,10 +52,10 @@ foreach(file IN LISTS lint_sources)
     endif()
     # Findings go to standard output; standard error only counts suppressed ones.
     add_custom_command(OUTPUT ${stamp}.tidy
-        COMMAND sh -c "exec \"$@\" 2>/dev/null" sh ${CLANG_TIDY} --quiet -p ${CMAKE_BINARY_DIR}
+        COMMAND sh -c "exec \"$@\" 2>/dev/null" sh ${CLANG_TIDY} --quiet -p ${CMAKE_BINARY_DIR}/lint
                 --extra-arg=-Wno-unknown-warning-option ${options} ${file}
         COMMAND ${CMAKE_COMMAND} -E touch ${stamp}.tidy
-        DEPENDS ${file} ${lint_headers} ${CMAKE_SOURCE_DIR}/.clang-tidy
+        DEPENDS ${file} ${lint_headers} ${lint_commands} ${CMAKE_SOURCE_DIR}/.clang-tidy
         COMMENT "clang-tidy ${name}" VERBATIM)
     list(APPEND lint_stamps ${stamp}.tidy)
 endforeach()
