@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 //
-// The process that runs a phone.
+// The process that runs a phone: its servers, what it waits for, and the way down.
 #include "handset/phone/supervisor.h"
 
 #include <fcntl.h>
@@ -10,15 +10,12 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include <algorithm>
 #include <array>
 #include <cerrno>
 #include <csignal>
-#include <cstring>
 #include <initializer_list>
 #include <utility>
 
-#include <android-base/strings.h>
 #include <fmt/format.h>
 
 #include "handset/phone/registration.h"
@@ -35,27 +32,7 @@ using android::base::unique_fd;
 using std::chrono::milliseconds;
 using std::chrono::seconds;
 
-constexpr int kUp = 0;
-constexpr int kServiceEnded = 1;
-constexpr int kNotStarted = 2;
-
-constexpr uid_t kSystemUser = 1000;
-
 constexpr seconds kReadyTimeout{20};
-constexpr seconds kServiceTimeout{60};  // emulation under the address sanitizer takes its time
-constexpr int kEndTimeout = 3000;       // milliseconds
-
-unique_fd openLog(const std::string& path) {
-    // Appending, so that "phone reset" may empty the file under its writer.
-    return unique_fd(open(path.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_APPEND | O_CLOEXEC, 0644));
-}
-
-std::string withLastLine(std::string text, const std::string& log) {
-    std::string line = lastLineOf(log);
-    line.erase(0, line.find_first_not_of("0123456789"));  // the time
-    line = android::base::Trim(line);
-    return line.empty() ? text : fmt::format("{}: {}", text, line);
-}
 
 // How a server ended before it was ready. Both end with a line of their own that says why.
 std::string endOf(std::string_view what, Child& child, const std::string& log) {
@@ -92,9 +69,9 @@ Supervisor::Supervisor(PhonePlan plan, unique_fd starter)
 
 void Supervisor::run() {
     UpReport up = bringUp();
-    if (up.status != kUp) takeDown();
+    if (up.status != UpReport::kUp) takeDown();
     report(up);
-    if (up.status != kUp) return;
+    if (up.status != UpReport::kUp) return;
     if (listen()) watch();
     takeDown();
 }
@@ -106,16 +83,16 @@ void Supervisor::report(const UpReport& report) {
 }
 
 UpReport Supervisor::bringUp() {
-    if (auto done = saveState(mState); !done) return {kNotStarted, done.error().message()};
-    if (auto done = makeCalls(); !done) return {kNotStarted, done.error().message()};
+    if (auto done = saveState(mState); !done) return UpReport::notStarted(done.error().message());
+    if (auto done = makeCalls(); !done) return UpReport::notStarted(done.error().message());
     if (auto failed = startDriver()) return *failed;
     if (auto failed = startManager()) return *failed;
     if (!mPlan.service.empty()) {
         if (auto failed = startService()) return *failed;
         return awaitRegistration();
     }
-    if (auto done = saveState(mState); !done) return {kNotStarted, done.error().message()};
-    return {kUp, fmt::format("phone is up: profile {}, no service", mState.profile)};
+    if (auto done = saveState(mState); !done) return UpReport::notStarted(done.error().message());
+    return {UpReport::kUp, fmt::format("phone is up: profile {}, no service", mState.profile)};
 }
 
 // Starts a server that is told, by --ready-fd, where to write a line once it serves; `ready`
@@ -140,7 +117,7 @@ std::optional<UpReport> Supervisor::startDriver() {
     Result<Child> driver = startServer({mPlan.driver, "--profile", mPlan.profilePath, "--journal",
                                         mState.journal(), "--control", kControlSocket},
                                        mState.driverLog(), ready);
-    if (!driver) return UpReport{kNotStarted, driver.error().message()};
+    if (!driver) return UpReport::notStarted(driver.error().message());
     mDriver = std::move(*driver);
     mState.driver = mDriver->pid();
     const Event event = wait(Clock::now() + kReadyTimeout, ready.get());
@@ -149,12 +126,12 @@ std::optional<UpReport> Supervisor::startDriver() {
 
 std::optional<UpReport> Supervisor::startManager() {
     if (auto done = installVintfFragments(mState.made); !done) {
-        return UpReport{kNotStarted, done.error().message()};
+        return UpReport::notStarted(done.error().message());
     }
     unique_fd ready;
     Result<Child> manager =
             startServer({mPlan.manager, "--rules", QVX_SERVICE_RULES}, mState.managerLog(), ready);
-    if (!manager) return UpReport{kNotStarted, manager.error().message()};
+    if (!manager) return UpReport::notStarted(manager.error().message());
     mManager = std::move(*manager);
     mState.manager = mManager->pid();
     const Event event = wait(Clock::now() + kReadyTimeout, ready.get());
@@ -168,73 +145,17 @@ Result<void> Supervisor::makeCalls() const {
     return {};
 }
 
-std::optional<UpReport> Supervisor::startService() {
-    const unique_fd mounts(
-            open(fmt::format("/proc/{}/ns/mnt", mDriver->pid()).c_str(), O_RDONLY | O_CLOEXEC));
-    if (!mounts.ok()) return UpReport{kNotStarted, "the driver's mount namespace is gone"};
-    if (!mLog) {
-        Result<ServiceLog> log = ServiceLog::create(mState.serviceLog());
-        if (!log) return UpReport{kNotStarted, log.error().message()};
-        mLog = std::move(*log);
-        unlink(mState.serviceOutput().c_str());
-    }
-    mServiceStart = Clock::now();
-    mRestartAt.reset();
-    const unique_fd output = openLog(mState.serviceOutput());
-    if (!output.ok()) {
-        return UpReport{kNotStarted, fmt::format("{}: {}", mState.serviceLog(), strerror(errno))};
-    }
-    Result<Child> service = Child::start({.command = {mPlan.service},
-                                          .mounts = mounts.get(),
-                                          .user = kSystemUser,
-                                          .output = output.get(),
-                                          .errors = mLog->writer()});
-    if (!service) return UpReport{kNotStarted, service.error().message()};
-    mService = std::move(*service);
-    mState.service = mService->pid();
-    mState.serviceStatus.reset();
-    mState.stopped = false;
-    mState.restartAt = 0;
-    ++mState.starts;
-    if (auto done = saveState(mState); !done) return UpReport{kNotStarted, done.error().message()};
-    return std::nullopt;
-}
-
-UpReport Supervisor::awaitRegistration() {
-    Result<Child> probe = Child::fork([] { return awaitService(true); });
-    if (!probe) return {kNotStarted, probe.error().message()};
-    mProbe = std::move(*probe);
-    const Event event = wait(Clock::now() + kServiceTimeout);
-    if (event == Event::kService) {
-        noteServiceEnd();
-        return {kServiceEnded, serviceEndText(mState)};
-    }
-    if (event == Event::kLate) {
-        return {kServiceEnded,
-                withLastLine(fmt::format("the service did not register within {} seconds",
-                                         kServiceTimeout.count()),
-                             mState.serviceLog())};
-    }
-    if (event != Event::kProbe) return notReady(event);
-    if (mProbe->poll() != kProbeDone) return {kNotStarted, "/dev/binder cannot be opened"};
-    mProbe.reset();
-    mState.registered = true;
-    if (auto done = saveState(mState); !done) return {kNotStarted, done.error().message()};
-    return {kUp, fmt::format("phone is up: profile {}, service registered, pid {}", mState.profile,
-                             mState.service)};
-}
-
 // Why something that was waited for did not come.
 UpReport Supervisor::notReady(Event event) {
     switch (event) {
         case Event::kDriver:
-            return {kNotStarted, endOf("driver", *mDriver, mState.driverLog())};
+            return UpReport::notStarted(endOf("driver", *mDriver, mState.driverLog()));
         case Event::kManager:
-            return {kNotStarted, endOf("service manager", *mManager, mState.managerLog())};
+            return UpReport::notStarted(endOf("service manager", *mManager, mState.managerLog()));
         case Event::kLate:
-            return {kNotStarted, "the driver or the service manager hangs"};
+            return UpReport::notStarted("the driver or the service manager hangs");
         default:
-            return {kNotStarted, "interrupted"};
+            return UpReport::notStarted("interrupted");
     }
 }
 
@@ -284,48 +205,6 @@ std::string Supervisor::answer(std::string_view request) {
     const std::string refusal = serviceRequest(request.substr(kService.size()));
     (void)saveState(mState);  // before whoever asked looks at it
     return refusal.empty() ? "ok" : "error " + refusal;
-}
-
-// Does what is asked; why not, or nothing.
-std::string Supervisor::serviceRequest(std::string_view action) {
-    if (action == "kill") {
-        if (!mService) return "the service does not run";
-        kill(mService->pid(), SIGKILL);
-        mService->await(kEndTimeout);
-        noteServiceEnd();
-        return "";
-    }
-    if (action == "start" && mService) {
-        return fmt::format("the service runs already, pid {}", mService->pid());
-    }
-    if (action == "stop" || action == "restart") stopService();
-    if (action == "stop") return "";
-    const std::optional<UpReport> failed = startService();
-    return failed ? failed->text : "";
-}
-
-void Supervisor::stopService() {
-    if (mService) {
-        mService->end(kEndTimeout);
-        noteServiceEnd();
-    }
-    mRestartAt.reset();
-    mState.restartAt = 0;
-    mState.stopped = true;
-}
-
-// As init has it: started again, but no sooner than the period after the last start.
-void Supervisor::noteServiceEnd() {
-    mLog->drain();
-    mLog->flush();
-    mState.serviceStatus = mService->poll();
-    mService.reset();
-    mState.service = 0;
-    if (mPlan.init.oneshot) return;
-    mRestartAt = std::max(Clock::now(), mServiceStart + mPlan.init.period);
-    mState.restartAt =
-            std::chrono::duration_cast<std::chrono::microseconds>(mRestartAt->time_since_epoch())
-                    .count();
 }
 
 void Supervisor::takeDown() {
@@ -397,12 +276,6 @@ void cleanUpAfter(const PhoneState& state) {
     unlink(kControlSocket);
     unlink(kSupervisorSocket);
     removeState();
-}
-
-std::string serviceEndText(const PhoneState& state) {
-    return withLastLine(
-            fmt::format("the service exited with status {}", state.serviceStatus.value_or(-1)),
-            state.serviceLog());
 }
 
 }  // namespace handset

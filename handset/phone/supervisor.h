@@ -17,6 +17,7 @@
 #include <memory>
 #include <optional>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include <android-base/result.h>
@@ -29,6 +30,9 @@
 #include "handset/phone/service_log.h"
 
 namespace handset {
+
+// How long a process that is told to end may take, in milliseconds.
+inline constexpr int kEndTimeout = 3000;
 
 // What to bring up.
 struct PhonePlan {
@@ -43,7 +47,13 @@ struct PhonePlan {
 
 // How bringing a phone up came out.
 struct UpReport {
-    int status = 0;    // exit status of "phone up"
+    static constexpr int kUp = 0;
+    static constexpr int kServiceEnded = 1;
+    static constexpr int kNotStarted = 2;
+
+    static UpReport notStarted(std::string text) { return {kNotStarted, std::move(text)}; }
+
+    int status = kUp;  // exit status of "phone up"
     std::string text;  // its one line
 };
 

@@ -3,6 +3,7 @@
 // Small text files.
 #include "handset/phone/text_file.h"
 
+#include <fcntl.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -17,6 +18,7 @@ namespace handset {
 
 using android::base::Error;
 using android::base::Result;
+using android::base::unique_fd;
 
 Result<void> replaceTextFile(const std::string& path, const std::string& content) {
     const std::string draft = path + ".new";
@@ -27,6 +29,10 @@ Result<void> replaceTextFile(const std::string& path, const std::string& content
     const int error = errno;
     unlink(draft.c_str());
     return Error(error) << path;
+}
+
+unique_fd openLog(const std::string& path) {
+    return unique_fd(open(path.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_APPEND | O_CLOEXEC, 0644));
 }
 
 std::string lastLineOf(const std::string& path) {
