@@ -13,6 +13,11 @@
 namespace handset
 {
 
+// Whom requests come from.
+inline constexpr uid_t kRoot = 0;
+inline constexpr uid_t kSystem = 1000;
+inline constexpr uid_t kStranger = 2000;
+
 struct Agreement {
 	const char *name;
 	uid_t user;
@@ -37,6 +42,11 @@ std::string nameOf(const testing::TestParamInfo<Row> &info)
 {
 	return info.param.name;
 }
+
+// Requests to the motor, in one table for each subject.
+class MotorAgreement : public testing::TestWithParam<Agreement>
+{
+};
 
 // Several answers, each with a blank behind it.
 inline std::string joined(std::initializer_list<std::string> answers)

@@ -1,17 +1,15 @@
 // SPDX-License-Identifier: Apache-2.0
 //
 // The motor: a real force-feedback device behind the kernel's input core, and
-// the simulated one.
+// the simulated one. What it is asked about itself is in
+// motor_questions_guest_test.cpp.
 #include <fcntl.h>
 #include <linux/input.h>
-#include <poll.h>
 #include <sys/ioctl.h>
 #include <unistd.h>
 
 #include <csignal>
 #include <cstring>
-#include <optional>
-#include <random>
 
 #include "handset/kernel/tests/agreement.h"
 #include "handset/driver/tests/motor_file.h"
@@ -20,10 +18,6 @@ namespace handset
 {
 namespace
 {
-
-constexpr uid_t kRoot = 0;
-constexpr uid_t kSystem = 1000;
-constexpr uid_t kStranger = 2000;
 
 std::string newIds(const std::string &motor)
 {
@@ -268,92 +262,6 @@ std::string inheritedFile(const std::string &motor)
 	return answers + file.upload();
 }
 
-std::string questions(const std::string &motor)
-{
-	const MotorFile file(motor, O_RDWR);
-	int number = 0;
-	input_id id{};
-	char text[64] = {};
-	std::string answers =
-		joined({outcome(ioctl(file.fd(), EVIOCGVERSION, &number)),
-			std::to_string(number)});
-	answers += joined({outcome(ioctl(file.fd(), EVIOCGEFFECTS, &number)),
-			   std::to_string(number)});
-	answers += joined(
-		{outcome(ioctl(file.fd(), EVIOCGID, &id)),
-		 std::to_string(id.bustype), std::to_string(id.vendor),
-		 std::to_string(id.product), std::to_string(id.version)});
-	answers += joined(
-		{outcome(ioctl(file.fd(), EVIOCGNAME(sizeof text), text)),
-		 text});
-	memset(text, '#', 8);
-	text[8] = '\0';
-	answers +=
-		joined({outcome(ioctl(file.fd(), EVIOCGNAME(5), text)), text});
-	answers += joined(
-		{outcome(ioctl(file.fd(), EVIOCGPHYS(sizeof text), text)),
-		 text});
-	return answers +
-	       joined({outcome(ioctl(file.fd(), EVIOCGUNIQ(sizeof text), text)),
-		       outcome(ioctl(file.fd(), EVIOCGNAME(0), text))});
-}
-
-std::string bitMaps(const std::string &motor)
-{
-	const MotorFile file(motor, O_RDWR);
-	std::string answers;
-	const auto ask = [&](unsigned long command) {
-		unsigned char bits[128] = {};
-		const int size = ioctl(file.fd(), command, bits);
-		answers += outcome(size);
-		for (int i = 0; i < size; ++i) {
-			if (bits[i] != 0)
-				answers += ":" + std::to_string(i) + "=" +
-					   std::to_string(bits[i]);
-		}
-		answers += " ";
-	};
-	for (unsigned type = 0; type <= EV_MAX; ++type)
-		ask(EVIOCGBIT(type, 128));
-	ask(EVIOCGBIT(EV_FF, 11));
-	ask(EVIOCGPROP(128));
-	ask(EVIOCGKEY(128));
-	ask(EVIOCGLED(128));
-	ask(EVIOCGSND(128));
-	ask(EVIOCGSW(128));
-	return answers;
-}
-
-std::string questionsItDoesNotAnswer(const std::string &motor)
-{
-	const MotorFile file(motor, O_RDWR);
-	unsigned char memory[256] = {};
-	std::string answers;
-	for (const unsigned long command :
-	     {static_cast<unsigned long>(EVIOCGABS(0)),
-	      static_cast<unsigned long>(EVIOCGKEYCODE),
-	      static_cast<unsigned long>(EVIOCGMTSLOTS(8)),
-	      static_cast<unsigned long>(_IO('E', 0xee)),
-	      static_cast<unsigned long>(_IOR('E', 0xee, int)),
-	      static_cast<unsigned long>(
-		      _IOW('E', 0x80, int)), // an upload of another size
-	      static_cast<unsigned long>(_IOR('Q', 0x01, int)), 0UL}) {
-		answers += outcome(ioctl(file.fd(), command, memory)) + " ";
-	}
-	return answers;
-}
-
-std::string nothingToRead(const std::string &motor)
-{
-	const MotorFile file(motor, O_RDWR | O_NONBLOCK);
-	input_event events[2] = {};
-	pollfd polled{file.fd(), POLLIN | POLLOUT, 0};
-	const int ready = poll(&polled, 1, 0);
-	return joined({outcome(read(file.fd(), events, sizeof events)),
-		       outcome(read(file.fd(), events, 5)),
-		       std::to_string(ready), std::to_string(polled.revents)});
-}
-
 const Agreement kCases[] = {
 	{"NewEffectsTakeTheLowestFreeId", kSystem, newIds,
 	 "0 1 2 ENOSPC 0 1 ENOSPC "},
@@ -394,22 +302,6 @@ const Agreement kCases[] = {
 	{"ADuplicateKeepsTheEffects", kSystem, duplicateKeeps, "0 1 0"},
 	{"AKilledClientsEffectsAreErased", kSystem, killedClient, "137 0 "},
 	{"AnInheritedFileIsTheSameOwner", kSystem, inheritedFile, "0 0 0"},
-	{"QuestionsAreAnswered", kSystem, questions,
-	 "0 65537 0 3 0 6 0 0 0 21 qvx_vibrator_inputff 5 qvx_v### 11 "
-	 "qvx/input0 ENOENT 0 "},
-	{"BitMapsSayWhatItCan", kSystem, bitMaps,
-	 "8:0=1:2=32 96 8 8 8 8 "
-	 "EINVAL EINVAL EINVAL EINVAL EINVAL EINVAL EINVAL EINVAL EINVAL "
-	 "EINVAL EINVAL 8 8 EINVAL EINVAL 16:10=3:11=32:12=1 EINVAL EINVAL "
-	 "EINVAL EINVAL EINVAL "
-	 "EINVAL EINVAL EINVAL EINVAL EINVAL 11:10=3 8 96 8 8 8 "},
-	{"OtherQuestionsAreRefused", kSystem, questionsItDoesNotAnswer,
-	 "EINVAL EINVAL EINVAL EINVAL EINVAL EFAULT EINVAL EINVAL "},
-	{"ThereIsNothingToRead", kSystem, nothingToRead, "EAGAIN EINVAL 1 4 "},
-};
-
-class MotorAgreement : public testing::TestWithParam<Agreement>
-{
 };
 
 TEST_P(MotorAgreement, OfRealAndSimulated)
@@ -419,91 +311,6 @@ TEST_P(MotorAgreement, OfRealAndSimulated)
 
 INSTANTIATE_TEST_SUITE_P(Motor, MotorAgreement, testing::ValuesIn(kCases),
 			 nameOf<Agreement>);
-
-// Three files and a long random sequence of everything a client may ask; the
-// seed makes both drivers get the same.
-class RandomClient
-{
-      public:
-	RandomClient(const std::string &motor, unsigned seed)
-	    : mMotor(motor), mRandom(seed)
-	{
-		for (std::optional<MotorFile> &file : mFiles)
-			file.emplace(mMotor, O_RDWR);
-	}
-
-	std::string run(int steps)
-	{
-		std::string answers;
-		for (int i = 0; i < steps; ++i)
-			answers += step() + " ";
-		return answers;
-	}
-
-      private:
-	int below(int limit)
-	{
-		return static_cast<int>(mRandom() %
-					static_cast<unsigned>(limit));
-	}
-
-	std::string step()
-	{
-		std::optional<MotorFile> &file = mFiles[below(3)];
-		switch (below(10)) {
-		case 0:
-			file.emplace(mMotor, O_RDWR);
-			return "reopened";
-		case 1:
-		case 2:
-			return file->erase(below(6) - 1);
-		case 3:
-			return file->event(FF_GAIN, below(70000) - 1000);
-		case 4:
-		case 5:
-		case 6:
-			return file->event(static_cast<uint16_t>(below(5)),
-					   below(5) - 1);
-		default:
-			return upload(*file);
-		}
-	}
-
-	std::string upload(const MotorFile &file)
-	{
-		int16_t samples[8];
-		for (int16_t &sample : samples)
-			sample = static_cast<int16_t>(mRandom());
-		ff_effect effect = MotorFile::record(
-			below(6) - 2, static_cast<uint16_t>(mRandom()), samples,
-			static_cast<uint32_t>(below(9)));
-		if (below(4) == 0) {
-			effect.type = FF_RUMBLE;
-			memset(&effect.u, 0, sizeof effect.u);
-			effect.u.rumble.strong_magnitude =
-				static_cast<uint16_t>(mRandom());
-		}
-		return file.upload(effect);
-	}
-
-	const std::string mMotor;
-	std::mt19937 mRandom;
-	std::optional<MotorFile> mFiles[3];
-};
-
-class RandomMotorRequests : public testing::TestWithParam<unsigned>
-{
-};
-
-TEST_P(RandomMotorRequests, AreAnsweredAlike)
-{
-	expectSame([](const std::string &motor) {
-		return RandomClient(motor, GetParam()).run(400);
-	});
-}
-
-INSTANTIATE_TEST_SUITE_P(Motor, RandomMotorRequests,
-			 testing::Values(1U, 2U, 3U));
 
 } // namespace
 } // namespace handset

@@ -8,74 +8,16 @@
 
 #include <array>
 #include <cstdio>
-#include <random>
 
 #include "handset/kernel/tests/agreement.h"
+#include "handset/kernel/tests/node_file.h"
 
 namespace handset
 {
 namespace
 {
 
-constexpr uid_t kRoot = 0;
-constexpr uid_t kSystem = 1000;
-constexpr uid_t kStranger = 2000;
-
 const std::string kMissing = "/sys/class/leds/vibrator/missing";
-
-// A node that is open.
-class NodeFile
-{
-      public:
-	NodeFile(const std::string &path, int flags)
-	    : mFd(open(path.c_str(), flags | O_CLOEXEC))
-	{
-	}
-	~NodeFile()
-	{
-		if (mFd >= 0)
-			close(mFd);
-	}
-	NodeFile(const NodeFile &) = delete;
-	NodeFile &operator=(const NodeFile &) = delete;
-
-	int fd() const
-	{
-		return mFd;
-	}
-
-	// One write: its result.
-	std::string put(const std::string &text) const
-	{
-		return outcome(write(mFd, text.data(), text.size()));
-	}
-
-	// One read: the text in brackets, or the error.
-	std::string get(size_t size) const
-	{
-		return shown(size, -1);
-	}
-	std::string getAt(size_t size, off_t offset) const
-	{
-		return shown(size, offset);
-	}
-
-      private:
-	std::string shown(size_t size, off_t offset) const
-	{
-		std::string text(size, '\0');
-		const ssize_t got =
-			offset < 0 ? read(mFd, text.data(), size)
-				   : pread(mFd, text.data(), size, offset);
-		return got < 0 ? outcome(got)
-			       : "[" +
-					 text.substr(0,
-						     static_cast<size_t>(got)) +
-					 "]";
-	}
-
-	int mFd;
-};
 
 std::string opens(const std::string &)
 {
@@ -378,52 +320,6 @@ TEST_P(SysfsAgreement, OfRealAndSimulated)
 
 INSTANTIATE_TEST_SUITE_P(Sysfs, SysfsAgreement, testing::ValuesIn(kCases),
 			 nameOf<Agreement>);
-
-// Two files on one node and a long random sequence of reads and writes; the
-// seed makes both drivers get the same.
-std::string randomReadsAndWrites(unsigned seed)
-{
-	std::mt19937 random(seed);
-	const auto below = [&](unsigned limit) {
-		return static_cast<unsigned>(random() % limit);
-	};
-	const NodeFile files[2] = {{kReadWrite, O_RDWR}, {kReadWrite, O_RDWR}};
-	std::string answers;
-	for (int i = 0; i < 600; ++i) {
-		const NodeFile &file = files[below(2)];
-		const unsigned size = below(4) == 0 ? below(4096) : below(12);
-		switch (below(5)) {
-		case 0:
-			answers += file.put(std::string(
-				size, static_cast<char>('a' + below(26))));
-			break;
-		case 1:
-			answers +=
-				outcome(lseek(file.fd(), below(16), SEEK_SET));
-			break;
-		case 2:
-			answers += file.getAt(size, below(16));
-			break;
-		default:
-			answers += file.get(size);
-		}
-	}
-	return answers;
-}
-
-class RandomSysfsRequests : public testing::TestWithParam<unsigned>
-{
-};
-
-TEST_P(RandomSysfsRequests, AreAnsweredAlike)
-{
-	expectSame([](const std::string &) {
-		return randomReadsAndWrites(GetParam());
-	});
-}
-
-INSTANTIATE_TEST_SUITE_P(Sysfs, RandomSysfsRequests,
-			 testing::Values(1U, 2U, 3U));
 
 } // namespace
 } // namespace handset

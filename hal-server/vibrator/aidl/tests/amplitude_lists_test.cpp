@@ -1,12 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 //
-// The extension's amplitude lists, by motor and from the driver.
+// The extension's amplitude lists by motor.
 #include <cerrno>
 #include <memory>
 #include <string>
 #include <vector>
 
-#include "tests/extension_test.h"
+#include "tests/amplitude_list_test.h"
 
 namespace aidl::vendor::quorvan::hardware::vibrator {
 namespace {
@@ -19,8 +19,6 @@ using ::testing::IsEmpty;
 using ::testing::Not;
 using ::testing::StartsWith;
 
-using Steps = std::vector<int32_t>;
-
 const Steps kA = {0, 3000, 4000, 6000, 8000, 10000};
 const Steps kB = {0, 1500, 4000, 6000, 8000, 10000};
 const Steps kC = {0, 3400, 4900, 6500, 8200, 10000};
@@ -28,24 +26,6 @@ const Steps kD = {0, 2000, 4000, 6000, 8000, 10000};
 const Steps kE = {0, 1000, 5000, 9000};
 const Steps kF = {0, 2000, 6000, 10000};
 const Steps kNone = {};  // not offered
-
-// A motor whose index is what the test says, and which counts how often it is asked.
-class NumberedMotor : public core::HwApi {
-  public:
-    int getMotorIndex() override {
-        ++asked;
-        return named;
-    }
-    int getMotorIndexbyMethod() override {
-        ++askedByMethod;
-        return byMethod;
-    }
-
-    int named = 0;
-    int byMethod = 0;
-    int asked = 0;
-    int askedByMethod = 0;
-};
 
 struct Motor {
     std::string name;
@@ -71,11 +51,6 @@ const Motor kMotors[] = {
         {"Unknown13", 13, kNone, kNone, kNone},
         {"Unknown14", 14, kNone, kNone, kNone},
         {"UnknownLargest", kIntMax, kNone, kNone, kNone},
-};
-
-class LedsPhone : public ExtensionTest {
-  protected:
-    LedsPhone() { addLedsClass(); }
 };
 
 class AmplitudeListOf : public LedsPhone, public testing::WithParamInterface<Motor> {
@@ -146,18 +121,6 @@ TEST_P(AmplitudeListOf, MotorWithoutANameByItsNodes) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Motors, AmplitudeListOf, testing::ValuesIn(kMotors), rowName<Motor>);
-
-class AmplitudeList : public LedsPhone {
-  protected:
-    // The exception's number; the list goes to `list`, which begins empty.
-    binder_exception_t get(Vibrator& extension, ZelAmplitudeType type = ZelAmplitudeType::DEFAULT) {
-        list.clear();
-        return exceptionOf(extension.getAmplitudeList(type, &list));
-    }
-
-    const std::shared_ptr<NumberedMotor> motor = std::make_shared<NumberedMotor>();
-    Steps list;
-};
 
 TEST_F(AmplitudeList, EveryStepIsLoggedInOrder) {
     motor->named = 9;
@@ -289,121 +252,6 @@ TEST_F(AmplitudeList, TypeIsLookedAtBeforeTheVector) {
     EXPECT_EQ(exceptionOf(extension->getAmplitudeList(static_cast<ZelAmplitudeType>(2), nullptr)),
               EX_ILLEGAL_ARGUMENT);
     EXPECT_EQ(log.lines().back(), "I V_4_0: getAmplitudeList Fail - Type is Abnormal");
-}
-
-class DynamicAmplitudeList : public AmplitudeList {
-  protected:
-    void addInformationLists(const std::string& intensities, const std::string& hapticIntensities) {
-        kernel.addNode(kInfo + "intensities", intensities, Access::kReadOnly);
-        kernel.addNode(kInfo + "haptic_intensities", hapticIntensities, Access::kReadOnly);
-    }
-
-    void addDeviceLists(const std::string& intensities, const std::string& hapticIntensities) {
-        kernel.addNode(kLeds + "intensities", intensities, Access::kReadOnly);
-        kernel.addNode(kLeds + "haptic_intensities", hapticIntensities, Access::kReadOnly);
-    }
-};
-
-TEST_F(DynamicAmplitudeList, ComesFromTheDriverAndTheMotorIsNotAsked) {
-    addInformationLists("0,1800, 3600,10000\n", "0,2200\n");
-    const auto extension = makeExtension(motor);
-    EXPECT_EQ(get(*extension, ZelAmplitudeType::DEFAULT), EX_NONE);
-    EXPECT_THAT(list, ElementsAre(0, 1800, 3600, 10000));
-    EXPECT_THAT(
-            log.lines(),
-            ElementsAre("I V_4_0: getAmplitudeList", "I V_4_0: getAmplitudeList amplitude type: 0",
-                        "I HW_API: [isDynamicIntensityNodeExist]new dynamic intensity node exist",
-                        "I V_4_0: Support Dynamic Intensity",
-                        "I V_2_0: [getDynamicIntensityList]isDefaultType: 1",
-                        "I HW_API: >> readNodeAsString "
-                        "node:/vib_info_class/vib_support_info/intensities",
-                        "I HW_API: << readNodeAsString success - length: 18",
-                        "I V_2_0: [getDynamicIntensityList]raw value: 0,1800, 3600,10000",
-                        "I V_2_0: [getDynamicIntensityList]list size: 4"));
-    EXPECT_EQ(get(*extension, ZelAmplitudeType::HAPTIC), EX_NONE);
-    EXPECT_THAT(list, ElementsAre(0, 2200));
-    EXPECT_EQ(log.lines().back(), "I V_2_0: [getDynamicIntensityList]list size: 2");
-    EXPECT_EQ(motor->asked, 0);
-    EXPECT_EQ(motor->askedByMethod, 0);
-}
-
-TEST_F(DynamicAmplitudeList, ComesFromTheDeviceClassWhereTheInformationClassHasNone) {
-    addDeviceLists("0,1\n", "0,2\n");
-    const auto extension = makeExtension();
-    EXPECT_EQ(get(*extension, ZelAmplitudeType::DEFAULT), EX_NONE);
-    EXPECT_THAT(list, ElementsAre(0, 1));
-    EXPECT_EQ(get(*extension, ZelAmplitudeType::HAPTIC), EX_NONE);
-    EXPECT_THAT(list, ElementsAre(0, 2));
-    EXPECT_THAT(log.lines(), Not(Contains("I HW_API: getMotorIndex return motor type >>")));
-}
-
-TEST_F(DynamicAmplitudeList, OfTheInformationClassGoesFirst) {
-    addDeviceLists("0,1\n", "0,2\n");
-    addInformationLists("0,3\n", "0,4\n");
-    const auto extension = makeExtension();
-    EXPECT_EQ(get(*extension, ZelAmplitudeType::DEFAULT), EX_NONE);
-    EXPECT_THAT(list, ElementsAre(0, 3));
-    EXPECT_EQ(get(*extension, ZelAmplitudeType::HAPTIC), EX_NONE);
-    EXPECT_THAT(list, ElementsAre(0, 4));
-}
-
-TEST_F(DynamicAmplitudeList, OneNodeOfTheTwoIsNone) {
-    kernel.addNode(kInfo + "intensities", "0,1\n", Access::kReadOnly);
-    kernel.addNode(kLeds + "haptic_intensities", "0,2\n", Access::kReadOnly);
-    motor->named = 3;
-    const auto extension = makeExtension(motor);
-    EXPECT_EQ(get(*extension, ZelAmplitudeType::DEFAULT), EX_NONE);
-    EXPECT_THAT(list, ElementsAre(0, 1000, 5000, 9000));
-}
-
-TEST_F(DynamicAmplitudeList, WithoutNumbersIsAnIllegalStateAndTheFixedListsAreNotAsked) {
-    motor->named = 3;
-    const auto extension = makeExtension(motor);
-    for (const char* text : {"", "\n", ",,", "none\n"}) {
-        addInformationLists(text, "0,4\n");
-        EXPECT_EQ(get(*extension, ZelAmplitudeType::DEFAULT), EX_ILLEGAL_STATE) << text;
-        EXPECT_THAT(list, IsEmpty());
-        EXPECT_EQ(log.lines().back(), "I V_4_0: Fail - Dynamic Intensity List Read Fail");
-    }
-    EXPECT_EQ(get(*extension, ZelAmplitudeType::HAPTIC), EX_NONE);
-    EXPECT_EQ(motor->asked, 0);
-}
-
-TEST_F(DynamicAmplitudeList, ThatCannotBeReadIsAnIllegalState) {
-    addInformationLists("0,1\n", "0,2\n");
-    const auto extension = makeExtension();
-    kernel.addFault(
-            {.path = kInfo + "haptic_intensities", .operation = Operation::kRead, .error = EIO});
-    EXPECT_EQ(get(*extension, ZelAmplitudeType::HAPTIC), EX_ILLEGAL_STATE);
-    EXPECT_THAT(list, IsEmpty());
-}
-
-// A driver's list that fails after it was read in part.
-class HalfReadList : public core::HwApi {
-  public:
-    bool isDynamicIntensityNodeExist() override { return true; }
-    bool getDynamicIntensityList(bool /*isDefaultType*/, std::vector<int>& list) override {
-        list = {0, 1000};
-        return false;
-    }
-};
-
-TEST_F(DynamicAmplitudeList, ThatFailsHalfWayLeavesTheVectorEmpty) {
-    const auto extension = makeExtension(std::make_shared<HalfReadList>());
-    EXPECT_EQ(get(*extension), EX_ILLEGAL_STATE);
-    EXPECT_THAT(list, IsEmpty());
-    EXPECT_THAT(log.lines(), ElementsAre("I V_4_0: getAmplitudeList",
-                                         "I V_4_0: getAmplitudeList amplitude type: 0",
-                                         "I V_4_0: Support Dynamic Intensity",
-                                         "I V_4_0: Fail - Dynamic Intensity List Read Fail"));
-}
-
-TEST_F(DynamicAmplitudeList, IsThereOnForceFeedbackToo) {
-    removeLedsClass();
-    addForceFeedback();
-    addInformationLists("0,3\n", "0,4\n");
-    EXPECT_EQ(get(*makeExtension()), EX_NONE);
-    EXPECT_THAT(list, ElementsAre(0, 3));
 }
 
 }  // namespace

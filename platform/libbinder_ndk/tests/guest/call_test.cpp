@@ -3,7 +3,6 @@
 // Calls between two processes over the driver.
 #include <dlfcn.h>
 #include <fcntl.h>
-#include <signal.h>
 #include <unistd.h>
 
 #include <thread>
@@ -21,19 +20,10 @@
 namespace binder_test {
 namespace {
 
-// A service of its own for each test, run by the system user.
-std::string name() {
-    return testing::UnitTest::GetInstance()->current_test_info()->name();
-}
-
-Process startService() {
-    return Process(kSystem, [](const Process::Ready& ready) { serve(name(), ready); });
-}
-
 TEST(Calls, TwoWayCallReturnsTheReply) {
     const Process service = startService();
     inProcess(kRoot, [] {
-        const auto binder = find(name());
+        const auto binder = find(testName());
         EXPECT_TRUE(AIBinder_isRemote(binder.get()));
         EXPECT_EQ(41, echo(binder, 41));
         EXPECT_EQ(-1, echo(binder, -1));
@@ -51,7 +41,7 @@ TEST(Symbols, CarryTheVersionNodesOfThePlatform) {
 TEST(Calls, PingAnswersAndTheObjectIsAlive) {
     const Process service = startService();
     inProcess(kRoot, [] {
-        const auto binder = find(name());
+        const auto binder = find(testName());
         EXPECT_EQ(STATUS_OK, AIBinder_ping(binder.get()));
         EXPECT_TRUE(AIBinder_isAlive(binder.get()));
     });
@@ -60,7 +50,7 @@ TEST(Calls, PingAnswersAndTheObjectIsAlive) {
 TEST(Calls, AssociationAsksForTheDescriptor) {
     const Process service = startService();
     inProcess(kRoot, [] {
-        const ndk::SpAIBinder binder(AServiceManager_checkService(name().c_str()));
+        const ndk::SpAIBinder binder(AServiceManager_checkService(testName().c_str()));
         EXPECT_EQ(nullptr, AIBinder_getClass(binder.get()));
         EXPECT_FALSE(AIBinder_associateClass(binder.get(), callbackClass()));
         EXPECT_EQ(nullptr, AIBinder_getClass(binder.get()));
@@ -76,7 +66,7 @@ TEST(Calls, ServiceSeesTheCallersEffectiveUser) {
     const Process service = startService();
     for (const uid_t uid : {kRoot, kSystem, kShell, kApp}) {
         inProcess(uid, [uid] {
-            const auto binder = find(name());
+            const auto binder = find(testName());
             const auto reply = call(binder, kCaller);
             int32_t seenUid = -1;
             int32_t seenPid = -1;
@@ -94,7 +84,7 @@ TEST(Calls, ServiceSeesTheCallersEffectiveUser) {
 TEST(Calls, OnewayCallsArriveInOrder) {
     const Process service = startService();
     inProcess(kRoot, [] {
-        const auto binder = find(name());
+        const auto binder = find(testName());
         for (int32_t i = 0; i < 50; ++i) {
             binder_status_t status = STATUS_UNKNOWN_ERROR;
             const auto reply = call(
@@ -121,7 +111,7 @@ TEST(Calls, WaitingThreadServesNestedCalls) {
     const Process service = startService();
     inProcess(kApp, [] {
         // This process has no serving thread: only the one that waits can answer.
-        const auto binder = find(name());
+        const auto binder = find(testName());
         uid_t callbackUid = 0;
         pid_t callbackPid = 0;
         const auto callback = makeCallback([&](int32_t number) {
@@ -143,7 +133,7 @@ TEST(Calls, WaitingThreadServesNestedCalls) {
 TEST(Calls, NestedCallsGoDeep) {
     const Process service = startService();
     inProcess(kRoot, [] {
-        const auto binder = find(name());
+        const auto binder = find(testName());
         // Callback and service call each other until the number has counted down.
         std::function<int32_t(int32_t)> answer;
         const auto descend = [&](int32_t number) -> int32_t {
@@ -162,7 +152,7 @@ TEST(Calls, NestedCallsGoDeep) {
 TEST(Calls, NestingEndsAtAFixedDepth) {
     const Process service = startService();
     inProcess(kApp, [] {
-        const auto binder = find(name());
+        const auto binder = find(testName());
         int depth = 0;
         binder_status_t status = STATUS_OK;
         std::function<int32_t(int32_t)> answer;
@@ -184,13 +174,13 @@ TEST(Calls, NestingEndsAtAFixedDepth) {
         EXPECT_EQ(32, depth);
         EXPECT_EQ(5, echo(binder, 5));
     });
-    inProcess(kRoot, [] { EXPECT_EQ(7, echo(find(name()), 7)); });
+    inProcess(kRoot, [] { EXPECT_EQ(7, echo(find(testName()), 7)); });
 }
 
 TEST(Calls, CallbackOfAnotherInterfaceRefusesTheCall) {
     const Process service = startService();
     inProcess(kRoot, [] {
-        const auto binder = find(name());
+        const auto binder = find(testName());
         const auto wrong = makeService();
         binder_status_t status = STATUS_OK;
         call(
@@ -207,7 +197,7 @@ TEST(Calls, CallbackOfAnotherInterfaceRefusesTheCall) {
 TEST(Calls, StatusTravelsAloneAndUnchanged) {
     const Process service = startService();
     inProcess(kRoot, [] {
-        const auto binder = find(name());
+        const auto binder = find(testName());
         for (const binder_status_t sent :
              {STATUS_BAD_VALUE, STATUS_PERMISSION_DENIED, STATUS_UNKNOWN_TRANSACTION,
               STATUS_UNEXPECTED_NULL, STATUS_TIMED_OUT}) {
@@ -224,7 +214,7 @@ TEST(Calls, StatusTravelsAloneAndUnchanged) {
 TEST(Calls, StatusWithoutANameBecomesUnknownError) {
     const Process service = startService();
     inProcess(kRoot, [] {
-        const auto binder = find(name());
+        const auto binder = find(testName());
         for (const int32_t sent : {-5, -9999, 7}) {
             binder_status_t status = STATUS_OK;
             call(
@@ -238,7 +228,7 @@ TEST(Calls, StatusWithoutANameBecomesUnknownError) {
 TEST(Calls, UnknownUserCodeIsAnswered) {
     const Process service = startService();
     inProcess(kRoot, [] {
-        const auto binder = find(name());
+        const auto binder = find(testName());
         binder_status_t status = STATUS_OK;
         call(binder, 0x00ffffff, nullptr, &status);
         EXPECT_EQ(STATUS_UNKNOWN_TRANSACTION, status);
@@ -248,7 +238,7 @@ TEST(Calls, UnknownUserCodeIsAnswered) {
 TEST(Calls, ExtensionIsReachedThroughItsParent) {
     const Process service = startService();
     inProcess(kRoot, [] {
-        const auto binder = find(name());
+        const auto binder = find(testName());
         ndk::SpAIBinder extension;
         ASSERT_EQ(STATUS_OK, AIBinder_getExtension(binder.get(), extension.getR()));
         ASSERT_NE(nullptr, extension.get());
@@ -270,7 +260,7 @@ TEST(Calls, ExtensionIsReachedThroughItsParent) {
 TEST(Calls, DumpReachesTheObjectWithItsArguments) {
     const Process service = startService();
     inProcess(kRoot, [] {
-        const auto binder = find(name());
+        const auto binder = find(testName());
         int ends[2];
         ASSERT_EQ(0, pipe(ends));
         const char* args[] = {"-a", "\xc3\xa4", ""};
@@ -286,7 +276,7 @@ TEST(Calls, DumpReachesTheObjectWithItsArguments) {
 TEST(Calls, DescriptorArrivesAsADuplicate) {
     const Process service = startService();
     inProcess(kRoot, [] {
-        const auto binder = find(name());
+        const auto binder = find(testName());
         int ends[2];
         ASSERT_EQ(0, pipe(ends));
         const int32_t before = callForInt(binder, kDescriptors);
@@ -301,54 +291,10 @@ TEST(Calls, DescriptorArrivesAsADuplicate) {
     });
 }
 
-TEST(Calls, OneThreadServesOneCallAfterTheOther) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        const auto binder = find(name());
-        std::vector<std::thread> callers;
-        for (int i = 0; i < 4; ++i) {
-            callers.emplace_back(
-                    [&] { call(binder, kSleep, [](AParcel* to) { AParcel_writeInt32(to, 30); }); });
-        }
-        for (std::thread& caller : callers) caller.join();
-        bool overlaps = true;
-        AParcel_readBool(call(binder, kOverlaps).get(), &overlaps);
-        EXPECT_FALSE(overlaps);
-    });
-}
-
-TEST(Calls, PoolThreadsServeSideBySideAndAreNamed) {
-    const Process service(kSystem, [](const Process::Ready& ready) {
-        const auto binder = makeService();
-        ABinderProcess_setThreadPoolMaxThreadCount(3);
-        ABinderProcess_startThreadPool();
-        ASSERT_EQ(EX_NONE, AServiceManager_addService(binder.get(), name().c_str()));
-        ready();
-        ABinderProcess_joinThreadPool();
-    });
-    inProcess(kRoot, [] {
-        const auto binder = find(name());
-        std::vector<std::thread> callers;
-        for (int i = 0; i < 5; ++i) {
-            callers.emplace_back([&] {
-                call(binder, kSleep, [](AParcel* to) { AParcel_writeInt32(to, 300); });
-            });
-        }
-        for (std::thread& caller : callers) caller.join();
-        bool overlaps = false;
-        AParcel_readBool(call(binder, kOverlaps).get(), &overlaps);
-        EXPECT_TRUE(overlaps);
-
-        std::string thread;
-        ndk::AParcel_readString(call(binder, kThreadName).get(), &thread);
-        EXPECT_THAT(thread, testing::MatchesRegex("Binder:[0-9]+_[1-5]"));
-    });
-}
-
 TEST(Calls, LargeBytesSurvive) {
     const Process service = startService();
     inProcess(kRoot, [] {
-        const auto binder = find(name());
+        const auto binder = find(testName());
         std::vector<uint8_t> sent(200001);
         for (size_t i = 0; i < sent.size(); ++i) sent[i] = static_cast<uint8_t>(i * 7);
         std::vector<uint8_t> received;
@@ -362,7 +308,7 @@ TEST(Calls, LargeBytesSurvive) {
 TEST(Calls, BufferSpaceDoesNotLeak) {
     const Process service = startService();
     inProcess(kRoot, [] {
-        const auto binder = find(name());
+        const auto binder = find(testName());
         const int before = countDescriptors();
         const int32_t serviceBefore = callForInt(binder, kDescriptors);
         for (int32_t i = 0; i < 20000; ++i) ASSERT_EQ(i, echo(binder, i));
@@ -375,90 +321,6 @@ TEST(Calls, BufferSpaceDoesNotLeak) {
         }
         EXPECT_EQ(before, countDescriptors());
         EXPECT_EQ(serviceBefore, callForInt(binder, kDescriptors));
-    });
-}
-
-TEST(Calls, NewProxiesAreFoundByTheSamePointer) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        const ndk::SpAIBinder one(AServiceManager_checkService(name().c_str()));
-        const ndk::SpAIBinder two(AServiceManager_getService(name().c_str()));
-        const ndk::SpAIBinder three(AServiceManager_waitForService(name().c_str()));
-        EXPECT_EQ(one.get(), two.get());
-        EXPECT_EQ(one.get(), three.get());
-        EXPECT_EQ(3, AIBinder_debugGetRefCount(one.get()));
-    });
-}
-
-TEST(Calls, UnknownServiceIsNull) {
-    inProcess(kApp, [] {
-        EXPECT_EQ(nullptr, AServiceManager_checkService("no.such.service"));
-        EXPECT_FALSE(AServiceManager_isDeclared("no.such.service"));
-    });
-}
-
-TEST(Calls, WaitForServiceIsToldOfTheRegistration) {
-    Process waiter(kRoot, [] {
-        // With a pool the notice comes at once.
-        ABinderProcess_startThreadPool();
-        const ndk::SpAIBinder binder(AServiceManager_waitForService(name().c_str()));
-        ASSERT_NE(nullptr, binder.get());
-        ASSERT_TRUE(AIBinder_associateClass(binder.get(), serviceClass()));
-        EXPECT_EQ(3, echo(binder, 3));
-        _exit(testing::Test::HasFailure() ? 1 : 0);
-    });
-    std::this_thread::sleep_for(std::chrono::milliseconds(300));
-    const Process service = startService();
-    EXPECT_EQ(0, waiter.wait());
-}
-
-TEST(Calls, WaitForServiceWorksWithoutThreads) {
-    // The notice of the registration is never fetched, which the driver remarks on.
-    const qvx::test::ExpectBinderComplaints complaints;
-    Process waiter(kRoot, [] {
-        const ndk::SpAIBinder binder(AServiceManager_waitForService(name().c_str()));
-        ASSERT_NE(nullptr, binder.get());
-        ASSERT_TRUE(AIBinder_associateClass(binder.get(), serviceClass()));
-        EXPECT_EQ(4, echo(binder, 4));
-    });
-    std::this_thread::sleep_for(std::chrono::milliseconds(300));
-    const Process service = startService();
-    EXPECT_EQ(0, waiter.wait());
-    std::this_thread::sleep_for(std::chrono::milliseconds(100));
-}
-
-TEST(Calls, ForkedCopyMayDropReferencesButNotCall) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        auto binder = find(name());
-        EXPECT_EQ(0, Process(kRoot, [&] {
-                         binder.set(nullptr);
-                         ABinderProcess_joinThreadPool();  // returns at once
-                     }).wait());
-        EXPECT_EQ(-SIGABRT, Process(kRoot, [&] { AIBinder_ping(binder.get()); }).wait());
-        EXPECT_EQ(8, echo(binder, 8)) << "the parent is not disturbed";
-    });
-}
-
-TEST(Calls, PolledProcessServes) {
-    const Process service(kSystem, [](const Process::Ready& ready) {
-        const auto binder = makeService();
-        ABinderProcess_setThreadPoolMaxThreadCount(0);
-        int fd = -1;
-        ASSERT_EQ(STATUS_OK, ABinderProcess_setupPolling(&fd));
-        ASSERT_EQ(EX_NONE, AServiceManager_addService(binder.get(), name().c_str()));
-        ready();
-        for (;;) {
-            fd_set descriptors;
-            FD_ZERO(&descriptors);
-            FD_SET(fd, &descriptors);
-            if (select(fd + 1, &descriptors, nullptr, nullptr, nullptr) == 1)
-                ABinderProcess_handlePolledCommands();
-        }
-    });
-    inProcess(kRoot, [] {
-        const auto binder = find(name());
-        for (int32_t i = 0; i < 100; ++i) EXPECT_EQ(i, echo(binder, i));
     });
 }
 

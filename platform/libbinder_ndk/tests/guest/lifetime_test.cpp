@@ -16,14 +16,6 @@
 namespace binder_test {
 namespace {
 
-std::string testName() {
-    return testing::UnitTest::GetInstance()->current_test_info()->name();
-}
-
-Process startService() {
-    return Process(kSystem, [](const Process::Ready& ready) { serve(testName(), ready); });
-}
-
 ndk::SpAIBinder giveObject(const ndk::SpAIBinder& service) {
     ndk::SpAIBinder object;
     EXPECT_EQ(STATUS_OK, AParcel_readStrongBinder(call(service, kGiveObject).get(), object.getR()));

@@ -16,8 +16,6 @@
 #include <android/binder_process.h>
 #include <gtest/gtest.h>
 
-#include "platform/libbinder_ndk/tests/guest/process.h"
-
 namespace binder_test {
 namespace {
 
@@ -254,6 +252,14 @@ void serve(const std::string& name, const std::function<void()>& ready) {
     ASSERT_EQ(EX_NONE, AServiceManager_addService(service.get(), name.c_str()));
     ready();
     ABinderProcess_joinThreadPool();
+}
+
+std::string testName() {
+    return testing::UnitTest::GetInstance()->current_test_info()->name();
+}
+
+Process startService() {
+    return Process(kSystem, [](const Process::Ready& ready) { serve(testName(), ready); });
 }
 
 ndk::SpAIBinder find(const std::string& name) {

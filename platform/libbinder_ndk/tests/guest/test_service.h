@@ -11,6 +11,8 @@
 #include <android/binder_auto_utils.h>
 #include <android/binder_ibinder.h>
 
+#include "platform/libbinder_ndk/tests/guest/process.h"
+
 namespace binder_test {
 
 // Methods of test.IService. Replies have no status header; every method returns its results
@@ -56,6 +58,12 @@ ndk::SpAIBinder makeCallback(std::function<int32_t(int32_t)> answer);
 // Registers a service with an extension under `name` with no more threads than the one that calls
 // this, and serves. Does not return.
 void serve(const std::string& name, const std::function<void()>& ready);
+
+// The running test's own name, which its service is registered under.
+std::string testName();
+
+// A process of the system user that serves under that name.
+Process startService();
 
 // Finds and associates the service of that name; a failed expectation and null otherwise.
 ndk::SpAIBinder find(const std::string& name);

@@ -1,0 +1,36 @@
+// SPDX-License-Identifier: Apache-2.0
+//
+// A running service manager for a guest test, and the users of its clients.
+#pragma once
+
+#include <sys/types.h>
+
+#include <gtest/gtest.h>
+
+#include "platform/servicemanager/tests/manager_client.h"
+#include "platform/servicemanager/tests/processes.h"
+
+inline constexpr uid_t kRoot = 0;
+inline constexpr uid_t kSystem = 1000;
+inline constexpr uid_t kApp = 10123;
+inline constexpr uid_t kIsolated = 90001;
+
+// Who may register what in these tests, beside root.
+inline constexpr const char* kRules =
+        "android.hardware.vibrator.IVibrator/default 1000\n"
+        "android.hardware.vibrator.IVibrator/default 1002\n"
+        "test.service 1000\n"
+        "test.service 2000\n"
+        "test.service 9999\n"
+        "test.service 101000\n"
+        "test.own 1000\n"
+        "test.other 1000\n"
+        "test.lazy 1000\n"
+        "test.pack.IFoo/default 1000\n"
+        "test.pack.IFoo/other 1000\n";
+
+class ServiceManagerTest : public ::testing::Test {
+  protected:
+    processes::TemporaryFolder mFolder;
+    processes::Manager mManager{mFolder.path(), kRules};
+};
