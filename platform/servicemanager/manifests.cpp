@@ -27,7 +27,6 @@ struct Entry {
     std::string interface;
     std::string instance;
     std::string apex;  // empty: not updatable
-    fs::path file;     // where it stands
 };
 
 // What was wrong with a file; empty when nothing was.
@@ -139,26 +138,23 @@ Fault readFile(const fs::path& file, const char* type, std::vector<Entry>& entri
         Fault fault = readHal(*hal, found);
         if (!fault.empty()) return fault;
     }
-    for (Entry& entry : found) {
-        entry.file = file;
-        entries.push_back(std::move(entry));
-    }
+    entries.insert(entries.end(), found.begin(), found.end());
     return {};
 }
 
 // The manifest of a partition and its fragments, those that exist, fragments in byte order.
 std::vector<fs::path> filesOf(const fs::path& root, const char* partition) {
-    const fs::path folder = root / partition / "etc" / "vintf";
+    const fs::path directory = root / partition / "etc" / "vintf";
     std::vector<fs::path> fragments;
     std::error_code error;
-    // An absent folder is the usual case: an ended iterator.
-    for (fs::directory_iterator item(folder / "manifest", error), end; !error && item != end;
+    // An absent directory is the usual case: an ended iterator.
+    for (fs::directory_iterator item(directory / "manifest", error), end; !error && item != end;
          item.increment(error)) {
         if (item->path().extension() == ".xml") fragments.push_back(item->path());
     }
     std::sort(fragments.begin(), fragments.end());
-    if (fs::exists(folder / "manifest.xml", error)) {
-        fragments.insert(fragments.begin(), folder / "manifest.xml");
+    if (fs::exists(directory / "manifest.xml", error)) {
+        fragments.insert(fragments.begin(), directory / "manifest.xml");
     }
     return fragments;
 }
@@ -221,22 +217,6 @@ std::optional<std::string> Manifests::updatableViaApex(const std::string& servic
     const std::optional<Entry> entry = findEntry(mRoot, serviceName, mLog);
     if (!entry || entry->apex.empty()) return std::nullopt;
     return entry->apex;
-}
-
-std::optional<fs::path> Manifests::fileDeclaring(const std::string& serviceName) const {
-    const std::optional<Entry> entry = findEntry(mRoot, serviceName, mLog);
-    if (!entry) return std::nullopt;
-    return entry->file;
-}
-
-std::vector<fs::path> Manifests::files() const {
-    std::vector<fs::path> all;
-    for (const ManifestKind* kind : {&kDevice, &kFramework}) {
-        for (const char* partition : kind->partitions) {
-            for (fs::path& file : filesOf(mRoot, partition)) all.push_back(std::move(file));
-        }
-    }
-    return all;
 }
 
 }  // namespace servicemanager

@@ -22,7 +22,7 @@ class Manifests {
   public:
     using Log = std::function<void(const std::string& line)>;
 
-    // `root` is "/" on a phone. `log` takes one line, without its line feed, per faulty file.
+    // `root` is "/" on a phone. `log` takes one line, without its newline, per faulty file.
     Manifests(std::filesystem::path root, Log log);
 
     // True when a manifest lists the service `package.IFoo/instance`, in any version.
@@ -34,12 +34,6 @@ class Manifests {
 
     // The APEX that may update the service `package.IFoo/instance`, when its entry names one.
     std::optional<std::string> updatableViaApex(const std::string& serviceName) const;
-
-    // The file whose entry declares the service `package.IFoo/instance`.
-    std::optional<std::filesystem::path> fileDeclaring(const std::string& serviceName) const;
-
-    // The manifest files there are, faulty ones included, in the order in which they are read.
-    std::vector<std::filesystem::path> files() const;
 
   private:
     std::filesystem::path mRoot;

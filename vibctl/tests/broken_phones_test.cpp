@@ -5,7 +5,7 @@
 #include <gtest/gtest.h>
 
 #include "vibctl/doctor/doctor.h"
-#include "vibctl/tests/fake_root.h"
+#include "vibctl/tests/doctor_root.h"
 
 namespace vibctl {
 namespace {

@@ -11,7 +11,7 @@
 
 #include "vibctl/doctor/driver.h"
 #include "vibctl/doctor/processes.h"
-#include "vibctl/tests/fake_root.h"
+#include "vibctl/tests/doctor_root.h"
 
 namespace vibctl {
 namespace {

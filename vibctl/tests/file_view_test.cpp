@@ -12,7 +12,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include "vibctl/tests/fake_root.h"
+#include "vibctl/tests/doctor_root.h"
 
 namespace vibctl {
 namespace {
@@ -73,7 +73,7 @@ TEST(FileViewTest, DirectoriesMustLetTheUserThrough) {
     const std::vector<Access> accesses = {{"/directory/node", 0 /* O_RDONLY */}};
     const User stranger = {kStranger, kStranger, {}};
     EXPECT_THAT(FileView(root.path()).open(stranger, accesses), ElementsAre(13 /* EACCES */));
-    // Kept open, because somebody else may not look the folder up again.
+    // Kept open, because somebody else may not look the directory up again.
     const FileView view(root.path());
     EXPECT_TRUE(
             asSomebodyElse([&] { return view.open(stranger, accesses) == std::vector<int>{13}; }));

@@ -38,9 +38,9 @@ CommandResult run(const std::string& arguments) {
 
 class VibctlTest : public ::testing::Test {
   protected:
-    VibctlTest() { mFolder.put("vendor/etc/vintf/manifest.xml", kManifest); }
+    VibctlTest() { mRoot.put("/vendor/etc/vintf/manifest.xml", kManifest); }
 
-    processes::TemporaryFolder mFolder;
+    qvx::test::FakeRoot mRoot;
 };
 
 class VibctlWithService : public VibctlTest {
@@ -57,7 +57,7 @@ class VibctlWithService : public VibctlTest {
         return nlohmann::json::parse(result.out).at("callback");
     }
 
-    Manager mManager{mFolder.path(), "android.hardware.vibrator.IVibrator/default 1000\n"};
+    Manager mManager{mRoot.path(), "android.hardware.vibrator.IVibrator/default 1000\n"};
     Server mService{1000, fake::registerServices};
 };
 
@@ -74,7 +74,7 @@ TEST_F(VibctlTest, WithoutAServiceManagerEndsInSecondsWithOneLine) {
 }
 
 TEST_F(VibctlTest, WithoutTheServiceNamesIt) {
-    const Manager manager(mFolder.path());
+    const Manager manager(mRoot.path());
     for (const char* arguments : {"std off", "ext setAmplitude -1"}) {
         const CommandResult result = run(arguments);
         EXPECT_EQ(result.status, 3);

@@ -141,7 +141,7 @@ TEST(DriverLife, TwoDriversDoNotSeeEachOther) {
     EXPECT_EQ(first.journal().size() / 2, second.journal().size() / 2);
 }
 
-TEST(DriverLife, ANodelessPhoneHasAnEmptyClassFolder) {
+TEST(DriverLife, ANodelessPhoneHasAnEmptyClassDirectory) {
     const RunningDriver driver("{}");
     ASSERT_TRUE(driver.isReady()) << driver.errors();
     EXPECT_EQ(driver.inside([] {

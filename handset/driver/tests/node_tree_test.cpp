@@ -20,7 +20,7 @@ class Tree : public testing::Test {
     NodeTree mTree{"/sys/class", kSpecs};
 };
 
-TEST_F(Tree, FoldersAreMadeFromThePaths) {
+TEST_F(Tree, DirectoriesAreMadeFromThePaths) {
     const TreeEntry* root = mTree.find(1);
     ASSERT_NE(root, nullptr);
     EXPECT_EQ(root->children.size(), 2U);

@@ -182,7 +182,7 @@ TEST(Profile, PathsAreSpelledPlainly) {
     }
 }
 
-TEST(Profile, AFileIsNoFolder) {
+TEST(Profile, AFileIsNoDirectory) {
     EXPECT_EQ(refusal(R"({"nodes": {"/sys/class/a": {"mode": "rw"},
                                     "/sys/class/a/b": {"mode": "rw"}}})"),
               "nodes: \"/sys/class/a\" is a file, so \"/sys/class/a/b\" cannot lie below it");
@@ -190,7 +190,7 @@ TEST(Profile, AFileIsNoFolder) {
               "files: \"/efs\" is a file, so \"/efs/a\" cannot lie below it");
 }
 
-TEST(Profile, PlainFilesStayOutOfTheKernelsFolders) {
+TEST(Profile, PlainFilesStayOutOfTheKernelsDirectories) {
     EXPECT_EQ(refusal(R"({"files": {"/proc/a": ""}})"),
               "files[\"/proc/a\"]: plain files do not lie below /proc");
     EXPECT_EQ(refusal(R"({"files": {"/sys/class/a": ""}})"),

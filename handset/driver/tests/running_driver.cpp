@@ -18,7 +18,7 @@ namespace {
 
 using android::base::Result;
 
-constexpr int kStartPatience = 30000;  // milliseconds; emulation under a sanitizer is slow
+constexpr int kStartTimeout = 30000;  // milliseconds; emulation under a sanitizer is slow
 
 }  // namespace
 
@@ -39,7 +39,7 @@ RunningDriver::RunningDriver(const std::string& profile) {
     }
     close(ends[1]);
     pollfd polled{ends[0], POLLIN, 0};
-    mReady = poll(&polled, 1, kStartPatience) > 0 && readAll(ends[0]) == "ready\n";
+    mReady = poll(&polled, 1, kStartTimeout) > 0 && readAll(ends[0]) == "ready\n";
     close(ends[0]);
 }
 

@@ -21,11 +21,11 @@ namespace {
 
 using Lines = std::vector<std::string>;
 
-const std::string kFolder = "/sys/class/leds/vibrator/";
-const std::string kDuration = kFolder + "duration";
-const std::string kKind = kFolder + "motor_type";
-const std::string kWaves = kFolder + "num_waves";
-const std::string kTrigger = kFolder + "trigger";
+const std::string kDirectory = "/sys/class/leds/vibrator/";
+const std::string kDuration = kDirectory + "duration";
+const std::string kKind = kDirectory + "motor_type";
+const std::string kWaves = kDirectory + "num_waves";
+const std::string kTrigger = kDirectory + "trigger";
 
 constexpr const char* kProfile = R"({"nodes": {
         "/sys/class/leds/vibrator/duration": {"mode": "rw", "text": "0\n"},
@@ -137,7 +137,7 @@ TEST_F(SysfsNodes, AttributesAreSysfss) {
         struct stat node {};
         struct stat directory {};
         stat(kDuration.c_str(), &node);
-        stat(kFolder.c_str(), &directory);
+        stat(kDirectory.c_str(), &directory);
         return std::to_string(node.st_mode) + " " + std::to_string(node.st_uid) + " " +
                std::to_string(node.st_gid) + " " + std::to_string(node.st_size) + " " +
                std::to_string(directory.st_mode) + " " + std::to_string(directory.st_uid);
@@ -170,17 +170,19 @@ TEST_F(SysfsNodes, TruncationNeedsThePermissionToWrite) {
 }
 
 TEST_F(SysfsNodes, NothingIsCreatedOrRemoved) {
-    EXPECT_EQ(mDriver.inside([] { return openNode(kFolder + "new", O_WRONLY | O_CREAT); }),
+    EXPECT_EQ(mDriver.inside([] { return openNode(kDirectory + "new", O_WRONLY | O_CREAT); }),
               "EACCES");
-    EXPECT_EQ(mDriver.inside([] { return openNode(kFolder + "new", O_WRONLY); }), "ENOENT");
-    EXPECT_EQ(mDriver.inside([] { return outcome(mkdir((kFolder + "new").c_str(), 0755)); }),
+    EXPECT_EQ(mDriver.inside([] { return openNode(kDirectory + "new", O_WRONLY); }), "ENOENT");
+    EXPECT_EQ(mDriver.inside([] { return outcome(mkdir((kDirectory + "new").c_str(), 0755)); }),
               "EPERM");
     EXPECT_EQ(mDriver.inside([] { return outcome(unlink(kDuration.c_str())); }), "EPERM");
-    EXPECT_EQ(mDriver.inside(
-                      [] { return outcome(mknod((kFolder + "new").c_str(), S_IFREG | 0644, 0)); }),
+    EXPECT_EQ(mDriver.inside([] {
+        return outcome(mknod((kDirectory + "new").c_str(), S_IFREG | 0644, 0));
+    }),
               "EACCES");
-    EXPECT_EQ(mDriver.inside(
-                      [] { return outcome(rename(kDuration.c_str(), (kFolder + "new").c_str())); }),
+    EXPECT_EQ(mDriver.inside([] {
+        return outcome(rename(kDuration.c_str(), (kDirectory + "new").c_str()));
+    }),
               "EPERM");
 }
 
@@ -256,10 +258,10 @@ TEST_F(SysfsNodes, ARequestFindsEveryCloseInTheJournal) {
     }
 }
 
-TEST_F(SysfsNodes, FoldersListTheirNodes) {
+TEST_F(SysfsNodes, DirectoriesListTheirNodes) {
     EXPECT_EQ(mDriver.inside([] {
         std::string names;
-        for (const auto& entry : std::filesystem::directory_iterator(kFolder)) {
+        for (const auto& entry : std::filesystem::directory_iterator(kDirectory)) {
             names += entry.path().filename().string() + " ";
         }
         for (const auto& entry : std::filesystem::directory_iterator("/sys/class")) {

@@ -94,7 +94,7 @@ TEST(AgentCommand, ProgramIsSearchedInTheGivenPath) {
     statusOf(command);
 }
 
-TEST(AgentCommand, RunsInTheGivenFolder) {
+TEST(AgentCommand, RunsInTheGivenDirectory) {
     CommandDescription description = shell("pwd");
     description.directory = "/usr";
     const Command command = started(description);
@@ -152,7 +152,7 @@ TEST(AgentCommand, ProgramThatMayNotRunIsNamed) {
     EXPECT_EQ(failure->what, "cannot run /etc/passwd");
 }
 
-TEST(AgentCommand, MissingFolderIsNamed) {
+TEST(AgentCommand, MissingDirectoryIsNamed) {
     CommandDescription description = shell("true");
     description.directory = "/nowhere";
     Command command;

@@ -48,7 +48,7 @@ class MotorAgreement : public testing::TestWithParam<Agreement>
 {
 };
 
-// Several answers, each with a blank behind it.
+// Several answers, each with a space behind it.
 inline std::string joined(std::initializer_list<std::string> answers)
 {
 	std::string text;

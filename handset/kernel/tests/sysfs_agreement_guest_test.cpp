@@ -225,13 +225,13 @@ std::string bitsWithoutMethods(const std::string &)
 				 writeOnly.put("1"), writeOnly.get(9)});
 }
 
-std::string changedFolders(const std::string &)
+std::string changedDirectories(const std::string &)
 {
-	const std::string folder = "/sys/class/leds/vibrator/new";
+	const std::string directory = "/sys/class/leds/vibrator/new";
 	return joined({outcome(unlink(kReadWrite.c_str())),
 		       outcome(unlink(kMissing.c_str())),
-		       outcome(mkdir(folder.c_str(), 0755)),
-		       outcome(rmdir(folder.c_str())),
+		       outcome(mkdir(directory.c_str(), 0755)),
+		       outcome(rmdir(directory.c_str())),
 		       outcome(rename(kReadWrite.c_str(), kMissing.c_str())),
 		       outcome(symlink("duration", kMissing.c_str())),
 		       outcome(link(kReadWrite.c_str(), kMissing.c_str())),
@@ -301,11 +301,11 @@ const Agreement kCases[] = {
 	 "1000 4096  "},
 	{"PermissionBitsMakeNoMethods", kRoot, bitsWithoutMethods,
 	 "0 0 EIO 0 [137\n] EIO 1 EIO "},
-	{"RootCreatesAndRemovesNothing", kRoot, changedFolders,
+	{"RootCreatesAndRemovesNothing", kRoot, changedDirectories,
 	 "EPERM ENOENT EPERM ENOENT EPERM EPERM EPERM EACCES EPERM "},
-	{"TheSystemUserCreatesAndRemovesNothing", kSystem, changedFolders,
+	{"TheSystemUserCreatesAndRemovesNothing", kSystem, changedDirectories,
 	 "EACCES ENOENT EACCES ENOENT EACCES EACCES EACCES EACCES EACCES "},
-	{"AStrangerCreatesAndRemovesNothing", kStranger, changedFolders,
+	{"AStrangerCreatesAndRemovesNothing", kStranger, changedDirectories,
 	 "EACCES ENOENT EACCES ENOENT EACCES EACCES EPERM EACCES EACCES "},
 };
 

@@ -133,7 +133,7 @@ TEST_F(Phone, AWrongProfileGetsTheDriversLine) {
                       ": line 2, column 3: no valid JSON at \"nodes\"\n");
 }
 
-TEST_F(Phone, AnOutputFolderIsMadeAndFilled) {
+TEST_F(Phone, AnOutputDirectoryIsMadeAndFilled) {
     const TemporaryDir directory;
     ASSERT_EQ(run("phone up --out " + fileIn(directory, "a/b")).status, 0);
     EXPECT_EQ(run("phone down").status, 0);

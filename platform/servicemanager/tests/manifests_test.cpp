@@ -3,13 +3,13 @@
 // What the manifests declare, and how a faulty one is reported.
 #include "platform/servicemanager/manifests.h"
 
-#include <cstdlib>
-#include <fstream>
 #include <string>
 #include <vector>
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+
+#include "tests/support/fake_root.h"
 
 namespace servicemanager {
 namespace {
@@ -17,27 +17,13 @@ namespace {
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 
-// A folder that stands for "/", and the log lines of what reads it.
+// A root, and the log lines of what reads its manifests.
 class ManifestsTest : public ::testing::Test {
   protected:
-    ~ManifestsTest() override { std::filesystem::remove_all(mRoot); }
-
-    void put(const std::string& path, const std::string& text) {
-        const std::filesystem::path file = mRoot / path;
-        std::filesystem::create_directories(file.parent_path());
-        std::ofstream(file) << text;
-    }
-
-    std::string at(const std::string& path) const { return (mRoot / path).string(); }
-
-    static std::filesystem::path makeFolder() {
-        std::string pattern = (std::filesystem::temp_directory_path() / "manifestsXXXXXX").string();
-        return mkdtemp(pattern.data());
-    }
-
-    const std::filesystem::path mRoot = makeFolder();
+    const qvx::test::FakeRoot mRoot;
     std::vector<std::string> mLines;
-    const Manifests mManifests{mRoot, [this](const std::string& line) { mLines.push_back(line); }};
+    const Manifests mManifests{mRoot.path(),
+                               [this](const std::string& line) { mLines.push_back(line); }};
 };
 
 // A device manifest around these <hal> elements.
@@ -66,48 +52,48 @@ TEST_F(ManifestsTest, WithoutAnyFileNothingIsDeclaredAndNothingIsLogged) {
 }
 
 TEST_F(ManifestsTest, DeviceManifestIsRead) {
-    put("vendor/etc/vintf/manifest.xml", device(kVibrator));
+    mRoot.put("/vendor/etc/vintf/manifest.xml", device(kVibrator));
     EXPECT_TRUE(mManifests.isDeclared(kVibratorName));
 }
 
 TEST_F(ManifestsTest, EveryPlaceForADeviceManifestIsRead) {
     for (const char* path :
-         {"vendor/etc/vintf/manifest.xml", "vendor/etc/vintf/manifest/vibrator.xml",
-          "odm/etc/vintf/manifest.xml", "odm/etc/vintf/manifest/vibrator.xml"}) {
-        put(path, device(kVibrator));
+         {"/vendor/etc/vintf/manifest.xml", "/vendor/etc/vintf/manifest/vibrator.xml",
+          "/odm/etc/vintf/manifest.xml", "/odm/etc/vintf/manifest/vibrator.xml"}) {
+        mRoot.put(path, device(kVibrator));
         EXPECT_TRUE(mManifests.isDeclared(kVibratorName)) << path;
-        std::filesystem::remove(mRoot / path);
+        mRoot.remove(path);
         EXPECT_FALSE(mManifests.isDeclared(kVibratorName)) << path;
     }
 }
 
 TEST_F(ManifestsTest, EveryPlaceForAFrameworkManifestIsRead) {
     for (const char* path :
-         {"system/etc/vintf/manifest.xml", "system/etc/vintf/manifest/vibrator.xml",
-          "product/etc/vintf/manifest.xml", "system_ext/etc/vintf/manifest/vibrator.xml"}) {
-        put(path, framework(kVibrator));
+         {"/system/etc/vintf/manifest.xml", "/system/etc/vintf/manifest/vibrator.xml",
+          "/product/etc/vintf/manifest.xml", "/system_ext/etc/vintf/manifest/vibrator.xml"}) {
+        mRoot.put(path, framework(kVibrator));
         EXPECT_TRUE(mManifests.isDeclared(kVibratorName)) << path;
-        std::filesystem::remove(mRoot / path);
+        mRoot.remove(path);
     }
 }
 
 TEST_F(ManifestsTest, FilesAreReadAnewForEveryQuestion) {
     EXPECT_FALSE(mManifests.isDeclared(kVibratorName));
-    put("vendor/etc/vintf/manifest/vibrator.xml", device(kVibrator));
+    mRoot.put("/vendor/etc/vintf/manifest/vibrator.xml", device(kVibrator));
     EXPECT_TRUE(mManifests.isDeclared(kVibratorName));
-    std::filesystem::remove(mRoot / "vendor/etc/vintf/manifest/vibrator.xml");
+    mRoot.remove("/vendor/etc/vintf/manifest/vibrator.xml");
     EXPECT_FALSE(mManifests.isDeclared(kVibratorName));
 }
 
 TEST_F(ManifestsTest, OnlyFilesThatEndInXmlAreFragments) {
-    put("vendor/etc/vintf/manifest/vibrator.xml.bak", device(kVibrator));
-    put("vendor/etc/vintf/manifest/README", "notes");
+    mRoot.put("/vendor/etc/vintf/manifest/vibrator.xml.bak", device(kVibrator));
+    mRoot.put("/vendor/etc/vintf/manifest/README", "notes");
     EXPECT_FALSE(mManifests.isDeclared(kVibratorName));
     EXPECT_THAT(mLines, IsEmpty());
 }
 
 TEST_F(ManifestsTest, PackageInterfaceAndInstanceMustAllMatch) {
-    put("vendor/etc/vintf/manifest.xml", device(kVibrator));
+    mRoot.put("/vendor/etc/vintf/manifest.xml", device(kVibrator));
     EXPECT_FALSE(mManifests.isDeclared("android.hardware.vibrator.IVibrator/other"));
     EXPECT_FALSE(mManifests.isDeclared("android.hardware.vibrator.IVibratorManager/default"));
     EXPECT_FALSE(mManifests.isDeclared("android.hardware.light.IVibrator/default"));
@@ -117,48 +103,49 @@ TEST_F(ManifestsTest, PackageInterfaceAndInstanceMustAllMatch) {
 }
 
 TEST_F(ManifestsTest, VersionOfTheHalDoesNotMatter) {
-    put("vendor/etc/vintf/manifest.xml",
-        device("<hal format=\"aidl\"><name>a.b</name><fqname>IFoo/x</fqname></hal>"
-               "<hal format=\"aidl\"><name>a.b</name><version>7</version>"
-               "<fqname>IFoo/y</fqname></hal>"));
+    mRoot.put("/vendor/etc/vintf/manifest.xml",
+              device("<hal format=\"aidl\"><name>a.b</name><fqname>IFoo/x</fqname></hal>"
+                     "<hal format=\"aidl\"><name>a.b</name><version>7</version>"
+                     "<fqname>IFoo/y</fqname></hal>"));
     EXPECT_TRUE(mManifests.isDeclared("a.b.IFoo/x"));
     EXPECT_TRUE(mManifests.isDeclared("a.b.IFoo/y"));
 }
 
 TEST_F(ManifestsTest, OtherFormatsDeclareNoAidlService) {
-    put("vendor/etc/vintf/manifest.xml",
-        device("<hal format=\"hidl\"><name>a.b</name><fqname>@1.0::IFoo/default</fqname></hal>"
-               "<hal><name>a.b</name><fqname>IFoo/default</fqname></hal>"));
+    mRoot.put(
+            "/vendor/etc/vintf/manifest.xml",
+            device("<hal format=\"hidl\"><name>a.b</name><fqname>@1.0::IFoo/default</fqname></hal>"
+                   "<hal><name>a.b</name><fqname>IFoo/default</fqname></hal>"));
     EXPECT_FALSE(mManifests.isDeclared("a.b.IFoo/default"));
     EXPECT_THAT(mLines, IsEmpty());
 }
 
 TEST_F(ManifestsTest, OlderFormWithInterfaceElementsIsUnderstood) {
-    put("vendor/etc/vintf/manifest.xml",
-        device("<hal format=\"aidl\"><name>a.b</name><interface><name>IFoo</name>"
-               "<instance>left</instance><instance>right</instance></interface></hal>"));
+    mRoot.put("/vendor/etc/vintf/manifest.xml",
+              device("<hal format=\"aidl\"><name>a.b</name><interface><name>IFoo</name>"
+                     "<instance>left</instance><instance>right</instance></interface></hal>"));
     EXPECT_TRUE(mManifests.isDeclared("a.b.IFoo/left"));
     EXPECT_TRUE(mManifests.isDeclared("a.b.IFoo/right"));
     EXPECT_FALSE(mManifests.isDeclared("a.b.IFoo/default"));
 }
 
 TEST_F(ManifestsTest, InstancesAreTheDevicesInByteOrderThenTheFrameworks) {
-    put("vendor/etc/vintf/manifest.xml",
-        device("<hal format=\"aidl\"><name>a.b</name><fqname>IFoo/z</fqname>"
-               "<fqname>IFoo/Z</fqname><fqname>IBar/no</fqname></hal>"));
-    put("odm/etc/vintf/manifest/foo.xml",
-        device("<hal format=\"aidl\"><name>a.b</name><fqname>IFoo/m</fqname></hal>"));
-    put("system/etc/vintf/manifest.xml",
-        framework("<hal format=\"aidl\"><name>a.b</name><fqname>IFoo/a</fqname></hal>"));
+    mRoot.put("/vendor/etc/vintf/manifest.xml",
+              device("<hal format=\"aidl\"><name>a.b</name><fqname>IFoo/z</fqname>"
+                     "<fqname>IFoo/Z</fqname><fqname>IBar/no</fqname></hal>"));
+    mRoot.put("/odm/etc/vintf/manifest/foo.xml",
+              device("<hal format=\"aidl\"><name>a.b</name><fqname>IFoo/m</fqname></hal>"));
+    mRoot.put("/system/etc/vintf/manifest.xml",
+              framework("<hal format=\"aidl\"><name>a.b</name><fqname>IFoo/a</fqname></hal>"));
     EXPECT_THAT(mManifests.instancesOf("a.b.IFoo"), ElementsAre("Z", "m", "z", "a"));
     EXPECT_THAT(mManifests.instancesOf("IFoo"), IsEmpty());
 }
 
 TEST_F(ManifestsTest, ApexIsTheOneItsEntryNames) {
-    put("vendor/etc/vintf/manifest.xml",
-        device("<hal format=\"aidl\" updatable-via-apex=\"com.acme.foo\"><name>a.b</name>"
-               "<fqname>IFoo/x</fqname></hal>"
-               "<hal format=\"aidl\"><name>a.b</name><fqname>IFoo/y</fqname></hal>"));
+    mRoot.put("/vendor/etc/vintf/manifest.xml",
+              device("<hal format=\"aidl\" updatable-via-apex=\"com.acme.foo\"><name>a.b</name>"
+                     "<fqname>IFoo/x</fqname></hal>"
+                     "<hal format=\"aidl\"><name>a.b</name><fqname>IFoo/y</fqname></hal>"));
     EXPECT_EQ(mManifests.updatableViaApex("a.b.IFoo/x"), "com.acme.foo");
     EXPECT_FALSE(mManifests.updatableViaApex("a.b.IFoo/y"));
     EXPECT_FALSE(mManifests.updatableViaApex("a.b.IFoo/z"));
@@ -174,10 +161,10 @@ struct Fault {
 class FaultyManifest : public ManifestsTest, public ::testing::WithParamInterface<Fault> {};
 
 TEST_P(FaultyManifest, IsReportedInOneLineAndPassedOver) {
-    put("vendor/etc/vintf/manifest/bad.xml", GetParam().text);
-    put("vendor/etc/vintf/manifest/good.xml", device(kVibrator));
+    mRoot.put("/vendor/etc/vintf/manifest/bad.xml", GetParam().text);
+    mRoot.put("/vendor/etc/vintf/manifest/good.xml", device(kVibrator));
     EXPECT_TRUE(mManifests.isDeclared(kVibratorName));
-    EXPECT_THAT(mLines, ElementsAre("manifest " + at("vendor/etc/vintf/manifest/bad.xml") +
+    EXPECT_THAT(mLines, ElementsAre("manifest " + mRoot.at("/vendor/etc/vintf/manifest/bad.xml") +
                                     " is passed over: " + GetParam().reason));
 }
 
@@ -220,21 +207,10 @@ constexpr Fault kFaults[] = {
 INSTANTIATE_TEST_SUITE_P(Manifests, FaultyManifest, ::testing::ValuesIn(kFaults),
                          [](const auto& fault) { return fault.param.name; });
 
-TEST_F(ManifestsTest, TellsWhichFileDeclaresAService) {
-    put("vendor/etc/vintf/manifest.xml", device(""));
-    put("vendor/etc/vintf/manifest/v.xml", device(kVibrator));
-    put("system/etc/vintf/manifest/s.xml", framework(""));
-    EXPECT_EQ(mManifests.fileDeclaring(kVibratorName), at("vendor/etc/vintf/manifest/v.xml"));
-    EXPECT_EQ(mManifests.fileDeclaring("a.b.IFoo/x"), std::nullopt);
-    EXPECT_THAT(mManifests.files(), ElementsAre(at("vendor/etc/vintf/manifest.xml"),
-                                                at("vendor/etc/vintf/manifest/v.xml"),
-                                                at("system/etc/vintf/manifest/s.xml")));
-}
-
 TEST_F(ManifestsTest, AFaultDropsTheWholeFileNotItsBeginning) {
-    put("vendor/etc/vintf/manifest.xml",
-        device("<hal format=\"aidl\"><name>a.b</name><fqname>IFoo/x</fqname></hal>"
-               "<hal format=\"aidl\"/>"));
+    mRoot.put("/vendor/etc/vintf/manifest.xml",
+              device("<hal format=\"aidl\"><name>a.b</name><fqname>IFoo/x</fqname></hal>"
+                     "<hal format=\"aidl\"/>"));
     EXPECT_FALSE(mManifests.isDeclared("a.b.IFoo/x"));
     EXPECT_EQ(mLines.size(), 1u);
 }

@@ -12,8 +12,6 @@
 #include <chrono>
 #include <csignal>
 #include <cstdio>
-#include <cstdlib>
-#include <fstream>
 #include <thread>
 
 #include <android-base/file.h>
@@ -21,6 +19,7 @@
 #include <gtest/gtest.h>
 
 #include "handset/common/raw_binder.h"
+#include "tests/support/fake_root.h"
 #include "tests/support/kernel_log.h"
 
 namespace processes {
@@ -57,23 +56,6 @@ std::string contentOf(const fs::path& file) {
 }
 
 }  // namespace
-
-TemporaryFolder::TemporaryFolder() {
-    std::string pattern = (fs::temp_directory_path() / "servicemanagerXXXXXX").string();
-    mPath = mkdtemp(pattern.data());
-    // Clients of any user write logs of their own here.
-    fs::permissions(mPath, fs::perms::all);
-}
-
-TemporaryFolder::~TemporaryFolder() {
-    fs::remove_all(mPath);
-}
-
-void TemporaryFolder::put(const std::string& relativePath, const std::string& text) const {
-    const fs::path file = mPath / relativePath;
-    fs::create_directories(file.parent_path());
-    std::ofstream(file) << text;
-}
 
 Manager::Manager(const fs::path& root, const std::string& rules)
     : mLog(root / "servicemanager.log"), mPid(-1) {
@@ -115,8 +97,8 @@ std::string Manager::log() const {
 }
 
 int runManager(uid_t uid, std::string& output) {
-    const TemporaryFolder folder;
-    const fs::path log = folder.path() / "log";
+    const qvx::test::FakeRoot root;
+    const std::string log = root.at("/log");
     const pid_t pid = forkQuietly();
     if (pid == 0) {
         const int descriptor = open(log.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0666);

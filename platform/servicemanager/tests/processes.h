@@ -12,23 +12,6 @@
 
 namespace processes {
 
-// A folder of its own below the temporary folder, removed with all in it at the end.
-class TemporaryFolder {
-  public:
-    TemporaryFolder();
-    ~TemporaryFolder();
-    TemporaryFolder(const TemporaryFolder&) = delete;
-    TemporaryFolder& operator=(const TemporaryFolder&) = delete;
-
-    const std::filesystem::path& path() const { return mPath; }
-
-    // Writes a file, and the folders above it.
-    void put(const std::string& relativePath, const std::string& text) const;
-
-  private:
-    std::filesystem::path mPath;
-};
-
 // A running service manager; ended with the object.
 class Manager {
   public:

@@ -27,10 +27,10 @@ TEST(Program, HelpSucceeds) {
 
 TEST(Program, WrongUsageGetsOneLineAndStatus2) {
     EXPECT_EQ(run("--root").status, 2);
-    const CommandResult folder = run("--root /no/such/folder");
-    EXPECT_EQ(folder.status, 2);
-    EXPECT_EQ(folder.out,
-              "servicemanager: --root: Directory does not exist: /no/such/folder; usage: "
+    const CommandResult missing = run("--root /no/such/directory");
+    EXPECT_EQ(missing.status, 2);
+    EXPECT_EQ(missing.out,
+              "servicemanager: --root: Directory does not exist: /no/such/directory; usage: "
               "servicemanager [--root DIR] [--rules FILE] [--ready-fd N]\n");
     const CommandResult word = run("now");
     EXPECT_EQ(word.status, 2);

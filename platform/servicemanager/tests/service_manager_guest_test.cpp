@@ -49,8 +49,8 @@ TEST_F(ContextManager, ASecondOneSaysWhyAndEndsWithStatus1) {
 
 TEST(AnotherUsersContextManager, SaysWhyAndEndsWithStatus1) {
     {
-        const processes::TemporaryFolder folder;
-        const processes::Manager first(folder.path());
+        const qvx::test::FakeRoot root;
+        const processes::Manager first(root.path());
     }
     const qvx::test::ExpectBinderComplaints expected;
     std::string output;
@@ -143,7 +143,7 @@ TEST_F(AddService, WantsAVintfObjectDeclared) {
         EXPECT_EQ(add("test.pack.IFoo/default", makeObject()), EX_NONE);
     });
     EXPECT_THAT(mManager.log(), HasSubstr("a VINTF-stable service must be declared in a manifest"));
-    mFolder.put("vendor/etc/vintf/manifest/test.xml", kManifest);
+    mRoot.put("/vendor/etc/vintf/manifest/test.xml", kManifest);
     as(kSystem, [] {
         EXPECT_EQ(add("test.pack.IFoo/default", makeVintfObject()), EX_NONE);
         EXPECT_EQ(add("test.pack.IFoo/other", makeVintfObject()), EX_ILLEGAL_ARGUMENT);
@@ -151,13 +151,12 @@ TEST_F(AddService, WantsAVintfObjectDeclared) {
 }
 
 TEST_F(AddService, NamesAFaultyManifestInTheLog) {
-    mFolder.put("vendor/etc/vintf/manifest/test.xml", "<manifest");
+    mRoot.put("/vendor/etc/vintf/manifest/test.xml", "<manifest");
     as(kSystem,
        [] { EXPECT_EQ(add("test.pack.IFoo/default", makeVintfObject()), EX_ILLEGAL_ARGUMENT); });
-    EXPECT_THAT(mManager.log(),
-                HasSubstr("servicemanager: manifest " +
-                          (mFolder.path() / "vendor/etc/vintf/manifest/test.xml").string() +
-                          " is passed over: line 1: "));
+    EXPECT_THAT(mManager.log(), HasSubstr("servicemanager: manifest " +
+                                          mRoot.at("/vendor/etc/vintf/manifest/test.xml") +
+                                          " is passed over: line 1: "));
 }
 
 TEST_F(AddService, ReplacesAnOlderOneOfTheName) {
@@ -226,7 +225,7 @@ TEST_F(ListServices, GivesNamesInByteOrderWhosePriorityMatches) {
 using Declarations = ServiceManagerTest;
 
 TEST_F(Declarations, ComeFromTheManifests) {
-    mFolder.put("odm/etc/vintf/manifest.xml", kManifest);
+    mRoot.put("/odm/etc/vintf/manifest.xml", kManifest);
     as(kApp, [] {
         bool declared = false;
         EXPECT_EQ(isDeclared("test.pack.IFoo/default", declared), EX_NONE);

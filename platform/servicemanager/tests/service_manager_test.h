@@ -9,6 +9,7 @@
 
 #include "platform/servicemanager/tests/manager_client.h"
 #include "platform/servicemanager/tests/processes.h"
+#include "tests/support/fake_root.h"
 
 inline constexpr uid_t kRoot = 0;
 inline constexpr uid_t kSystem = 1000;
@@ -31,6 +32,6 @@ inline constexpr const char* kRules =
 
 class ServiceManagerTest : public ::testing::Test {
   protected:
-    processes::TemporaryFolder mFolder;
-    processes::Manager mManager{mFolder.path(), kRules};
+    qvx::test::FakeRoot mRoot;
+    processes::Manager mManager{mRoot.path(), kRules};
 };

@@ -12,6 +12,7 @@
 
 #include "handset/common/raw_binder.h"
 #include "platform/servicemanager/tests/processes.h"
+#include "tests/support/fake_root.h"
 
 namespace {
 
@@ -47,8 +48,8 @@ class ServiceManagerWire : public ::testing::Test {
                 << "EX_NULL_POINTER, no message";
     }
 
-    processes::TemporaryFolder mFolder;
-    processes::Manager mManager{mFolder.path()};
+    qvx::test::FakeRoot mRoot;
+    processes::Manager mManager{mRoot.path()};
     RawBinder mBinder;
 };
 

@@ -30,7 +30,7 @@ TEST(Constants, NodePathsAreTheDrivers) {
     EXPECT_STREQ(INPUTFF_USE_KYP_INDEX, "/sys/class/qvx_vib_inputff/control/use_kyp_index");
 }
 
-TEST(Constants, FolderCommandsEndInALineFeedAndNothingElse) {
+TEST(Constants, FoldableCommandsEndInANewlineAndNothingElse) {
     EXPECT_EQ(std::string(FOLDER_OPEN), "FOLDER_OPEN\n");
     EXPECT_EQ(std::string(FOLDER_CLOSE), "FOLDER_CLOSE\n");
     EXPECT_EQ(std::string(FOLDER_TENT_OPEN), "FOLDER_TENT_OPEN\n");

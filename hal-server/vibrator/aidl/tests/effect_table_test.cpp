@@ -26,7 +26,7 @@ constexpr char kDoubleClickEnd[] =
         "I HW_API: End perform on another thread - performEffect_DOUBLE_CLICK";
 
 struct Phone {
-    const char* folder;
+    const char* directory;
     const char* effectNode;  // beside "intensity"; null: no further node
     const char* startNode;   // written last when the motor is started
 };
@@ -127,9 +127,9 @@ class EffectCell : public ServiceTest, public ::testing::WithParamInterface<Cell
   protected:
     EffectCell() {
         const Phone& phone = GetParam().phone;
-        folder == kLegacy ? addLegacyClass() : addLedsClass();
-        kernel.addNode(folder + "intensity");
-        if (phone.effectNode != nullptr) kernel.addNode(folder + phone.effectNode);
+        directory == kLegacy ? addLegacyClass() : addLedsClass();
+        kernel.addNode(directory + "intensity");
+        if (phone.effectNode != nullptr) kernel.addNode(directory + phone.effectNode);
     }
 
     // Plays the cell's effect, to the end of its double click.
@@ -145,21 +145,23 @@ class EffectCell : public ServiceTest, public ::testing::WithParamInterface<Cell
     }
 
     void failWrites(const std::string& leaf) {
-        kernel.addFault(
-                {.path = folder + leaf, .operation = Operation::kWrite, .error = EIO, .times = 0});
+        kernel.addFault({.path = directory + leaf,
+                         .operation = Operation::kWrite,
+                         .error = EIO,
+                         .times = 0});
     }
 
     // The writes that were taken, without the directory that all of them must be in.
     std::vector<std::string> leafWrites() const {
         std::vector<std::string> leaves;
         for (const std::string& write : kernel.writes()) {
-            EXPECT_EQ(write.substr(0, folder.size()), folder);
-            leaves.push_back(write.substr(folder.size()));
+            EXPECT_EQ(write.substr(0, directory.size()), directory);
+            leaves.push_back(write.substr(directory.size()));
         }
         return leaves;
     }
 
-    const std::string folder = GetParam().phone.folder;
+    const std::string directory = GetParam().phone.directory;
 };
 
 TEST_P(EffectCell, WritesItsNodesInOrderAndReportsItsLength) {
@@ -173,13 +175,13 @@ TEST_P(EffectCell, OpensWritesAndClosesEachNodeAndAsksTheDriverNothingElse) {
     EXPECT_TRUE(play(6700));
     std::vector<std::string> expected;
     for (const std::string& write : GetParam().writes) {
-        const std::string path = folder + write.substr(0, write.find(' '));
+        const std::string path = directory + write.substr(0, write.find(' '));
         expected.push_back("open " + path + " O_RDWR");
-        expected.push_back("write " + folder + write);
+        expected.push_back("write " + directory + write);
         expected.push_back("close " + path);
     }
     if (GetParam().way == Way::kDoubleClick) {
-        const int secondPulse = folder == kLeds ? 9 : 3;  // calls
+        const int secondPulse = directory == kLeds ? 9 : 3;  // calls
         expected.insert(expected.end() - secondPulse, "sleep 70 ms");
     }
     EXPECT_THAT(kernel.calls(), ElementsAreArray(expected));

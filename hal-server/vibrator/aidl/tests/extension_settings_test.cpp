@@ -205,7 +205,7 @@ struct Posture {
     const char* size;  // with it
 };
 
-ndk::ScopedAStatus setFolder(Vibrator& extension, int32_t number) {
+ndk::ScopedAStatus setFoldable(Vibrator& extension, int32_t number) {
     return extension.setFolderStatus(static_cast<ZelFolderStatus>(number));
 }
 
@@ -214,8 +214,8 @@ ndk::ScopedAStatus setTentMode(Vibrator& extension, int32_t number) {
 }
 
 const Posture kPostures[] = {
-        {"FolderOpen", setFolder, 0, "setFolderStatus", "FOLDER_OPEN", "12"},
-        {"FolderClosed", setFolder, 1, "setFolderStatus", "FOLDER_CLOSE", "13"},
+        {"FolderOpen", setFoldable, 0, "setFolderStatus", "FOLDER_OPEN", "12"},
+        {"FolderClosed", setFoldable, 1, "setFolderStatus", "FOLDER_CLOSE", "13"},
         {"TentModeOpen", setTentMode, 0, "setFolderTentModeStatus", "FOLDER_TENT_OPEN", "17"},
         {"TentModeClosed", setTentMode, 1, "setFolderTentModeStatus", "FOLDER_TENT_CLOSE", "18"},
 };

@@ -42,8 +42,8 @@ class ExtensionTest : public ServiceTest {
         return extension;
     }
 
-    void addNodes(const std::string& folder, const std::vector<const char*>& leaves) {
-        for (const char* leaf : leaves) kernel.addNode(folder + leaf);
+    void addNodes(const std::string& directory, const std::vector<const char*>& leaves) {
+        for (const char* leaf : leaves) kernel.addNode(directory + leaf);
     }
 
     // Takes addLedsClass() back, for phones of another class or of none.

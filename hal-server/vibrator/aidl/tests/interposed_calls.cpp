@@ -91,13 +91,13 @@ int open64(const char* path, int flags, ...) {
     return fake::openVia("open64", path, flags, mode);
 }
 
-int openat(int folder, const char* path, int flags, ...) {
+int openat(int directory, const char* path, int flags, ...) {
     va_list arguments;
     va_start(arguments, flags);
     const mode_t mode = fake::modeArgument(flags, arguments);
     va_end(arguments);
     if (FakeKernel* const kernel = kernelFor(path)) return kernel->open(path, flags);
-    return next<int(int, const char*, int, ...)>("openat")(folder, path, flags, mode);
+    return next<int(int, const char*, int, ...)>("openat")(directory, path, flags, mode);
 }
 
 FILE* fopen(const char* path, const char* mode) {

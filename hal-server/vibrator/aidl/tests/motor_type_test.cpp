@@ -360,10 +360,10 @@ class MotorIndexGuess : public ServiceTest,
 
 TEST_P(MotorIndexGuess, FollowsFromTheNodes) {
     const auto& [isLeds, nodes] = GetParam();
-    const std::string folder = isLeds ? kLeds : kLegacy;
+    const std::string directory = isLeds ? kLeds : kLegacy;
     isLeds ? addLedsClass() : addLegacyClass();
-    for (const char* leaf : nodes.leaves) kernel.addNode(folder + leaf);
-    if (nodes.motorType != nullptr) kernel.addNode(folder + "motor_type", nodes.motorType);
+    for (const char* leaf : nodes.leaves) kernel.addNode(directory + leaf);
+    if (nodes.motorType != nullptr) kernel.addNode(directory + "motor_type", nodes.motorType);
     const auto hwApi = makeHwApi();
     EXPECT_EQ(hwApi->getMotorIndexbyMethod(), nodes.index);
     EXPECT_EQ(log.lines().back(),

@@ -276,7 +276,7 @@ class Compatibility(CompilerCase):
 
 
 class FrozenExtension(CompilerCase):
-    """The maker's interface as it was promised to devices."""
+    """The vendor's interface as it was promised to devices."""
 
     def test_sources_are_what_was_frozen(self):
         sources = map(str, sorted(EXTENSION.glob("vendor/quorvan/hardware/vibrator/*.aidl")))

@@ -81,10 +81,10 @@ bool hasLetter(const LetterQuery& query) {
 // Whether one of the words between single spaces is exactly `word`.
 bool holdsWord(std::string_view text, std::string_view word) {
     for (;;) {
-        const size_t blank = text.find(' ');
-        if (text.substr(0, blank) == word) return true;
-        if (blank == std::string_view::npos) return false;
-        text.remove_prefix(blank + 1);
+        const size_t space = text.find(' ');
+        if (text.substr(0, space) == word) return true;
+        if (space == std::string_view::npos) return false;
+        text.remove_prefix(space + 1);
     }
 }
 

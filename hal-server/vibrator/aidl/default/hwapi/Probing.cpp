@@ -76,9 +76,9 @@ const SysfsNode kSysfsNodes[] = {
 };
 // clang-format on
 
-void setSysfsPaths(const std::string& deviceFolder) {
+void setSysfsPaths(const std::string& deviceDirectory) {
     for (const SysfsNode& node : kSysfsNodes) {
-        node.path = deviceFolder + node.leaf;
+        node.path = deviceDirectory + node.leaf;
     }
 }
 

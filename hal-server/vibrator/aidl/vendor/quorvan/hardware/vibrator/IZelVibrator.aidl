@@ -13,7 +13,7 @@ import vendor.quorvan.hardware.vibrator.ZelHybridHapticEnginePacket;
 import vendor.quorvan.hardware.vibrator.ZelPlaybackPacket;
 
 /**
- * The maker's own requests to the vibration motor, beside those of the platform's IVibrator. This
+ * The vendor's own requests to the vibration motor, beside those of the platform's IVibrator. This
  * is version 4 of the interface.
  *
  * It has no name at the service manager: a client gets the platform's IVibrator/default and asks
@@ -82,14 +82,14 @@ interface IZelVibrator {
     /**
      * Tells whether setFolderStatus works: whether the text of the node event_cmd holds at least
      * one of the letters D, F, L, O. The letters are looked for one by one, not as a word, and the
-     * text's last character is not looked at (it is the driver's line feed).
+     * text's last character is not looked at (it is the driver's newline).
      *
      * @return false for a refused caller, and when the node cannot be read.
      */
     boolean supportsFolderStatusSetting();
 
     /**
-     * Tells whether the motor plays the maker's enhanced haptic patterns. Feature word
+     * Tells whether the motor plays the vendor's enhanced haptic patterns. Feature word
      * ENHANCED_HAPTIC_ENGINE, else the motor type LINEAR_1040, else, without a motor type node, the
      * node haptic_engine.
      *
@@ -127,8 +127,8 @@ interface IZelVibrator {
     /**
      * Tells the driver whether the foldable device is open or closed. Starts no vibration.
      *
-     * @param status OPEN sends the text FOLDER_OPEN, CLOSED sends FOLDER_CLOSE, each with a line
-     *     feed, to the node event_cmd.
+     * @param status OPEN sends the text FOLDER_OPEN, CLOSED sends FOLDER_CLOSE, each with a
+     *     newline, to the node event_cmd.
      * @throws EX_ILLEGAL_ARGUMENT when the number is not one of ZelFolderStatus.
      * @throws EX_ILLEGAL_STATE when the driver did not take the whole text.
      */
@@ -276,7 +276,7 @@ interface IZelVibrator {
      * vibration.
      *
      * @param status OPEN sends the text FOLDER_TENT_OPEN, CLOSED sends FOLDER_TENT_CLOSE, each with
-     *     a line feed, to the node event_cmd.
+     *     a newline, to the node event_cmd.
      * @throws EX_ILLEGAL_ARGUMENT when the number is not one of ZelFolderTentModeStatus.
      * @throws EX_ILLEGAL_STATE when the driver did not take the whole text.
      */
@@ -292,8 +292,8 @@ interface IZelVibrator {
 
     /**
      * Tells whether the driver's functions node lists a word. Unlike the supports methods it
-     * compares whole words, parted by single blanks, letter by letter, within the node's first 511
-     * bytes.
+     * compares whole words, separated by single spaces, letter by letter, within the node's first
+     * 511 bytes.
      *
      * @param featureName the word, for example HAPTIC_ENGINE; not empty.
      * @return true when the word is listed.

@@ -4,8 +4,8 @@ package vendor.quorvan.hardware.vibrator;
 /**
  * One packet of IZelVibrator.performHapticEngine.
  *
- * The four numbers go to the driver as decimal text in the order of the fields, each with a blank
- * behind it, and none of them is checked. A number and its blank are cut to 9 characters together:
+ * The four numbers go to the driver as decimal text in the order of the fields, each with a space
+ * behind it, and none of them is checked. A number and its space are cut to 9 characters together:
  * one of more than 8 characters, its sign included, runs into the next.
  */
 @VintfStability

@@ -7,7 +7,7 @@ import vendor.quorvan.hardware.vibrator.ZelHybridHapticEnginePacketType;
  * One packet of IZelVibrator.performHybridHapticEngine.
  *
  * Time, intensity, value and frequency go to the driver as decimal text in the order of the fields,
- * each with a blank behind it, and none of them is checked. A number and its blank are cut to 9
+ * each with a space behind it, and none of them is checked. A number and its space are cut to 9
  * characters together: one of more than 8 characters, its sign and prefix included, runs into the
  * next.
  */

@@ -1,10 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "vibctl/tests/fake_root.h"
+//
+// A phone's root as "vibctl doctor" looks at it.
+#include "vibctl/tests/doctor_root.h"
 
-#include <sys/stat.h>
-
-#include <cstdlib>
-#include <fstream>
+#include <filesystem>
 
 #include <android-base/file.h>
 #include <gtest/gtest.h>
@@ -13,38 +12,12 @@ namespace fake {
 
 namespace fs = std::filesystem;
 
-Root::Root() {
-    std::string pattern = (fs::temp_directory_path() / "rootXXXXXX").string();
-    mPath = mkdtemp(pattern.data());
-    chmod("", 0755);
-}
-
-Root::~Root() {
-    std::error_code ignored;
-    fs::remove_all(mPath, ignored);
-}
-
-void Root::put(const std::string& path, const std::string& text) const {
-    const fs::path file = at(path);
-    fs::create_directories(file.parent_path());
-    std::ofstream(file, std::ios::binary) << text;
-    chmod(path, 0666);
-}
-
-void Root::remove(const std::string& path) const {
-    fs::remove_all(at(path));
-}
-
 void Root::edit(const std::string& path, const std::string& from, const std::string& to) const {
     std::string text;
     EXPECT_TRUE(android::base::ReadFileToString(at(path), &text)) << path;
     const size_t where = text.find(from);
     ASSERT_NE(where, std::string::npos) << from;
     put(path, text.replace(where, from.size(), to));
-}
-
-void Root::chmod(const std::string& path, mode_t mode) const {
-    ::chmod(at(path).c_str(), mode);
 }
 
 void Root::putNodes(const std::string& directory, const std::vector<std::string>& names) const {
@@ -61,7 +34,7 @@ void Root::putProcess(pid_t pid, const std::vector<std::string>& words, uid_t ui
     for (const std::string& word : words) line += word + '\0';
     put(directory + "/cmdline", line);
     fs::create_symlink(words.at(0), at(directory + "/exe"));
-    fs::create_directory_symlink(mPath, at(directory + "/root"));
+    fs::create_directory_symlink(path(), at(directory + "/root"));
 }
 
 void Root::putState(pid_t pid, char state, int started) const {
