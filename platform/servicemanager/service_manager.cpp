@@ -12,6 +12,9 @@
 #include <cstdio>
 #include <utility>
 
+#include <aidl/android/os/BpClientCallback.h>
+#include <aidl/android/os/BpServiceCallback.h>
+#include <aidl/android/os/IServiceManager.h>
 #include <android/binder_parcel_utils.h>
 #include <android/binder_status.h>
 #include <binder_context_manager.h>
@@ -21,15 +24,14 @@ namespace servicemanager {
 
 namespace {
 
+using aidl::android::os::BpClientCallback;
+using aidl::android::os::BpServiceCallback;
+using aidl::android::os::IClientCallback;
+using aidl::android::os::IServiceCallback;
+using aidl::android::os::IServiceManager;
+
 // What it registers itself as.
 constexpr const char* kOwnName = "manager";
-
-// Bit of the dump priorities under which the service manager lists itself.
-constexpr int32_t kDumpPriorityDefault = 8;
-
-// The one method of android.os.IServiceCallback, and the one of android.os.IClientCallback.
-constexpr transaction_code_t kOnRegistration = FIRST_CALL_TRANSACTION;
-constexpr transaction_code_t kOnClients = FIRST_CALL_TRANSACTION;
 
 void log(const std::string& line) {
     fmt::print(stderr, "servicemanager: {}\n", line);
@@ -48,25 +50,6 @@ Caller callerOfThisTransaction() {
 // Takes over one strong reference.
 Object adopt(AIBinder* binder) {
     return binder == nullptr ? nullptr : Object(binder, AIBinder_decStrong);
-}
-
-// Callbacks are called from here and never served here, so their classes have no behaviour.
-const AIBinder_Class* defineCallbackClass(const char* descriptor) {
-    return AIBinder_Class_define(
-            descriptor, [](void*) -> void* { return nullptr; }, [](void*) {},
-            [](AIBinder*, transaction_code_t, const AParcel*, AParcel*) -> binder_status_t {
-                return STATUS_UNKNOWN_TRANSACTION;
-            });
-}
-
-const AIBinder_Class* registrationCallbackClass() {
-    static const AIBinder_Class* const clazz = defineCallbackClass("android.os.IServiceCallback");
-    return clazz;
-}
-
-const AIBinder_Class* clientCallbackClass() {
-    static const AIBinder_Class* const clazz = defineCallbackClass("android.os.IClientCallback");
-    return clazz;
 }
 
 binder_status_t read(const AParcel* in, std::string* value) {
@@ -105,10 +88,6 @@ binder_status_t write(AParcel* out, const Object& value) {
     return AParcel_writeStrongBinder(out, value.get());
 }
 
-binder_status_t write(AParcel* out, const std::string& value) {
-    return ndk::AParcel_writeString(out, value);
-}
-
 binder_status_t write(AParcel* out, const std::vector<std::string>& value) {
     return ndk::AParcel_writeVector(out, value);
 }
@@ -117,27 +96,8 @@ binder_status_t write(AParcel* out, const std::optional<std::string>& value) {
     return ndk::AParcel_writeString(out, value);
 }
 
-// A parcelable array element: presence, size (counting itself), name, pid.
-binder_status_t write(AParcel* out, const ServiceDebugInfo& value) {
-    binder_status_t status = AParcel_writeInt32(out, 1);
-    const int32_t start = AParcel_getDataPosition(out);
-    if (status == STATUS_OK) status = AParcel_writeInt32(out, 0);
-    if (status == STATUS_OK) status = ndk::AParcel_writeString(out, value.name);
-    if (status == STATUS_OK) status = AParcel_writeInt32(out, value.pid);
-    if (status != STATUS_OK) return status;
-    const int32_t end = AParcel_getDataPosition(out);
-    status = AParcel_setDataPosition(out, start);
-    if (status == STATUS_OK) status = AParcel_writeInt32(out, end - start);
-    if (status == STATUS_OK) status = AParcel_setDataPosition(out, end);
-    return status;
-}
-
-binder_status_t write(AParcel* out, const std::vector<ServiceDebugInfo>& values) {
-    binder_status_t status = AParcel_writeInt32(out, static_cast<int32_t>(values.size()));
-    for (const ServiceDebugInfo& value : values) {
-        if (status == STATUS_OK) status = write(out, value);
-    }
-    return status;
+binder_status_t write(AParcel* out, const std::vector<aidl::android::os::ServiceDebugInfo>& value) {
+    return ndk::AParcel_writeVector(out, value);
 }
 
 binder_status_t writeException(AParcel* out, binder_exception_t exception) {
@@ -152,30 +112,25 @@ binder_status_t reply(AParcel* out, const Value& value) {
     return status == STATUS_OK ? write(out, value) : status;
 }
 
-// Calls a callback without waiting for it.
-template <typename... Value>
-binder_status_t callOneway(const Object& callback, transaction_code_t code,
-                           const Value&... values) {
-    ndk::ScopedAParcel in;
-    ndk::ScopedAParcel out;
-    binder_status_t status = AIBinder_prepareTransaction(callback.get(), in.getR());
-    if (status != STATUS_OK) return status;
-    static_cast<void>((((status = write(in.get(), values)) == STATUS_OK) && ...));
-    if (status != STATUS_OK) return status;
-    return AIBinder_transact(callback.get(), code, in.getR(), out.getR(), FLAG_ONEWAY);
+// What the generated code takes: a reference of its own.
+ndk::SpAIBinder binderOf(const Object& object) {
+    AIBinder_incStrong(object.get());
+    return ndk::SpAIBinder(object.get());
 }
 
-// Calls each of the callbacks for a name; one line on the log for all that fail.
-template <typename... Value>
-void callEachOneway(const std::vector<Object>& callbacks, const std::string& name,
-                    transaction_code_t code, const Value&... values) {
+// Calls each of the callbacks for a name, which are proxies of this type, without waiting for them;
+// one line on the log for all that fail.
+template <typename Proxy, typename Method, typename... Value>
+void callEach(const std::vector<Object>& callbacks, const std::string& name, Method method,
+              const Value&... values) {
     size_t failures = 0;
     binder_status_t last = STATUS_OK;
     for (const Object& callback : callbacks) {
-        const binder_status_t status = callOneway(callback, code, values...);
-        if (status == STATUS_OK) continue;
+        const auto proxy = ndk::SharedRefBase::make<Proxy>(binderOf(callback));
+        const ndk::ScopedAStatus status = ((*proxy).*method)(values...);
+        if (status.isOk()) continue;
         ++failures;
-        last = status;
+        last = status.getStatus();
     }
     if (failures == 0) return;
     log(fmt::format("{} of {} callbacks for {} could not be called: status {}", failures,
@@ -224,16 +179,16 @@ ServiceManager::ServiceManager(const std::filesystem::path& manifestRoot, Regist
                          }}),
       mDeathRecipient(AIBinder_DeathRecipient_new(onBinderDied)) {
     const AIBinder_Class* clazz = AIBinder_Class_define(
-            "android.os.IServiceManager", [](void* self) { return self; }, [](void*) {},
-            onTransact);
+            IServiceManager::descriptor, [](void* self) { return self; }, [](void*) {}, onTransact);
     mBinder = ndk::SpAIBinder(AIBinder_new(clazz, this));
 
     AIBinder_incStrong(mBinder.get());
     const Caller self{getpid(), geteuid()};
     mRules.allow(kOwnName, self.uid);
-    const Verdict verdict = mRegistry.addService(self, {.name = kOwnName,
-                                                        .object = adopt(mBinder.get()),
-                                                        .dumpPriority = kDumpPriorityDefault});
+    const Verdict verdict = mRegistry.addService(
+            self, {.name = kOwnName,
+                   .object = adopt(mBinder.get()),
+                   .dumpPriority = IServiceManager::DUMP_FLAG_PRIORITY_DEFAULT});
     if (!verdict.ok()) log(fmt::format("cannot register itself: {}", verdict.reason));
 }
 
@@ -259,12 +214,14 @@ void ServiceManager::unwatch(const Object& object) {
 
 void ServiceManager::notifyRegistration(const std::vector<Object>& callbacks,
                                         const std::string& name, const Object& service) {
-    callEachOneway(callbacks, name, kOnRegistration, name, service);
+    callEach<BpServiceCallback>(callbacks, name, &BpServiceCallback::onRegistration, name,
+                                binderOf(service));
 }
 
 void ServiceManager::notifyClients(const std::vector<Object>& callbacks, const std::string& name,
                                    const Object& service, bool hasClients) {
-    callEachOneway(callbacks, name, kOnClients, service, hasClients);
+    callEach<BpClientCallback>(callbacks, name, &BpClientCallback::onClients, binderOf(service),
+                               hasClients);
 }
 
 std::optional<uint32_t> ServiceManager::countHolders(const Object& object) {
@@ -322,9 +279,9 @@ binder_status_t ServiceManager::registerForNotifications(const AParcel* in, APar
     Object callback;
     const binder_status_t status = readArguments(in, &name, &callback);
     if (status != STATUS_OK) return status;
-    // An object of another interface is accepted like any other; it refuses the calls itself. It
-    // is not asked which it is: the answer would be the client's to withhold.
-    AIBinder_assumeClass(callback.get(), registrationCallbackClass());
+    // An object of another interface is accepted like any other; it refuses the calls itself. While
+    // a call is served nobody is asked which it is: the answer would be the client's to withhold.
+    IServiceCallback::fromBinder(binderOf(callback));
     return replyVerdict(
             out, "registerForNotifications", name,
             mRegistry.registerForNotifications(callerOfThisTransaction(), name, callback));
@@ -366,7 +323,7 @@ binder_status_t ServiceManager::registerClientCallback(const AParcel* in, AParce
     Object callback;
     const binder_status_t status = readArguments(in, &name, &service, &callback);
     if (status != STATUS_OK) return status;
-    AIBinder_assumeClass(callback.get(), clientCallbackClass());
+    IClientCallback::fromBinder(binderOf(callback));
     return replyVerdict(
             out, "registerClientCallback", name,
             mRegistry.registerClientCallback(callerOfThisTransaction(), name, service, callback));
@@ -382,7 +339,11 @@ binder_status_t ServiceManager::tryUnregisterService(const AParcel* in, AParcel*
 }
 
 binder_status_t ServiceManager::getServiceDebugInfo(const AParcel*, AParcel* out) {
-    return reply(out, mRegistry.debugInfo());
+    std::vector<aidl::android::os::ServiceDebugInfo> infos;
+    for (const ServiceDebugInfo& info : mRegistry.debugInfo()) {
+        infos.push_back({.name = info.name, .debugPid = info.pid});
+    }
+    return reply(out, infos);
 }
 
 }  // namespace servicemanager

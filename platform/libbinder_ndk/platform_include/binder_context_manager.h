@@ -16,11 +16,6 @@ binder_status_t ABinderProcess_becomeContextManager(AIBinder* binder);
 // True when the object promises VINTF stability, so that a manifest has to declare its name.
 bool AIBinder_requiresVintfDeclaration(AIBinder* binder);
 
-// Gives a proxy its class without asking the object for its descriptor, also outside a call that
-// is being served. Calls to an object of another interface are refused by that object.
-// True when the proxy has this class now.
-bool AIBinder_assumeClass(AIBinder* binder, const AIBinder_Class* clazz);
-
 // Counts the strong references that the driver holds for a proxy's object: one for each process that
 // refers to it, this one included, and for the time of a call one more for each of its arguments that
 // is the object. The object's own process does not count. For the context manager alone.

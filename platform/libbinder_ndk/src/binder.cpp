@@ -138,12 +138,6 @@ bool AIBinder_associateClass(AIBinder* binder, const AIBinder_Class* clazz) {
     return false;
 }
 
-bool AIBinder_assumeClass(AIBinder* binder, const AIBinder_Class* clazz) {
-    if (binder == nullptr || clazz == nullptr) return false;
-    const AIBinder_Class* current = nullptr;
-    return binder->clazz.compare_exchange_strong(current, clazz) || current == clazz;
-}
-
 const AIBinder_Class* AIBinder_getClass(AIBinder* binder) {
     return binder != nullptr ? binder->clazz.load(std::memory_order_acquire) : nullptr;
 }

@@ -185,16 +185,6 @@ TEST_F(RemoteBinder, AssociationWithADeadObjectFails) {
     EXPECT_FALSE(AIBinder_isAlive(binder.get()));
 }
 
-TEST_F(RemoteBinder, ClassMayBeAssumedWithoutAsking) {
-    const auto binder = proxy(12);
-    AIBinder_Class* const clazz = defineClass("abc");
-    EXPECT_TRUE(AIBinder_assumeClass(binder.get(), clazz));
-    EXPECT_TRUE(AIBinder_assumeClass(binder.get(), clazz));
-    EXPECT_FALSE(AIBinder_assumeClass(binder.get(), defineClass("abc")));
-    EXPECT_FALSE(AIBinder_assumeClass(nullptr, clazz));
-    EXPECT_THAT(mKernel.sent, IsEmpty());
-}
-
 TEST_F(RemoteBinder, TransactionNeedsAClass) {
     AParcel* in = nullptr;
     EXPECT_EQ(STATUS_INVALID_OPERATION, AIBinder_prepareTransaction(proxy(13).get(), &in));
