@@ -13,19 +13,14 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include "platform/libbinder_ndk/tests/guest/process.h"
 #include "tests/support/kernel_log.h"
 #include "tests/support/phone_control.h"
+#include "tests/support/process.h"
 #include "tests/system/composition_client.h"
 
 namespace qvx::test {
 namespace {
 
-using binder_test::eventually;
-using binder_test::inProcess;
-using binder_test::kRoot;
-using binder_test::kShell;
-using binder_test::Process;
 using nlohmann::json;
 using testing::ElementsAre;
 using testing::HasSubstr;

@@ -3,7 +3,6 @@
 // Files as another user may open them.
 #include "vibctl/doctor/file_view.h"
 
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include <functional>
@@ -12,6 +11,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include "tests/support/process.h"
 #include "vibctl/tests/doctor_root.h"
 
 namespace vibctl {
@@ -24,14 +24,8 @@ constexpr uid_t kStranger = 4242;
 
 // Runs `body` as a user that is neither root nor any that owns a file here; what it returns.
 bool asSomebodyElse(const std::function<bool()>& body) {
-    const pid_t child = fork();
-    if (child == 0) {
-        if (geteuid() == 0 && setresuid(4243, 4243, 4243) != 0) _exit(2);
-        _exit(body() ? 0 : 1);
-    }
-    int status = 0;
-    waitpid(child, &status, 0);
-    return WIFEXITED(status) && WEXITSTATUS(status) == 0;
+    const uid_t somebody = geteuid() == 0 ? 4243 : geteuid();
+    return qvx::test::Process(somebody, [&] { EXPECT_TRUE(body()); }).wait() == 0;
 }
 
 struct ModeCase {
@@ -47,10 +41,11 @@ TEST_P(ModeBits, DecideWhereTheUserCannotBeTakenOn) {
     const fake::Root root;
     root.put("/node");
     root.chmod("/node", GetParam().mode);
-    EXPECT_TRUE(asSomebodyElse([&root] {
+    const gid_t ownGroup = getegid();
+    EXPECT_TRUE(asSomebodyElse([&] {
         const FileView view(root.path());
         User user = GetParam().user;
-        if (user.groups == std::vector<gid_t>{0}) user.groups = {getegid()};
+        if (user.groups == std::vector<gid_t>{0}) user.groups = {ownGroup};
         const std::vector<Access> accesses = {{"/node", 2 /* O_RDWR */}};
         return !FileView::canBecome(user) && view.open(user, accesses)[0] == GetParam().error;
     }));

@@ -18,7 +18,6 @@
 namespace {
 
 using processes::Manager;
-using processes::Server;
 using qvx::test::CommandResult;
 using ::testing::HasSubstr;
 
@@ -58,7 +57,7 @@ class VibctlWithService : public VibctlTest {
     }
 
     Manager mManager{mRoot.path(), "android.hardware.vibrator.IVibrator/default 1000\n"};
-    Server mService{1000, fake::registerServices};
+    qvx::test::Process mService = processes::serve(1000, fake::registerServices);
 };
 
 TEST_F(VibctlTest, WithoutAServiceManagerEndsInSecondsWithOneLine) {

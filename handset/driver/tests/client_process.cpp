@@ -4,14 +4,16 @@
 #include "handset/driver/tests/client_process.h"
 
 #include <fcntl.h>
-#include <grp.h>
 #include <sched.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include <cerrno>
-#include <csignal>
 #include <cstring>
+
+#include <android-base/file.h>
+#include <gtest/gtest.h>
+
+#include "tests/support/process.h"
 
 namespace handset {
 namespace {
@@ -23,42 +25,20 @@ bool enterMountsOf(pid_t process) {
     return setns(mounts, CLONE_NEWNS) == 0;
 }
 
-bool becomeUser(uid_t user) {
-    return setgroups(0, nullptr) == 0 && setresgid(user, user, user) == 0 &&
-           setresuid(user, user, user) == 0;
-}
-
 }  // namespace
-
-int waitForEnd(pid_t child) {
-    int status = 0;
-    while (waitpid(child, &status, 0) < 0 && errno == EINTR) {
-    }
-    return WIFSIGNALED(status) ? 128 + WTERMSIG(status) : WEXITSTATUS(status);
-}
-
-std::string readAll(int fd) {
-    std::string text;
-    char part[4096];
-    for (ssize_t size; (size = read(fd, part, sizeof part)) > 0;) {
-        text.append(part, static_cast<size_t>(size));
-    }
-    return text;
-}
 
 std::string runAs(uid_t user, const std::function<std::string()>& work, pid_t mountsOf) {
     int ends[2];
     if (pipe2(ends, O_CLOEXEC) != 0) return strerror(errno);
-    const pid_t child = fork();
-    if (child == 0) {
-        const bool entered = enterMountsOf(mountsOf) && becomeUser(user);
+    const qvx::test::Process child(geteuid(), [&] {
+        const bool entered = enterMountsOf(mountsOf) && qvx::test::becomeUser(user);
         const std::string result = entered ? work() : "cannot enter";
-        _exit(write(ends[1], result.data(), result.size()) < 0 ? 1 : 0);
-    }
+        EXPECT_TRUE(android::base::WriteStringToFd(result, ends[1]));
+    });
     close(ends[1]);
-    std::string result = readAll(ends[0]);
+    std::string result;
+    android::base::ReadFdToString(ends[0], &result);
     close(ends[0]);
-    waitForEnd(child);
     return result;
 }
 

@@ -14,12 +14,6 @@ namespace handset {
 // returned; with the mounts of the process `mountsOf` unless that is 0.
 std::string runAs(uid_t user, const std::function<std::string()>& work, pid_t mountsOf = 0);
 
-// Waits for a child's end: its exit status, or 128 and the signal's number.
-int waitForEnd(pid_t child);
-
-// Everything that comes out of the descriptor until its end.
-std::string readAll(int fd);
-
 // Opens, writes once and closes: "4" for four bytes, or the error's name, after "open " where the
 // open failed.
 std::string writeNode(const std::string& path, const std::string& text, int flags);

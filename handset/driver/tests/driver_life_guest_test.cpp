@@ -2,7 +2,6 @@
 //
 // The driver's life: what it takes, what it shows, and that it leaves nothing behind.
 #include <fcntl.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include <csignal>
@@ -14,6 +13,9 @@
 
 namespace handset {
 namespace {
+
+using qvx::test::kRoot;
+using qvx::test::Process;
 
 constexpr const char* kCalibration = "/efs/FactoryApp/vibrator_calibration";
 const std::string kDuration = "/sys/class/leds/vibrator/duration";
@@ -67,35 +69,29 @@ TEST(DriverLife, ADelayedCallerDoesNotHoldUpTheEnd) {
     RunningDriver driver(R"({"nodes": {"/sys/class/a/b": {"mode": "rw"}},
         "faults": [{"node": "/sys/class/a/b", "op": "write", "delay": 60000}]})");
     ASSERT_TRUE(driver.isReady()) << driver.errors();
-    const pid_t client = fork();
-    if (client == 0) {
+    Process client(kRoot, [&] {
         driver.inside([] { return writeNode("/sys/class/a/b", "1", O_WRONLY); });
-        _exit(0);
-    }
+    });
     while (driver.journal().empty()) usleep(1000);
     usleep(50000);
     EXPECT_EQ(driver.end(SIGTERM), 0);
-    int status = -1;
-    EXPECT_EQ(waitpid(client, &status, 0), client);
-    EXPECT_EQ(status, 0);
+    EXPECT_EQ(client.wait(), 0);
 }
 
 TEST(DriverLife, TheParentsDeathEndsIt) {
     int ends[2];
     ASSERT_EQ(pipe2(ends, O_CLOEXEC), 0);
-    const pid_t parent = fork();
-    if (parent == 0) {
+    Process parent(kRoot, [&] {
         const RunningDriver driver(kProfile);
         if (write(ends[1], driver.directory().data(), driver.directory().size()) < 0) _exit(1);
         pause();
-    }
+    });
     char directory[64] = {};
     ASSERT_GT(read(ends[0], directory, sizeof directory - 1), 0);
     close(ends[0]);
     close(ends[1]);
     EXPECT_EQ(access("/efs", F_OK), 0);
-    kill(parent, SIGKILL);
-    waitpid(parent, nullptr, 0);
+    parent.kill();
     for (int i = 0; i < 1000 && access("/efs", F_OK) == 0; ++i) usleep(10000);
     EXPECT_NE(access("/efs", F_OK), 0);
     std::filesystem::remove_all(directory);
@@ -108,8 +104,7 @@ TEST(DriverLife, AKilledDriverFailsItsClients) {
     ASSERT_EQ(pipe2(go, O_CLOEXEC), 0);
     int told[2];
     ASSERT_EQ(pipe2(told, O_CLOEXEC), 0);
-    const pid_t client = fork();
-    if (client == 0) {
+    Process client(kRoot, [&] {
         driver.inside([&] {
             const int fd = open(kDuration.c_str(), O_RDWR);
             char byte = 0;
@@ -118,15 +113,14 @@ TEST(DriverLife, AKilledDriverFailsItsClients) {
             if (write(told[1], result.data(), result.size()) < 0) return std::string();
             return std::string();
         });
-        _exit(0);
-    }
+    });
     char text[32] = {};
     ASSERT_EQ(read(told[0], text, 1), 1);
     EXPECT_EQ(driver.end(SIGKILL), 128 + SIGKILL);
     ASSERT_EQ(write(go[1], "g", 1), 1);
     ASSERT_GT(read(told[0], text, sizeof text - 1), 0);
     EXPECT_STREQ(text, "ENOTCONN");
-    waitpid(client, nullptr, 0);
+    client.wait();
     for (const int fd : {go[0], go[1], told[0], told[1]}) close(fd);
     rmdir("/efs");  // what a killed driver cannot take away
 }

@@ -3,11 +3,8 @@
 // A handset-driver that runs for one test.
 #include "handset/driver/tests/running_driver.h"
 
-#include <fcntl.h>
-#include <poll.h>
-#include <unistd.h>
-
 #include <csignal>
+#include <fstream>
 #include <regex>
 #include <sstream>
 
@@ -18,40 +15,26 @@ namespace {
 
 using android::base::Result;
 
-constexpr int kStartTimeout = 30000;  // milliseconds; emulation under a sanitizer is slow
+qvx::test::Program programIn(const TemporaryDir& directory, const std::string& profile) {
+    std::ofstream(fileIn(directory, "profile.json")) << profile;
+    return {.words = {QVX_DRIVER, "--profile", fileIn(directory, "profile.json"), "--journal",
+                      fileIn(directory, "journal"), "--control", fileIn(directory, "control")},
+            .errors = fileIn(directory, "errors"),
+            .tellsReadiness = true};
+}
 
 }  // namespace
 
-RunningDriver::RunningDriver(const std::string& profile) {
-    std::ofstream(fileIn(mDirectory, "profile.json")) << profile;
-    int ends[2];
-    if (pipe2(ends, O_CLOEXEC) != 0) return;
-    mPid = fork();
-    if (mPid == 0) {
-        const int errors = open(fileIn(mDirectory, "errors").c_str(), O_WRONLY | O_CREAT, 0644);
-        dup2(errors, STDERR_FILENO);
-        const int ready = dup(ends[1]);
-        execl(QVX_DRIVER, "handset-driver", "--profile", fileIn(mDirectory, "profile.json").c_str(),
-              "--journal", fileIn(mDirectory, "journal").c_str(), "--control",
-              fileIn(mDirectory, "control").c_str(), "--ready-fd", std::to_string(ready).c_str(),
-              nullptr);
-        _exit(127);
-    }
-    close(ends[1]);
-    pollfd polled{ends[0], POLLIN, 0};
-    mReady = poll(&polled, 1, kStartTimeout) > 0 && readAll(ends[0]) == "ready\n";
-    close(ends[0]);
-}
+RunningDriver::RunningDriver(const std::string& profile)
+    : mProcess(qvx::test::kRoot, programIn(mDirectory, profile)) {}
 
 RunningDriver::~RunningDriver() {
-    if (mPid > 0) end(SIGTERM);
+    end(SIGTERM);
 }
 
 int RunningDriver::end(int signal) {
-    kill(mPid, signal);
-    const int status = waitForEnd(mPid);
-    mPid = -1;
-    return status;
+    mProcess.signal(signal);
+    return mProcess.wait();
 }
 
 std::string RunningDriver::ask(const std::string& request) const {

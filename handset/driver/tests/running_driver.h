@@ -3,14 +3,13 @@
 // A handset-driver that runs for one test.
 #pragma once
 
-#include <sys/types.h>
-
 #include <functional>
 #include <string>
 #include <vector>
 
 #include "handset/driver/tests/client_process.h"
 #include "handset/driver/tests/test_files.h"
+#include "tests/support/process.h"
 
 namespace handset {
 
@@ -24,8 +23,8 @@ class RunningDriver {
     RunningDriver(const RunningDriver&) = delete;
     RunningDriver& operator=(const RunningDriver&) = delete;
 
-    bool isReady() const { return mReady; }
-    pid_t pid() const { return mPid; }
+    bool isReady() const { return mProcess.isReady(); }
+    pid_t pid() const { return mProcess.pid(); }
     std::string directory() const { return mDirectory.path; }
 
     // Sends the signal and waits for the end: the exit status, or 128 and the signal's number.
@@ -45,7 +44,7 @@ class RunningDriver {
 
     // Runs `work` in a process of its own that sees the driver's mounts, as runAs() does.
     std::string inside(uid_t user, const std::function<std::string()>& work) const {
-        return runAs(user, work, mPid);
+        return runAs(user, work, pid());
     }
 
     // The same as root.
@@ -53,8 +52,7 @@ class RunningDriver {
 
   private:
     TemporaryDir mDirectory;
-    pid_t mPid = -1;
-    bool mReady = false;
+    qvx::test::Process mProcess;
 };
 
 }  // namespace handset

@@ -14,8 +14,8 @@ namespace handset
 {
 
 // Whom requests come from.
-inline constexpr uid_t kRoot = 0;
-inline constexpr uid_t kSystem = 1000;
+using qvx::test::kRoot;
+using qvx::test::kSystem;
 inline constexpr uid_t kStranger = 2000;
 
 struct Agreement {

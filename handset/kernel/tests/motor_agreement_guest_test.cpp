@@ -240,25 +240,25 @@ std::string duplicateKeeps(const std::string &motor)
 std::string killedClient(const std::string &motor)
 {
 	const MotorFile kept(motor, O_RDWR);
-	const pid_t child = fork();
-	if (child == 0) {
+	qvx::test::Process child(geteuid(), [&] {
 		const MotorFile file(motor, O_RDWR);
 		file.upload();
 		file.upload();
 		file.event(0, 1);
 		kill(getpid(), SIGKILL);
-	}
-	return joined({std::to_string(waitForEnd(child)), kept.upload()});
+	});
+	return joined({std::to_string(child.wait()), kept.upload()});
 }
 
 std::string inheritedFile(const std::string &motor)
 {
 	const MotorFile file(motor, O_RDWR);
 	std::string answers = file.upload() + " ";
-	const pid_t child = fork();
-	if (child == 0)
-		_exit(file.upload(0) == "0" && file.erase(0) == "0" ? 0 : 1);
-	answers += std::to_string(waitForEnd(child)) + " ";
+	qvx::test::Process child(geteuid(), [&] {
+		EXPECT_EQ(file.upload(0), "0");
+		EXPECT_EQ(file.erase(0), "0");
+	});
+	answers += std::to_string(child.wait()) + " ";
 	return answers + file.upload();
 }
 

@@ -6,35 +6,21 @@
 
 #include <atomic>
 #include <functional>
-#include <optional>
+#include <memory>
 #include <string>
-#include <vector>
+#include <utility>
 
+#include <aidl/android/os/BnClientCallback.h>
+#include <aidl/android/os/BnServiceCallback.h>
+#include <aidl/android/os/IServiceManager.h>
+#include <aidl/android/os/ServiceDebugInfo.h>
 #include <android/binder_auto_utils.h>
-#include <android/binder_ibinder.h>
 
 namespace client {
 
-// Transaction codes of android.os.IServiceManager.
-enum Code : transaction_code_t {
-    kGetService = 1,
-    kCheckService = 2,
-    kAddService = 3,
-    kListServices = 4,
-    kRegisterForNotifications = 5,
-    kUnregisterForNotifications = 6,
-    kIsDeclared = 7,
-    kGetDeclaredInstances = 8,
-    kUpdatableViaApex = 9,
-    kRegisterClientCallback = 10,
-    kTryUnregisterService = 11,
-    kGetServiceDebugInfo = 12,
-};
-
-struct DebugInfo {
-    std::string name;
-    int32_t pid;
-};
+using aidl::android::os::IServiceManager;
+using aidl::android::os::ServiceDebugInfo;
+using ndk::ScopedAStatus;
 
 // A local object that does nothing.
 ndk::SpAIBinder makeObject();
@@ -42,41 +28,45 @@ ndk::SpAIBinder makeObject();
 // The same with VINTF stability.
 ndk::SpAIBinder makeVintfObject();
 
-// A local object of android.os.IServiceCallback. Counts its calls, and keeps what came last.
-// Calls are served by the thread pool, which this starts.
-struct RegistrationCallback {
+// Counts its calls, and keeps what came last. Calls are served by the thread pool, which this
+// starts.
+class RegistrationCallback : public aidl::android::os::BnServiceCallback {
+  public:
+    RegistrationCallback();
+
+    ScopedAStatus onRegistration(const std::string& to, const ndk::SpAIBinder& object) override;
+
     std::atomic<int> calls{0};
     std::string name;
     ndk::SpAIBinder service;
-    ndk::SpAIBinder binder;
-
-    RegistrationCallback();
 };
 
-// A local object of android.os.IClientCallback, served by the thread pool, which this starts.
-struct ClientCallback {
-    explicit ClientCallback(std::function<void(bool hasClients)> onClients);
+// Served by the thread pool, which this starts.
+class ClientCallback : public aidl::android::os::BnClientCallback {
+  public:
+    explicit ClientCallback(std::function<void(bool hasClients)> function);
 
-    const std::function<void(bool hasClients)> onClients;
-    ndk::SpAIBinder binder;
+    ScopedAStatus onClients(const ndk::SpAIBinder& service, bool hasClients) override;
+
+  private:
+    const std::function<void(bool hasClients)> mFunction;
 };
+
+// The object as a callback, of whatever interface it is.
+std::shared_ptr<aidl::android::os::IServiceCallback> asServiceCallback(ndk::SpAIBinder object);
+std::shared_ptr<aidl::android::os::IClientCallback> asClientCallback(ndk::SpAIBinder object);
 
 // The manager's own object, as it stands under its name.
-ndk::SpAIBinder manager();
+std::shared_ptr<IServiceManager> manager();
 
-// Every function below returns the exception code of the reply, EX_TRANSACTION_FAILED for a failed
-// transaction, and fails the test for anything unreadable.
-int32_t find(Code code, const std::string& name, ndk::SpAIBinder& service);
+// Calls a method of the manager's; the reply's exception code, EX_TRANSACTION_FAILED for a call
+// that failed.
+template <typename Method, typename... Arguments>
+int32_t ask(Method method, Arguments&&... arguments) {
+    return (manager().get()->*method)(std::forward<Arguments>(arguments)...).getExceptionCode();
+}
+
 int32_t add(const std::string& name, const ndk::SpAIBinder& service, bool allowIsolated = false,
-            int32_t dumpPriority = 8);
-int32_t list(int32_t dumpPriority, std::vector<std::string>& names);
-int32_t notify(Code code, const std::string& name, const ndk::SpAIBinder& callback);
-int32_t isDeclared(const std::string& name, bool& declared);
-int32_t getDeclaredInstances(const std::string& interface, std::vector<std::string>& instances);
-int32_t updatableViaApex(const std::string& name, std::optional<std::string>& apex);
-int32_t registerClientCallback(const std::string& name, const ndk::SpAIBinder& service,
-                               const ndk::SpAIBinder& callback);
-int32_t tryUnregister(const std::string& name, const ndk::SpAIBinder& service);
-int32_t debugInfo(std::vector<DebugInfo>& infos);
+            int32_t dumpPriority = IServiceManager::DUMP_FLAG_PRIORITY_DEFAULT);
 
 }  // namespace client

@@ -8,15 +8,17 @@
 #include <android/binder_manager.h>
 #include <gmock/gmock.h>
 
+#include "handset/common/raw_binder.h"
 #include "platform/servicemanager/tests/service_manager_test.h"
 #include "tests/support/kernel_log.h"
 
 namespace {
 
 using namespace client;  // NOLINT(google-build-using-namespace)
-using processes::as;
-using processes::eventually;
-using processes::Server;
+using processes::serve;
+using qvx::test::eventually;
+using qvx::test::inProcess;
+using qvx::test::Process;
 using ::testing::ElementsAre;
 using ::testing::HasSubstr;
 using ::testing::IsEmpty;
@@ -31,7 +33,7 @@ void awaitFree(const char* name) {
 using ContextManager = ServiceManagerTest;
 
 TEST_F(ContextManager, RegistersItself) {
-    as(kSystem, [] {
+    inProcess(kSystem, [] {
         const ndk::SpAIBinder found(AServiceManager_checkService("manager"));
         EXPECT_NE(found.get(), nullptr);
         EXPECT_TRUE(AIBinder_isRemote(found.get()));
@@ -63,7 +65,7 @@ using AddService = ServiceManagerTest;
 
 TEST_F(AddService, IsOpenToRootAndToTheUsersOfARule) {
     for (const uid_t uid : {kRoot, kSystem, uid_t{2000}, uid_t{9999}, uid_t{101000}}) {
-        as(uid, [] {
+        inProcess(uid, [] {
             awaitFree("test.service");
             const ndk::SpAIBinder object = makeObject();
             EXPECT_EQ(AServiceManager_addService(object.get(), "test.service"), EX_NONE);
@@ -74,32 +76,33 @@ TEST_F(AddService, IsOpenToRootAndToTheUsersOfARule) {
 }
 
 TEST_F(AddService, IsClosedToUsersWithoutARule) {
-    as(kSystem, [] { EXPECT_EQ(add("test.unruly", makeObject()), EX_SECURITY); });
-    as(1001, [] { EXPECT_EQ(add("test.service", makeObject()), EX_SECURITY); });
+    inProcess(kSystem, [] { EXPECT_EQ(add("test.unruly", makeObject()), EX_SECURITY); });
+    inProcess(1001, [] { EXPECT_EQ(add("test.service", makeObject()), EX_SECURITY); });
     EXPECT_THAT(mManager.log(),
                 HasSubstr(", uid 1001: no rule lets this user register the name\n"));
 }
 
 // With a rule, without one and as root: whoever asks for the name gets the first service's process.
 TEST_F(AddService, OfAnotherUserNeverReplacesALivingVibrator) {
-    const Server vibrator(kSystem, [] { EXPECT_EQ(add(kVibrator, makeObject()), EX_NONE); });
+    const Process vibrator =
+            serve(kSystem, [] { EXPECT_EQ(add(kVibrator, makeObject()), EX_NONE); });
     for (const uid_t uid : {uid_t{1001}, uid_t{1002}, kRoot}) {
-        as(uid, [] { EXPECT_EQ(add(kVibrator, makeObject()), EX_SECURITY); });
+        inProcess(uid, [] { EXPECT_EQ(add(kVibrator, makeObject()), EX_SECURITY); });
     }
-    as(kApp, [&vibrator] {
+    inProcess(kApp, [&vibrator] {
         const ndk::SpAIBinder found(AServiceManager_checkService(kVibrator));
         EXPECT_EQ(AIBinder_ping(found.get()), STATUS_OK);
-        std::vector<DebugInfo> infos;
-        EXPECT_EQ(debugInfo(infos), EX_NONE);
+        std::vector<ServiceDebugInfo> infos;
+        EXPECT_EQ(ask(&IServiceManager::getServiceDebugInfo, &infos), EX_NONE);
         ASSERT_EQ(infos.size(), 2u);
         EXPECT_EQ(infos[0].name, kVibrator);
-        EXPECT_EQ(infos[0].pid, vibrator.pid());
+        EXPECT_EQ(infos[0].debugPid, vibrator.pid());
     });
 }
 
 TEST_F(AddService, IsClosedToApps) {
     for (const uid_t uid : {uid_t{10000}, kApp, uid_t{65534}, kIsolated, uid_t{110000}}) {
-        as(uid, [] {
+        inProcess(uid, [] {
             EXPECT_EQ(AServiceManager_addService(makeObject().get(), "test.service"), EX_SECURITY);
         });
     }
@@ -109,7 +112,7 @@ TEST_F(AddService, IsClosedToApps) {
 }
 
 TEST_F(AddService, RefusesBadNames) {
-    as(kRoot, [] {
+    inProcess(kRoot, [] {
         const ndk::SpAIBinder object = makeObject();
         EXPECT_EQ(add("", object), EX_ILLEGAL_ARGUMENT);
         EXPECT_EQ(add("a b", object), EX_ILLEGAL_ARGUMENT);
@@ -122,13 +125,24 @@ TEST_F(AddService, RefusesBadNames) {
 }
 
 TEST_F(AddService, ShowsAHostileNameOnOneLineOfTheLog) {
-    as(kRoot, [] { EXPECT_EQ(add("a\nb", makeObject()), EX_ILLEGAL_ARGUMENT); });
+    inProcess(kRoot, [] { EXPECT_EQ(add("a\nb", makeObject()), EX_ILLEGAL_ARGUMENT); });
     EXPECT_THAT(mManager.log(), HasSubstr("addService \"a\\nb\" refused to pid "));
 }
 
 TEST_F(AddService, AnswersANullBinderWithNullPointer) {
-    as(kSystem, [] { EXPECT_EQ(add("test.service", nullptr), EX_NULL_POINTER); });
-    as(kApp, [] { EXPECT_EQ(add("", nullptr), EX_NULL_POINTER); });
+    for (const auto& [uid, name] : {std::pair(kSystem, "test.service"), std::pair(kApp, "")}) {
+        inProcess(uid, [name = name] {
+            const handset::RawReply reply =
+                    handset::RawBinder().transact(0, IServiceManager::TRANSACTION_addService,
+                                                  handset::RequestBytes()
+                                                          .token("android.os.IServiceManager")
+                                                          .string16(name)
+                                                          .nullBinder()
+                                                          .word(0)
+                                                          .word(8));
+            EXPECT_THAT(reply.words(), ElementsAre(0xfffffffc, 0, 0, 0)) << "EX_NULL_POINTER";
+        });
+    }
 }
 
 constexpr const char* kManifest =
@@ -138,13 +152,13 @@ constexpr const char* kManifest =
         "<fqname>IBar/default</fqname></hal></manifest>";
 
 TEST_F(AddService, WantsAVintfObjectDeclared) {
-    as(kSystem, [] {
+    inProcess(kSystem, [] {
         EXPECT_EQ(add("test.pack.IFoo/default", makeVintfObject()), EX_ILLEGAL_ARGUMENT);
         EXPECT_EQ(add("test.pack.IFoo/default", makeObject()), EX_NONE);
     });
     EXPECT_THAT(mManager.log(), HasSubstr("a VINTF-stable service must be declared in a manifest"));
     mRoot.put("/vendor/etc/vintf/manifest/test.xml", kManifest);
-    as(kSystem, [] {
+    inProcess(kSystem, [] {
         EXPECT_EQ(add("test.pack.IFoo/default", makeVintfObject()), EX_NONE);
         EXPECT_EQ(add("test.pack.IFoo/other", makeVintfObject()), EX_ILLEGAL_ARGUMENT);
     });
@@ -152,15 +166,16 @@ TEST_F(AddService, WantsAVintfObjectDeclared) {
 
 TEST_F(AddService, NamesAFaultyManifestInTheLog) {
     mRoot.put("/vendor/etc/vintf/manifest/test.xml", "<manifest");
-    as(kSystem,
-       [] { EXPECT_EQ(add("test.pack.IFoo/default", makeVintfObject()), EX_ILLEGAL_ARGUMENT); });
+    inProcess(kSystem, [] {
+        EXPECT_EQ(add("test.pack.IFoo/default", makeVintfObject()), EX_ILLEGAL_ARGUMENT);
+    });
     EXPECT_THAT(mManager.log(), HasSubstr("servicemanager: manifest " +
                                           mRoot.at("/vendor/etc/vintf/manifest/test.xml") +
                                           " is passed over: line 1: "));
 }
 
 TEST_F(AddService, ReplacesAnOlderOneOfTheName) {
-    as(kSystem, [] {
+    inProcess(kSystem, [] {
         const ndk::SpAIBinder first = makeObject();
         const ndk::SpAIBinder second = makeObject();
         EXPECT_EQ(add("test.service", first), EX_NONE);
@@ -173,30 +188,30 @@ TEST_F(AddService, ReplacesAnOlderOneOfTheName) {
 using FindService = ServiceManagerTest;
 
 TEST_F(FindService, AnUnknownNameIsNullInAnOkReplyAtOnce) {
-    as(kApp, [] {
-        for (const Code code : {kGetService, kCheckService}) {
+    inProcess(kApp, [] {
+        for (const auto method : {&IServiceManager::getService, &IServiceManager::checkService}) {
             ndk::SpAIBinder found;
-            EXPECT_EQ(find(code, "test.unknown", found), EX_NONE);
+            EXPECT_EQ(ask(method, "test.unknown", &found), EX_NONE);
             EXPECT_EQ(found.get(), nullptr);
-            EXPECT_EQ(find(code, "", found), EX_NONE);
+            EXPECT_EQ(ask(method, "", &found), EX_NONE);
             EXPECT_EQ(found.get(), nullptr);
         }
     });
 }
 
 TEST_F(FindService, IsOpenToAppsAndLimitedForIsolatedOnes) {
-    const Server server(kRoot, [] {
+    const Process server = serve(kRoot, [] {
         EXPECT_EQ(add("test.closed", makeObject(), false), EX_NONE);
         EXPECT_EQ(add("test.open", makeObject(), true), EX_NONE);
     });
-    for (const Code code : {kGetService, kCheckService}) {
-        as(kApp, [code] {
+    for (const auto method : {&IServiceManager::getService, &IServiceManager::checkService}) {
+        inProcess(kApp, [method] {
             ndk::SpAIBinder found;
-            EXPECT_EQ(find(code, "test.closed", found), EX_NONE);
+            EXPECT_EQ(ask(method, "test.closed", &found), EX_NONE);
             EXPECT_NE(found.get(), nullptr);
         });
     }
-    as(kIsolated, [] {
+    inProcess(kIsolated, [] {
         EXPECT_EQ(AServiceManager_checkService("test.closed"), nullptr);
         EXPECT_EQ(AServiceManager_checkService("manager"), nullptr);
         const ndk::SpAIBinder found(AServiceManager_checkService("test.open"));
@@ -207,17 +222,17 @@ TEST_F(FindService, IsOpenToAppsAndLimitedForIsolatedOnes) {
 using ListServices = ServiceManagerTest;
 
 TEST_F(ListServices, GivesNamesInByteOrderWhosePriorityMatches) {
-    as(kRoot, [] {
+    inProcess(kRoot, [] {
         const ndk::SpAIBinder object = makeObject();
         EXPECT_EQ(add("b", object, false, 1), EX_NONE);
         EXPECT_EQ(add("a", object, false, 2), EX_NONE);
         EXPECT_EQ(add("B", object, false, 8), EX_NONE);
         std::vector<std::string> names;
-        EXPECT_EQ(list(15, names), EX_NONE);
+        EXPECT_EQ(ask(&IServiceManager::listServices, 15, &names), EX_NONE);
         EXPECT_THAT(names, ElementsAre("B", "a", "b", "manager"));
-        EXPECT_EQ(list(3, names), EX_NONE);
+        EXPECT_EQ(ask(&IServiceManager::listServices, 3, &names), EX_NONE);
         EXPECT_THAT(names, ElementsAre("a", "b"));
-        EXPECT_EQ(list(16, names), EX_NONE);
+        EXPECT_EQ(ask(&IServiceManager::listServices, 16, &names), EX_NONE);
         EXPECT_THAT(names, IsEmpty());
     });
 }
@@ -226,26 +241,30 @@ using Declarations = ServiceManagerTest;
 
 TEST_F(Declarations, ComeFromTheManifests) {
     mRoot.put("/odm/etc/vintf/manifest.xml", kManifest);
-    as(kApp, [] {
+    inProcess(kApp, [] {
         bool declared = false;
-        EXPECT_EQ(isDeclared("test.pack.IFoo/default", declared), EX_NONE);
+        EXPECT_EQ(ask(&IServiceManager::isDeclared, "test.pack.IFoo/default", &declared), EX_NONE);
         EXPECT_TRUE(declared);
-        EXPECT_EQ(isDeclared("test.pack.IFoo/other", declared), EX_NONE);
+        EXPECT_EQ(ask(&IServiceManager::isDeclared, "test.pack.IFoo/other", &declared), EX_NONE);
         EXPECT_FALSE(declared);
-        EXPECT_EQ(isDeclared("manager", declared), EX_NONE);
+        EXPECT_EQ(ask(&IServiceManager::isDeclared, "manager", &declared), EX_NONE);
         EXPECT_FALSE(declared);
         EXPECT_TRUE(AServiceManager_isDeclared("test.pack.IBar/default"));
 
         std::vector<std::string> instances;
-        EXPECT_EQ(getDeclaredInstances("test.pack.IFoo", instances), EX_NONE);
+        EXPECT_EQ(ask(&IServiceManager::getDeclaredInstances, "test.pack.IFoo", &instances),
+                  EX_NONE);
         EXPECT_THAT(instances, ElementsAre("another", "default"));
-        EXPECT_EQ(getDeclaredInstances("test.pack.INone", instances), EX_NONE);
+        EXPECT_EQ(ask(&IServiceManager::getDeclaredInstances, "test.pack.INone", &instances),
+                  EX_NONE);
         EXPECT_THAT(instances, IsEmpty());
 
         std::optional<std::string> apex;
-        EXPECT_EQ(updatableViaApex("test.pack.IBar/default", apex), EX_NONE);
+        EXPECT_EQ(ask(&IServiceManager::updatableViaApex, "test.pack.IBar/default", &apex),
+                  EX_NONE);
         EXPECT_EQ(apex, "com.test");
-        EXPECT_EQ(updatableViaApex("test.pack.IFoo/default", apex), EX_NONE);
+        EXPECT_EQ(ask(&IServiceManager::updatableViaApex, "test.pack.IFoo/default", &apex),
+                  EX_NONE);
         EXPECT_EQ(apex, std::nullopt);
     });
 }

@@ -11,9 +11,9 @@
 #include "platform/servicemanager/tests/processes.h"
 #include "tests/support/fake_root.h"
 
-inline constexpr uid_t kRoot = 0;
-inline constexpr uid_t kSystem = 1000;
-inline constexpr uid_t kApp = 10123;
+using qvx::test::kApp;
+using qvx::test::kRoot;
+using qvx::test::kSystem;
 inline constexpr uid_t kIsolated = 90001;
 
 // Who may register what in these tests, beside root.

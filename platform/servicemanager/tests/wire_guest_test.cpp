@@ -224,7 +224,7 @@ TEST_F(ServiceManagerWire, AServiceGoesWithItsProcess) {
                 0, 3, request().string16("svc").binder(0x1000, kSystemLevel).word(0).word(8));
         EXPECT_THAT(reply.words(), ElementsAre(0));
     }
-    EXPECT_TRUE(processes::eventually([this] {
+    EXPECT_TRUE(qvx::test::eventually([this] {
         return call(2, request().string16("svc")).words() ==
                std::vector<uint32_t>{0, 0x73622a85, 0x113, 0, 0, 0, 0, 1};
     }));

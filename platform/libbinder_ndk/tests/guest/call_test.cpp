@@ -13,7 +13,6 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include "platform/libbinder_ndk/tests/guest/process.h"
 #include "platform/libbinder_ndk/tests/guest/test_service.h"
 #include "tests/support/kernel_log.h"
 

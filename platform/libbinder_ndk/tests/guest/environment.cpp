@@ -6,17 +6,19 @@
 
 #include <gtest/gtest.h>
 
-#include "platform/libbinder_ndk/tests/guest/process.h"
 #include "platform/libbinder_ndk/tests/guest/small_manager.h"
+#include "tests/support/process.h"
 
 namespace binder_test {
 namespace {
+
+using qvx::test::Process;
 
 class Manager : public testing::Environment {
   public:
     void SetUp() override {
         mProcess = std::make_unique<Process>(
-                kRoot, [](const Process::Ready& ready) { serveSmallManager(ready); });
+                qvx::test::kRoot, [](const Process::Ready& ready) { serveSmallManager(ready); });
     }
     void TearDown() override { mProcess.reset(); }
 

@@ -8,7 +8,6 @@
 #include <gtest/gtest.h>
 
 #include "handset/common/raw_binder.h"
-#include "platform/libbinder_ndk/tests/guest/process.h"
 #include "platform/libbinder_ndk/tests/guest/test_service.h"
 #include "tests/support/kernel_log.h"
 

@@ -8,6 +8,7 @@
 
 #include <atomic>
 #include <chrono>
+#include <filesystem>
 #include <mutex>
 #include <thread>
 
@@ -252,6 +253,13 @@ void serve(const std::string& name, const std::function<void()>& ready) {
     ASSERT_EQ(EX_NONE, AServiceManager_addService(service.get(), name.c_str()));
     ready();
     ABinderProcess_joinThreadPool();
+}
+
+int countDescriptors() {
+    int count = 0;
+    for ([[maybe_unused]] const auto& entry : std::filesystem::directory_iterator("/proc/self/fd"))
+        ++count;
+    return count;
 }
 
 std::string testName() {

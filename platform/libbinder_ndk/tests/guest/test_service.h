@@ -11,9 +11,17 @@
 #include <android/binder_auto_utils.h>
 #include <android/binder_ibinder.h>
 
-#include "platform/libbinder_ndk/tests/guest/process.h"
+#include "tests/support/process.h"
 
 namespace binder_test {
+
+using qvx::test::eventually;
+using qvx::test::inProcess;
+using qvx::test::kApp;
+using qvx::test::kRoot;
+using qvx::test::kShell;
+using qvx::test::kSystem;
+using qvx::test::Process;
 
 // Methods of test.IService. Replies have no status header; every method returns its results
 // plainly.
@@ -72,6 +80,9 @@ ndk::SpAIBinder find(const std::string& name);
 ndk::ScopedAParcel call(const ndk::SpAIBinder& binder, transaction_code_t code,
                         const std::function<void(AParcel*)>& write = nullptr,
                         binder_status_t* status = nullptr, binder_flags_t flags = 0);
+
+// Entries of this process's table of descriptors.
+int countDescriptors();
 
 // Calls whose results are one number, or that take one.
 int32_t callForInt(const ndk::SpAIBinder& binder, transaction_code_t code,
