@@ -64,6 +64,13 @@ bool grants(Access access, int flags) {
            (access == Access::kWriteOnly && wanted == O_WRONLY);
 }
 
+// In real time: nanosleep(2) is one of the calls that lead back here.
+void wait(std::chrono::milliseconds duration) {
+    const timespec time = {.tv_sec = duration.count() / 1000,
+                           .tv_nsec = duration.count() % 1000 * 1'000'000};
+    clock_nanosleep(CLOCK_MONOTONIC, 0, &time, nullptr);
+}
+
 // How a call's record ends: nothing when all went as asked.
 std::string ending(ssize_t result, ssize_t expected) {
     if (result == expected) return "";
@@ -320,7 +327,13 @@ FakeKernel::Outcome FakeKernel::outcome(Operation operation, const std::string& 
         } else if (fault.times > 1) {
             --fault.times;
         }
-        return {fault.error, fault.limit, fault.result};
+        const Outcome outcome = {fault.error, fault.limit, fault.result};
+        if (const std::chrono::milliseconds delay = fault.delay; delay.count() != 0) {
+            mMutex.unlock();
+            wait(delay);
+            mMutex.lock();
+        }
+        return outcome;
     }
     return {};
 }

@@ -24,6 +24,7 @@
 #include <sys/types.h>
 #include <time.h>
 
+#include <chrono>
 #include <condition_variable>
 #include <cstddef>
 #include <cstdint>
@@ -44,13 +45,14 @@ enum class Access { kReadWrite, kReadOnly, kWriteOnly };
 enum class Operation { kOpen, kRead, kWrite, kIoctl };
 
 // Something that goes wrong, in the words of the virtual handset's profiles. Exactly one of
-// `error`, `limit` and `result` says what.
+// `error`, `limit`, `result` and `delay` says what.
 struct Fault {
     std::string path;
     Operation operation = Operation::kOpen;
     int error = 0;                       // the call fails with this errno
     std::optional<size_t> limit = {};    // the call transfers at most so many bytes
     std::optional<ssize_t> result = {};  // the call works, and lies about its result
+    std::chrono::milliseconds delay{0};  // the call works, after so much real time
     int after = 0;                       // so many calls are spared first
     int times = 1;                       // so many calls are hit; 0: all of them
 };
@@ -142,6 +144,7 @@ class FakeKernel {
 
     int openNode(const std::string& path, int flags, const std::string& record);
     ssize_t serveRead(Description& description, void* buffer, size_t size, const Outcome& outcome);
+    // What the faults make of a call; with the kernel unlocked while the call is delayed.
     Outcome outcome(Operation operation, const std::string& path);
     void record(std::string line);
 

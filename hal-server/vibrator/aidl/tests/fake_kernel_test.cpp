@@ -9,6 +9,7 @@
 #include <unistd.h>
 
 #include <cerrno>
+#include <chrono>
 #include <fstream>
 #include <string>
 
@@ -120,6 +121,18 @@ TEST(FakeKernel, SleepTakesNoTime) {
     const timespec duration = {.tv_sec = 3600, .tv_nsec = 70'000'000};
     EXPECT_EQ(nanosleep(&duration, nullptr), 0);
     EXPECT_THAT(kernel.calls(), ElementsAre("sleep 3600070 ms"));
+}
+
+TEST(FakeKernel, DelayTakesRealTimeAndNothingElse) {
+    using std::chrono::milliseconds;
+    FakeKernel kernel;
+    kernel.addNode(kNode);
+    kernel.addFault({.path = kNode, .delay = milliseconds(50)});
+    const auto started = std::chrono::steady_clock::now();
+    close(open(kNode, O_RDONLY));
+    EXPECT_GE(std::chrono::steady_clock::now() - started, milliseconds(50));
+    EXPECT_THAT(kernel.calls(),
+                ElementsAre("open /sys/class/test/node O_RDONLY", "close /sys/class/test/node"));
 }
 
 TEST(FakeMotor, FollowsTheKernelsRulesForEffects) {
