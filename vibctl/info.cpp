@@ -7,6 +7,7 @@
 
 #include <aidl/android/hardware/vibrator/CompositePrimitive.h>
 #include <aidl/vendor/quorvan/hardware/vibrator/ZelAmplitudeType.h>
+#include <android-base/strings.h>
 #include <fmt/format.h>
 
 #include "vibctl/methods.h"
@@ -112,8 +113,20 @@ class Survey {
         }
     }
 
+    // As many lines as it takes, of 100 columns at most where the words allow it.
     void addLine(const std::string& name, const std::string& text) {
-        if (!text.empty()) mText += fmt::format("  {:<32} {}\n", name, text);
+        constexpr size_t kColumns = 100;
+        std::string head = name;
+        std::string line;
+        for (const std::string& word : android::base::Split(text, " ")) {
+            if (!line.empty() && line.size() + 1 + word.size() > kColumns) {
+                mText += line + "\n";
+                line.clear();
+                head.clear();
+            }
+            line = line.empty() ? fmt::format("  {:<32} {}", head, word) : line + " " + word;
+        }
+        if (!text.empty()) mText += line + "\n";
     }
 
     const Ask& mAsk;

@@ -7,6 +7,7 @@
 
 #include <condition_variable>
 #include <csignal>
+#include <memory>
 #include <mutex>
 #include <optional>
 #include <thread>
@@ -34,14 +35,21 @@ class CompletionCallback : public aidl::android::hardware::vibrator::BnVibratorC
         return ndk::ScopedAStatus::ok();
     }
 
-    // To be called before the call: hears of the death of the service, for the rest of the process.
-    void watch(const Service& service) {
-        mService = service;
-        mCalled = Clock::now();
-        AIBinder_DeathRecipient* const recipient = AIBinder_DeathRecipient_new(
-                [](void* self) { static_cast<CompletionCallback*>(self)->finish(End::kDied); });
-        if (AIBinder_linkToDeath(service->asBinder().get(), recipient, this) != STATUS_OK)
-            finish(End::kDied);
+    // To be called before the call: `callback` hears of the death of the service.
+    static void watch(const std::shared_ptr<CompletionCallback>& callback, const Service& service) {
+        callback->mService = service;
+        callback->mCalled = Clock::now();
+        // Whoever holds the callback may let go of it before the service dies. The recipient and what
+        // it is given stay: a notice may be on its way at any time.
+        using Weak = std::weak_ptr<CompletionCallback>;
+        static AIBinder_DeathRecipient* const recipient =
+                AIBinder_DeathRecipient_new([](void* weak) {
+                    if (const auto self = static_cast<Weak*>(weak)->lock())
+                        self->finish(End::kDied);
+                });
+        auto* const weak = new Weak(callback);
+        if (AIBinder_linkToDeath(service->asBinder().get(), recipient, weak) != STATUS_OK)
+            callback->finish(End::kDied);
     }
 
     // Waits `limit` at most for the end. `taken` becomes the time from watch() to it.
@@ -79,10 +87,14 @@ void await(CompletionCallback& callback, milliseconds limit, Outcome& outcome) {
         case CompletionCallback::End::kTimedOut:
             outcome.completion = {Completion::Kind::kTimedOut, limit.count()};
             break;
-        case CompletionCallback::End::kDied:
+        case CompletionCallback::End::kDied: {
+            const int64_t sent = outcome.sentMicroseconds;
             outcome =
                     transportFailure(STATUS_DEAD_OBJECT, "the service died before it called back");
+            outcome.sentMicroseconds = sent;
+            outcome.microseconds = std::chrono::microseconds(taken).count();
             break;
+        }
     }
 }
 
@@ -91,12 +103,18 @@ void await(CompletionCallback& callback, milliseconds limit, Outcome& outcome) {
 Outcome askService(const std::string& iface, milliseconds limit,
                    const std::function<Outcome(const Service& service)>& work) {
     if (const Problem problem = checkBinder(limit)) return noService(*problem);
+    const Clock::time_point asked = Clock::now();
     const auto outcome = within(limit, [iface, work] {
         Problem problem;
         const Service service = connect(iface, problem);
         return problem ? noService(*problem) : work(service);
     });
-    return outcome ? *outcome : noAnswer(limit);
+    if (outcome) return *outcome;
+    Outcome none = noAnswer(limit);
+    using std::chrono::duration_cast, std::chrono::microseconds;
+    none.sentMicroseconds = duration_cast<microseconds>(asked.time_since_epoch()).count();
+    none.microseconds = duration_cast<microseconds>(Clock::now() - asked).count();
+    return none;
 }
 
 Outcome callMethod(const CommandLine& line, const Method& method, const Call& call) {
@@ -110,7 +128,7 @@ Outcome callMethod(const CommandLine& line, const Method& method, const Call& ca
                                  [call, callback, awaited](const Service& service) {
                                      // The service may call back as soon as it has the callback.
                                      ABinderProcess_startThreadPool();
-                                     if (awaited) callback->watch(service);
+                                     if (awaited) CompletionCallback::watch(callback, service);
                                      return call(*service, callback);
                                  });
     if (awaited && outcome.exception == EX_NONE) await(*callback, line.wait, outcome);

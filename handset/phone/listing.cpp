@@ -18,6 +18,7 @@ namespace {
 using Json = nlohmann::ordered_json;
 
 constexpr std::string_view kNodeRoot = "/sys/class/";
+constexpr int kFullGain = 10000;     // of this driver
 constexpr size_t kMostSamples = 16;  // of an upload that are shown
 
 std::string shown(const Json& value) {
@@ -65,7 +66,7 @@ std::string eventOf(const Json& line) {
     const int code = line.value("code", 0);
     const int value = line.value("value", 0);
     if (type != EV_FF) return fmt::format("type {} code {} value {}", type, code, value);
-    if (code == FF_GAIN) return fmt::format("gain {} ({} %)", value, value * 100 / 0xffff);
+    if (code == FF_GAIN) return fmt::format("gain {} ({} %)", value, value / (kFullGain / 100));
     if (value == 0) return fmt::format("stop effect {}", code);
     return value == 1 ? fmt::format("play effect {}", code)
                       : fmt::format("play effect {}, value {}", code, value);
@@ -117,6 +118,7 @@ ListingLine listed(int64_t us, std::string_view kind, std::string_view text) {
 }
 
 std::string answerOf(const Json& answer) {
+    if (const std::string text = answer.value("text", ""); !text.empty()) return text;
     if (answer.value("exception", 0) != 0) {
         return fmt::format("exception {} {}", answer.value("exception", 0),
                            answer.value("message", ""));

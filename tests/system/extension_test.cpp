@@ -76,6 +76,25 @@ TEST(Extension, WithoutAFeatureListNodesAnswer) {
     EXPECT_EQ(phone.call({"ext", "hasFeature", "INTENSITY"})["exception"], -7);
 }
 
+TEST(Extension, HasFeatureKnowsTheWholeWordsThatABuiltInPhoneLists) {
+    const struct {
+        const char* profile;
+        const char* listed;
+        const char* other;
+    } rows[] = {{"leds", "PRIMITIVE_EFFECT_COMPOSE", "COMMON_INPUTFF_INTERFACE"},
+                {"legacy", "ENHANCED_HAPTIC_ENGINE", "FIFO_HAPTIC_ENGINE"},
+                {"ff", "COMMON_INPUTFF_INTERFACE", "HAPTIC_ENGINE"},
+                {"leds-haptic-engine", "HAPTIC_ENGINE", "INDEX_HAPTIC_PATTERN"},
+                {"legacy-prebaked-index", "INDEX_HAPTIC_PATTERN", "HAPTIC_PATTERN"}};
+    for (const auto& [profile, listed, other] : rows) {
+        const Phone phone(profile);
+        EXPECT_EQ(phone.call({"ext", "hasFeature", "INTENSITY"})["result"], true) << profile;
+        EXPECT_EQ(phone.call({"ext", "hasFeature", listed})["result"], true) << profile;
+        EXPECT_EQ(phone.call({"ext", "hasFeature", other})["result"], false) << profile;
+        EXPECT_EQ(phone.call({"ext", "hasFeature", "HAPTIC"})["result"], false) << profile;
+    }
+}
+
 TEST(Extension, WithoutADeviceNothingIsOfferedAndNothingWorks) {
     const Phone phone("none");
     EXPECT_EQ(phone.call({"ext", "supportsAmplitudeControl"})["result"], false);

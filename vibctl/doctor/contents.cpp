@@ -5,6 +5,7 @@
 
 #include <algorithm>
 #include <string_view>
+#include <utility>
 
 #include <android-base/parseint.h>
 #include <android-base/strings.h>
@@ -45,6 +46,18 @@ constexpr Feature kFeatures[] = {
         {"PRIMITIVE_EFFECT_COMPOSE", nullptr},
 };
 
+// Of two nodes, what the first is without the second.
+struct Companion {
+    const char* node;
+    const char* missing;
+    const char* cost;
+};
+
+constexpr Companion kCompanions[] = {
+        {"cp_trigger_index", "cp_trigger_queue", "no pattern is repeated or composed"},
+        {"cp_trigger_index", "num_waves", "clients get no number of patterns"},
+};
+
 bool isFeature(std::string_view word) {
     return std::any_of(std::begin(kFeatures), std::end(kFeatures),
                        [word](const Feature& one) { return one.word == word; });
@@ -66,6 +79,7 @@ class ContentsCheck {
     std::vector<Finding> run() {
         const bool isSysfs = mDriver.deviceClass != DeviceClass::kForceFeedback;
         if (isSysfs) checkMotorType();
+        if (isSysfs) checkCompanions();
         checkWords();
         checkWordsAgainstNodes(isSysfs);
         checkTables();
@@ -80,6 +94,8 @@ class ContentsCheck {
         return mDriver.open.count(mDriver.directory + node) != 0;
     }
 
+    bool lacks(const std::string& path) const { return mView.describe(path).empty(); }
+
     // What the node says; nothing when the service cannot read it either.
     std::optional<std::string> read(const std::string& path) const {
         if (mDriver.open.count(path) == 0) return std::nullopt;
@@ -92,9 +108,11 @@ class ContentsCheck {
     }
 
     void checkMotorType();
+    void checkCompanions();
     void checkWords();
     void checkWordsAgainstNodes(bool isSysfs);
     void checkTables();
+    void checkLoneTable();
     void checkNodeNames();
     void checkCalibration();
     std::string features() const;
@@ -107,7 +125,12 @@ class ContentsCheck {
 
 void ContentsCheck::checkMotorType() {
     constexpr const char* kCheck = "motor type";
-    const std::optional<std::string> text = read(mDriver.directory + "motor_type");
+    const std::string path = mDriver.directory + "motor_type";
+    if (lacks(path)) {
+        mFindings.push_back(note(kCheck, "without motor_type the amplitude tables are guessed",
+                                 "add the node"));
+    }
+    const std::optional<std::string> text = read(path);
     if (!text) return;
     // The service drops the last byte, whatever it is.
     const std::string name = text->substr(0, text->empty() ? 0 : text->size() - 1);
@@ -122,6 +145,14 @@ void ContentsCheck::checkMotorType() {
         mFindings.push_back(bad(kCheck, fmt::format("\"{}\" is unknown and counts as NONE", name),
                                 near.empty() ? "write a name that is known"
                                              : fmt::format("write {}", near.front())));
+    }
+}
+
+void ContentsCheck::checkCompanions() {
+    for (const Companion& one : kCompanions) {
+        if (!has(one.node) || !lacks(mDriver.directory + one.missing)) continue;
+        mFindings.push_back(
+                note("nodes", fmt::format("without {} {}", one.missing, one.cost), "add it"));
     }
 }
 
@@ -183,7 +214,10 @@ void ContentsCheck::checkTables() {
                mDriver.open.count(directory + "haptic_intensities") != 0;
     };
     if (!hasBoth()) directory = mDriver.directory;
-    if (!hasBoth()) return;
+    if (!hasBoth()) {
+        checkLoneTable();
+        return;
+    }
     for (const char* name : {"intensities", "haptic_intensities"}) {
         const std::string text = android::base::Trim(read(directory + name).value_or(""));
         for (const std::string& piece : android::base::Split(text, ",")) {
@@ -192,6 +226,19 @@ void ContentsCheck::checkTables() {
             mFindings.push_back(bad("intensities", fmt::format("{} holds \"{}\"", name, piece),
                                     "write numbers, commas between"));
             break;
+        }
+    }
+}
+
+// One of the two tables, and nowhere the other beside it.
+void ContentsCheck::checkLoneTable() {
+    for (const std::string& directory : {std::string(kInfoDirectory), mDriver.directory}) {
+        for (const auto& [name, other] : {std::pair("intensities", "haptic_intensities"),
+                                          std::pair("haptic_intensities", "intensities")}) {
+            if (mDriver.open.count(directory + name) == 0 || !lacks(directory + other)) continue;
+            mFindings.push_back(note("intensities",
+                                     fmt::format("{} does not count without {}", name, other),
+                                     "add it"));
         }
     }
 }

@@ -64,7 +64,7 @@ Finding DriverCheck::unopenable(const char* check, const std::string& path, int 
                "see the kernel log");
 }
 
-// The LED class needs all three of its nodes. Good when none of them is there.
+// The LED class needs all three of its nodes. Good when the driver has no LED node at all.
 Finding DriverCheck::checkLeds(bool& chosen) const {
     constexpr const char* kCheck = "device class";
     std::vector<Access> leds;
@@ -76,11 +76,15 @@ Finding DriverCheck::checkLeds(bool& chosen) const {
     }
     chosen = errors == std::vector<int>{0, 0, 0};
     if (chosen) return good(kCheck, fmt::format("LED class, {}", kLedsDirectory));
-    if (missing.size() == errors.size()) return good(kCheck, "");
+    if (missing.size() == errors.size() && mView.list(kLedsDirectory).empty()) {
+        return good(kCheck, "");
+    }
     if (!missing.empty()) {
-        const char* const count = missing.size() == 1 ? "two of three LED nodes are there"
-                                                      : "one of three LED nodes is there";
-        return bad(kCheck, fmt::format("{}; the driver lacks {}", count, fmt::join(missing, ", ")),
+        constexpr const char* kPresent[] = {"two of three LED nodes are there; ",
+                                            "one of three LED nodes is there; ", "for LEDs "};
+        return bad(kCheck,
+                   fmt::format("{}the driver lacks {}", kPresent[missing.size() - 1],
+                               fmt::join(missing, ", ")),
                    "add it");
     }
     const auto first = std::find_if(errors.begin(), errors.end(), [](int e) { return e != 0; });
@@ -114,6 +118,13 @@ Finding DriverCheck::checkMotor() {
         if (device.name.find("vib") == std::string::npos) continue;
         return bad(kCheck, fmt::format("the motor is called \"{}\"", device.name),
                    fmt::format("call it {}", kMotorName));
+    }
+    if (!mView.list(kForceFeedbackDirectory).empty()) {
+        return bad(kCheck, "control nodes, but no motor in the input list: it is unplugged",
+                   "plug it in");
+    }
+    if (!mView.list(kLegacyDirectory).empty()) {
+        return bad(kCheck, "timed_output nodes are there; the driver lacks enable", "add it");
     }
     return bad(kCheck, "no timed_output or leds node, no motor in the input list",
                "load the driver");

@@ -80,6 +80,7 @@ TEST_P(HealthyPhone, IsWell) {
                          std::string(GetParam().nodes), std::string(GetParam().features),
                          std::string("all is well")}));
     EXPECT_THAT(diagnosis.lines, Contains(StartsWith(GetParam().deviceClass)));
+    EXPECT_THAT(diagnosis.lines, testing::Not(Contains(StartsWith("note"))));
     for (const nlohmann::json& line : phone.journal()) {
         EXPECT_THAT(line.value("op", ""), testing::AnyOf("open", "read", "close")) << line.dump();
     }
@@ -206,6 +207,14 @@ TEST(Doctor, NamesANodeThatTheServicesUserCannotOpen) {
 }
 
 TEST(Doctor, SaysThatTheMotorIsUnplugged) {
+    const Phone phone("ff");
+    ASSERT_EQ(runCommand({"phone", "unplug"}).status, 0);
+    EXPECT_THAT(diagnose(phone.servicePid()).lines,
+                Contains("bad  device class: control nodes, but no motor in the input list: it is "
+                         "unplugged; next: plug it in"));
+}
+
+TEST(Doctor, SaysThatTheMotorHasNoDevice) {
     const Phone phone("ff");
     phone.fault({{"node", "motor"}, {"op", "open"}, {"errno", "ENODEV"}});
     EXPECT_THAT(diagnose(phone.servicePid()).lines,

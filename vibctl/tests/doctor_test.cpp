@@ -53,9 +53,9 @@ class DoctorTest : public ::testing::Test {
 };
 
 TEST_F(DoctorTest, AsksEveryQuestionInTheOrderInWhichOneNeedsTheOther) {
-    mRoot.putNodes("/sys/class/leds/vibrator",
-                   {"activate", "duration", "state", "intensity", "cp_trigger_index",
-                    "haptic_engine", "fifo", "hybrid_haptic_engine"});
+    mRoot.putNodes("/sys/class/leds/vibrator", {"activate", "duration", "state", "intensity",
+                                                "cp_trigger_index", "cp_trigger_queue", "num_waves",
+                                                "haptic_engine", "fifo", "hybrid_haptic_engine"});
     mRoot.put("/sys/class/leds/vibrator/motor_type", "LINEAR_1040\n");
     EXPECT_THAT(
             lines(),
@@ -64,7 +64,7 @@ TEST_F(DoctorTest, AsksEveryQuestionInTheOrderInWhichOneNeedsTheOther) {
                         "ok   registration: process 312, version 2",
                         "ok   user: process 312 is user 1000",
                         "ok   device class: LED class, /sys/class/leds/vibrator/",
-                        "ok   nodes: user 1000 can open all 10 that the driver has, of 25 known",
+                        "ok   nodes: user 1000 can open all 12 that the driver has, of 25 known",
                         "ok   motor type: LINEAR_1040",
                         "ok   features: amplitude, effects by pattern, compositions, external "
                         "control, packets, FIFO, hybrid",

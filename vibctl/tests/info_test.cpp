@@ -3,6 +3,7 @@
 // What is asked for the overview, and how the answers stand on one screen.
 #include "vibctl/info.h"
 
+#include <android-base/strings.h>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
@@ -77,6 +78,14 @@ TEST(Info, HasALineForEachAnswerAndOneForAllThatIsNotOffered) {
     EXPECT_THAT(outcome.text, HasSubstr("supportsFrequencyControl"));
     EXPECT_THAT(outcome.text, Not(HasSubstr("\n  getQFactor")));
     EXPECT_THAT(outcome.text, HasSubstr("getQFactor"));
+}
+
+TEST(Info, HasNoLineOfMoreThanAHundredColumns) {
+    const std::string text = askEverything(ask).text;
+    EXPECT_THAT(text, HasSubstr("\n                                   "));
+    for (const std::string& line : android::base::Split(text, "\n")) {
+        EXPECT_LE(line.size(), 100u) << line;
+    }
 }
 
 TEST(Info, IsAnObjectForPrograms) {

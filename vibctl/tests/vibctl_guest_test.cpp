@@ -12,6 +12,7 @@
 
 #include "platform/servicemanager/tests/processes.h"
 #include "tests/support/command.h"
+#include "tests/support/fake_root.h"
 #include "tests/support/kernel_log.h"
 #include "vibctl/tests/fake_service.h"
 

@@ -46,7 +46,7 @@ TEST(Listing, EventsSayWhatTheyMean) {
     };
     EXPECT_EQ(event("3", "1"), "event   play effect 3");
     EXPECT_EQ(event("3", "0"), "event   stop effect 3");
-    EXPECT_EQ(event("96", "65535"), "event   gain 65535 (100 %)");
+    EXPECT_EQ(event("96", "5000"), "event   gain 5000 (50 %)");
 }
 
 TEST(Listing, ACallIsAskedAndAnswered) {
@@ -58,6 +58,14 @@ TEST(Listing, ACallIsAskedAndAnswered) {
     EXPECT_EQ(lines[0].text, "call    std on 500");
     EXPECT_EQ(lines[1].us, 8123912);
     EXPECT_EQ(lines[1].text, "answer  std on 500: ok, 1.4 ms");
+}
+
+TEST(Listing, AnAnswerSaysWhatTheClientWasShown) {
+    const std::vector<ListingLine> lines =
+            fromCalls(R"({"us":1,"call":["std","on","5"],"answer":{"exception":-5,"us":900,)"
+                      R"("text":"EX_ILLEGAL_STATE; the driver refused"}})");
+    ASSERT_EQ(lines.size(), 2U);
+    EXPECT_EQ(lines[1].text, "answer  std on 5: EX_ILLEGAL_STATE; the driver refused, 0.9 ms");
 }
 
 TEST(Listing, WhatIsNoLineOfARunIsLeftOut) {
