@@ -9,18 +9,16 @@
 #include <string_view>
 #include <utility>
 
+#include <android-base/strings.h>
 #include <fmt/format.h>
 
 namespace handset {
 namespace {
 
 using android::base::ErrnoError;
-
 using android::base::Result;
 
 constexpr const char* kInputDevices = "/proc/bus/input/devices";
-
-constexpr std::string_view kEventMark = "{event}";
 
 constexpr std::string_view kKeyboard =
         "I: Bus=0011 Vendor=0001 Product=0001 Version=ab41\n"
@@ -50,19 +48,13 @@ constexpr std::string_view kMotor =
         "B: FF=120030000 0\n"
         "\n";
 
-std::string filledIn(std::string text, unsigned event) {
-    const std::string number = std::to_string(event);
-    for (size_t at = text.find(kEventMark); at != std::string::npos;
-         at = text.find(kEventMark, at + number.size())) {
-        text.replace(at, kEventMark.size(), number);
-    }
-    return text;
-}
-
 }  // namespace
 
 std::string inputDevicesText(const Profile& profile, unsigned event, bool plugged) {
-    if (profile.inputDevices) return filledIn(*profile.inputDevices, event);
+    if (profile.inputDevices) {
+        return android::base::StringReplace(*profile.inputDevices, "{event}", std::to_string(event),
+                                            true);
+    }
     std::string text(kKeyboard);
     if (profile.motor && plugged)
         text += fmt::format(kMotor, profile.motor->name, event + 1, event);

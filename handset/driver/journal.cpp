@@ -15,6 +15,7 @@
 #include <fmt/format.h>
 
 #include "handset/driver/error_names.h"
+#include "handset/driver/open_flags.h"
 
 namespace handset {
 
@@ -27,6 +28,13 @@ using std::chrono::steady_clock;  // CLOCK_MONOTONIC
 nlohmann::ordered_json resultOf(int64_t countOrNegativeError) {
     if (countOrNegativeError >= 0) return countOrNegativeError;
     return errorName(static_cast<int>(-countOrNegativeError));
+}
+
+JournalFields openLine(std::string_view node, int flags, int error) {
+    return {{"op", "open"},
+            {"node", node},
+            {"flags", openFlagsText(flags)},
+            {"error", resultOf(-error)}};
 }
 
 Result<std::unique_ptr<Journal>> Journal::create(const std::string& path) {

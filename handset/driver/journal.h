@@ -9,6 +9,7 @@
 #include <memory>
 #include <mutex>
 #include <string>
+#include <string_view>
 
 #include <android-base/result.h>
 #include <android-base/thread_annotations.h>
@@ -25,6 +26,9 @@ using JournalFields = nlohmann::ordered_json;
 
 // A count, or for a negative value the name of that error: 4, "EIO".
 nlohmann::ordered_json resultOf(int64_t countOrNegativeError);
+
+// The fields of an open; `error` is its number, or 0.
+JournalFields openLine(std::string_view node, int flags, int error);
 
 // What a fault did to a call, and when that call arrived.
 struct Strike {

@@ -31,7 +31,6 @@
 #include "handset/driver/effect_slots.h"
 #include "handset/driver/handle_table.h"
 #include "handset/driver/motor_queries.h"
-#include "handset/driver/open_flags.h"
 #include "handset/driver/printable.h"
 #include "handset/driver/request_delay.h"
 
@@ -80,11 +79,6 @@ bool isGone(State& state, const fuse_file_info* info) {
            state.faults.unplugsOf(kMotorNode) != state.files.get(info->fh).unplugs;
 }
 
-// Meets the fault that is due, if any: its error, or EINTR where its delay was cut short, or 0.
-int meetFault(fuse_req_t request, State& state, const FaultAction& fault) {
-    return delayRequest(request, fault.delay, state.stopping) ? fault.error : EINTR;
-}
-
 void onInitDone(void* data) {
     static_cast<State*>(data)->ready.release();
 }
@@ -95,12 +89,8 @@ void onOpen(fuse_req_t request, fuse_file_info* info) {
     const auto arrival = std::chrono::steady_clock::now();
     const uint64_t unplugs = state.faults.unplugsOf(kMotorNode);
     const FaultAction fault = state.faults.next(kMotorNode, FaultOp::kOpen);
-    const int error = meetFault(request, state, fault);
-    state.journal.record(opener.caller(),
-                         {{"op", "open"},
-                          {"node", kMotorNode},
-                          {"flags", openFlagsText(info->flags)},
-                          {"error", resultOf(-error)}},
+    const int error = meetFault(request, fault, state.stopping);
+    state.journal.record(opener.caller(), openLine(kMotorNode, info->flags, error),
                          {fault, arrival});
     if (error != 0) {
         fuse_reply_err(request, error);
@@ -180,7 +170,7 @@ void onWrite(fuse_req_t request, const char* data, size_t size, off_t, fuse_file
     const std::string_view events(data, size - size % sizeof(input_event));
     const auto arrival = std::chrono::steady_clock::now();
     const FaultAction fault = state.faults.nextOf(kMotorNode, FaultOp::kWrite, file.unplugs);
-    const int error = meetFault(request, state, fault);
+    const int error = meetFault(request, fault, state.stopping);
     const size_t taken = std::min(events.size(), fault.shortCount.value_or(events.size()));
     recordEvents(state, caller, events, taken, error, {fault, arrival});
     if (error != 0) {
@@ -256,7 +246,7 @@ void onUpload(fuse_req_t request, char* record, const fuse_file_info* info, cons
     if (result == 0) {
         fault = state.faults.nextOf(kMotorNode, FaultOp::kUpload,
                                     state.files.get(info->fh).unplugs);
-        result = -meetFault(request, state, fault);
+        result = -meetFault(request, fault, state.stopping);
     }
     const std::string_view custom(static_cast<const char*>(buffer) + sizeof effect,
                                   size - sizeof effect);
@@ -275,7 +265,7 @@ void onErase(fuse_req_t request, int id, const fuse_file_info* info) {
     FaultAction fault;
     if (result == 0) {
         fault = state.faults.nextOf(kMotorNode, FaultOp::kErase, file.unplugs);
-        result = -meetFault(request, state, fault);
+        result = -meetFault(request, fault, state.stopping);
     }
     {
         const std::lock_guard lock(state.slotsMutex);
@@ -363,13 +353,10 @@ Result<std::unique_ptr<MotorDevice>> MotorDevice::start(const MotorProfile& moto
     const char* deviceInfo[] = {deviceName.c_str()};
     const cuse_info info{0, 0, 1, deviceInfo, CUSE_UNRESTRICTED_IOCTL};
     const cuse_lowlevel_ops ops = operations();
-    started->mSession = cuse_lowlevel_new(&args, &info, &ops, &state);
+    fuse_session* const session = cuse_lowlevel_new(&args, &info, &ops, &state);
     fuse_opt_free_args(&args);
-    if (started->mSession == nullptr) return Error() << "no CUSE session";
-
-    const int fd = device.release();  // the session closes it
-    fuse_session_mount(started->mSession, fmt::format("/dev/fd/{}", fd).c_str());
-    started->mLoop = std::make_unique<SessionLoop>(started->mSession, fd, ended);
+    if (session == nullptr) return Error() << "no CUSE session";
+    started->mLoop = std::make_unique<SessionLoop>(session, std::move(device), ended);
     if (!state.ready.try_acquire_for(kInitTimeout)) {
         return Error() << fmt::format("{}: the kernel did not make the device",
                                       eventNodePath(event));
@@ -385,8 +372,6 @@ void MotorDevice::forgetEffects() {
 
 MotorDevice::~MotorDevice() {
     if (mState) mState->stopping = true;
-    mLoop.reset();
-    if (mSession != nullptr) fuse_session_destroy(mSession);
 }
 
 }  // namespace handset

@@ -15,8 +15,6 @@
 #include "handset/driver/profile.h"
 #include "handset/driver/session_loop.h"
 
-struct fuse_session;
-
 namespace handset {
 
 class MotorDevice {
@@ -44,7 +42,6 @@ class MotorDevice {
     MotorDevice() = default;
 
     std::unique_ptr<State> mState;
-    fuse_session* mSession = nullptr;
     EventNode mNode;
     std::unique_ptr<SessionLoop> mLoop;
 };

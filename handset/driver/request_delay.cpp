@@ -4,6 +4,7 @@
 #include "handset/driver/request_delay.h"
 
 #include <algorithm>
+#include <cerrno>
 #include <condition_variable>
 #include <mutex>
 
@@ -48,6 +49,10 @@ bool delayRequest(fuse_req_t request, std::chrono::milliseconds delay,
     // library holds its own.
     fuse_req_interrupt_func(request, nullptr, nullptr);
     return !happened;
+}
+
+int meetFault(fuse_req_t request, const FaultAction& fault, const std::atomic<bool>& stopping) {
+    return delayRequest(request, fault.delay, stopping) ? fault.error : EINTR;
 }
 
 }  // namespace handset

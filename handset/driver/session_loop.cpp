@@ -13,8 +13,12 @@
 #include <cstring>
 #include <utility>
 
+#include <fmt/format.h>
+
 namespace handset {
 namespace {
+
+using android::base::unique_fd;
 
 // As many calls can be kept waiting at once before the driver stops listening, to interruptions
 // among others.
@@ -35,8 +39,12 @@ void signalEvent(int event) {
 
 }  // namespace
 
-SessionLoop::SessionLoop(fuse_session* session, int device, int ended)
-    : mSession(session), mDevice(device), mEnded(ended), mStop(eventfd(0, EFD_CLOEXEC)) {
+SessionLoop::SessionLoop(fuse_session* session, unique_fd device, int ended)
+    : mSession(session),
+      mDevice(device.release()),  // the session closes it
+      mEnded(ended),
+      mStop(eventfd(0, EFD_CLOEXEC)) {
+    fuse_session_mount(mSession, fmt::format("/dev/fd/{}", mDevice).c_str());
     addWorker();
 }
 
@@ -50,9 +58,10 @@ SessionLoop::~SessionLoop() {
             const std::lock_guard lock(mWorkersMutex);
             workers.swap(mWorkers);
         }
-        if (workers.empty()) return;
+        if (workers.empty()) break;
         for (std::thread& worker : workers) worker.join();
     }
+    fuse_session_destroy(mSession);
 }
 
 void SessionLoop::addWorker() {

@@ -21,14 +21,15 @@ namespace handset {
 // Serves a session until it is stopped or its mount is gone.
 class SessionLoop {
   public:
-    // Starts serving. `session` is attached to `device` (non-blocking) and outlives the loop.
-    // `ended` is an event descriptor that becomes readable when the loop ends by itself.
-    SessionLoop(fuse_session* session, int device, int ended);
+    // Attaches the session, which becomes this object's, to `device` (non-blocking) and starts
+    // serving. `ended` is an event descriptor that becomes readable when the loop ends by itself.
+    SessionLoop(fuse_session* session, android::base::unique_fd device, int ended);
 
     SessionLoop(const SessionLoop&) = delete;
     SessionLoop& operator=(const SessionLoop&) = delete;
 
-    // Stops serving and waits for the threads; what they are busy with is finished first.
+    // Stops serving and waits for the threads; what they are busy with is finished first. Then the
+    // session is over.
     ~SessionLoop();
 
     // Waits until the files closed so far have been released: a close may return before the

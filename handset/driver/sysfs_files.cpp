@@ -10,7 +10,6 @@
 #include <string>
 #include <utility>
 
-#include "handset/driver/open_flags.h"
 #include "handset/driver/printable.h"
 #include "handset/driver/request_delay.h"
 #include "handset/driver/sysfs_requests.h"
@@ -26,18 +25,6 @@ bool isOpenable(const Node& node, unsigned wanted) {
     const mode_t mode = node.attributes().mode;
     return ((wanted & kMayRead) == 0 || (mode & 0444) != 0) &&
            ((wanted & kMayWrite) == 0 || (mode & 0222) != 0);
-}
-
-JournalFields openLine(const std::string& path, int flags, int error) {
-    return {{"op", "open"},
-            {"node", path},
-            {"flags", openFlagsText(flags)},
-            {"error", resultOf(-error)}};
-}
-
-// Meets the fault that is due: its error, or EINTR where its delay was cut short, or 0.
-int meetFault(fuse_req_t request, const State& state, const FaultAction& fault) {
-    return delayRequest(request, fault.delay, state.stopping) ? fault.error : EINTR;
 }
 
 void onOpen(fuse_req_t request, fuse_ino_t inode, fuse_file_info* info) {
@@ -56,7 +43,7 @@ void onOpen(fuse_req_t request, fuse_ino_t inode, fuse_file_info* info) {
     if (isOpenable(node, wantedBy(info->flags)) &&
         callerIsGranted(request, node, neededBy(info->flags))) {
         fault = state.faults.next(node.path(), FaultOp::kOpen);
-        error = meetFault(request, state, fault);
+        error = meetFault(request, fault, state.stopping);
     }
     state.journal.record(opener.caller(), openLine(node.path(), info->flags, error),
                          {fault, arrival});
@@ -77,7 +64,7 @@ void onRead(fuse_req_t request, fuse_ino_t, size_t size, off_t offset, fuse_file
     const auto at = static_cast<size_t>(offset);
     const FaultAction fault = state.faults.nextOf(file.node.path(), FaultOp::kRead, file.unplugs,
                                                   file.continuesAt(at));
-    int error = meetFault(request, state, fault);
+    int error = meetFault(request, fault, state.stopping);
     if (!file.node.isReadable()) error = EIO;
 
     std::string part;
@@ -106,7 +93,7 @@ void onWrite(fuse_req_t request, fuse_ino_t, const char* data, size_t size, off_
     OpenNode& file = state.files.get(info->fh);
     const auto arrival = std::chrono::steady_clock::now();
     const FaultAction fault = state.faults.nextOf(file.node.path(), FaultOp::kWrite, file.unplugs);
-    int error = meetFault(request, state, fault);
+    int error = meetFault(request, fault, state.stopping);
     if (!file.node.isWritable()) error = EIO;
     const std::string_view bytes(data, size);
     const std::string_view taken = bytes.substr(0, fault.shortCount.value_or(size));

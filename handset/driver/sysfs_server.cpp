@@ -7,6 +7,7 @@
 #include <sys/mount.h>
 
 #include <string>
+#include <utility>
 
 #include <android-base/unique_fd.h>
 #include <fmt/format.h>
@@ -38,17 +39,6 @@ Result<std::unique_ptr<SysfsServer>> SysfsServer::start(const NodeTree& tree, Fa
 
     std::unique_ptr<SysfsServer> server(new SysfsServer);
     server->mState = std::unique_ptr<State>(new State{tree, faults, journal});
-    char name[] = "handset-driver";
-    char* arguments[] = {name, nullptr};
-    fuse_args args = FUSE_ARGS_INIT(1, arguments);
-    fuse_lowlevel_ops ops{};
-    ops.init = onInit;
-    addTreeRequests(ops);
-    addFileRequests(ops);
-    server->mSession = fuse_session_new(&args, &ops, sizeof ops, server->mState.get());
-    fuse_opt_free_args(&args);
-    if (server->mSession == nullptr) return Error() << "no FUSE session";
-
     const std::string root(kSysfsRoot);
     const std::string options =
             fmt::format("fd={},rootmode=40000,user_id=0,group_id=0,allow_other", device.get());
@@ -57,9 +47,18 @@ Result<std::unique_ptr<SysfsServer>> SysfsServer::start(const NodeTree& tree, Fa
         return ErrnoError() << "mount on " + root;
     }
     server->mMounted = true;
-    const int fd = device.release();  // the session closes it
-    fuse_session_mount(server->mSession, fmt::format("/dev/fd/{}", fd).c_str());
-    server->mLoop = std::make_unique<SessionLoop>(server->mSession, fd, ended);
+
+    char name[] = "handset-driver";
+    char* arguments[] = {name, nullptr};
+    fuse_args args = FUSE_ARGS_INIT(1, arguments);
+    fuse_lowlevel_ops ops{};
+    ops.init = onInit;
+    addTreeRequests(ops);
+    addFileRequests(ops);
+    fuse_session* const session = fuse_session_new(&args, &ops, sizeof ops, server->mState.get());
+    fuse_opt_free_args(&args);
+    if (session == nullptr) return Error() << "no FUSE session";
+    server->mLoop = std::make_unique<SessionLoop>(session, std::move(device), ended);
     return server;
 }
 
@@ -71,8 +70,6 @@ SysfsServer::~SysfsServer() {
     if (mLoop) settle();
     if (mState) mState->stopping = true;
     if (mMounted) umount2(std::string(kSysfsRoot).c_str(), MNT_DETACH);
-    mLoop.reset();
-    if (mSession != nullptr) fuse_session_destroy(mSession);
 }
 
 }  // namespace handset

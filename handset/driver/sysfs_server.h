@@ -21,8 +21,6 @@
 #include "handset/driver/node_tree.h"
 #include "handset/driver/session_loop.h"
 
-struct fuse_session;
-
 namespace handset {
 
 // Where the nodes are mounted.
@@ -53,9 +51,8 @@ class SysfsServer {
     SysfsServer() = default;
 
     std::unique_ptr<State> mState;
-    fuse_session* mSession = nullptr;
-    std::unique_ptr<SessionLoop> mLoop;
     bool mMounted = false;
+    std::unique_ptr<SessionLoop> mLoop;
 };
 
 }  // namespace handset
