@@ -85,34 +85,19 @@ auto with(Call call) {
 }
 
 hal::CompositeEffect click(int32_t delayMs) {
-    hal::CompositeEffect effect;
-    effect.delayMs = delayMs;
-    effect.primitive = hal::CompositePrimitive::CLICK;
-    effect.scale = 1.0F;
-    return effect;
+    return {.delayMs = delayMs, .primitive = hal::CompositePrimitive::CLICK, .scale = 1.0F};
 }
 
 vendor::ZelHapticEnginePacket packet() {
-    vendor::ZelHapticEnginePacket packet;
-    packet.time = 7;
-    packet.intensity = 10000;
-    packet.frequency = 2050;
-    return packet;
+    return {.time = 7, .intensity = 10000, .frequency = 2050};
 }
 
 vendor::ZelHybridHapticEnginePacket hybridPacket() {
-    vendor::ZelHybridHapticEnginePacket packet;
-    packet.time = 5;
-    packet.intensity = 5000;
-    packet.value = 3;
-    return packet;
+    return {.time = 5, .intensity = 5000, .value = 3};
 }
 
 vendor::ZelPlaybackPacket playbackPacket() {
-    vendor::ZelPlaybackPacket packet;
-    packet.patternIndex = 5;
-    packet.level = 100;
-    return packet;
+    return {.patternIndex = 5, .level = 100};
 }
 
 ptrdiff_t threadsOfProcess() {

@@ -5,6 +5,7 @@
 #include <gtest/gtest.h>
 
 #include "vibctl/find_method.h"
+#include "vibctl/tests/prepared_call.h"
 
 namespace vibctl {
 namespace {
@@ -24,10 +25,6 @@ using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 using ::testing::SaveArg;
 using ::testing::SetArgPointee;
-
-auto answerOk() {
-    return [](auto&&...) { return ndk::ScopedAStatus::ok(); };
-}
 
 class MockZelVibrator : public IZelVibratorDefault {
   public:
@@ -51,19 +48,7 @@ class MockZelVibrator : public IZelVibratorDefault {
 class ExtensionCall : public ::testing::Test {
   protected:
     Outcome call(const std::vector<std::string>& words) {
-        CommandLine line;
-        line.command = "ext";
-        line.method = words.at(0);
-        line.arguments.assign(words.begin() + 1, words.end());
-        const Method* method = nullptr;
-        Call prepared;
-        Problem problem = findMethod(line, method);
-        if (!problem) problem = prepareCall(line, *method, prepared);
-        if (problem) {
-            ADD_FAILURE() << *problem;
-            return {};
-        }
-        return prepared(*mVibrator, nullptr);
+        return makeCall("ext", words, *mVibrator, nullptr);
     }
 
     std::shared_ptr<MockZelVibrator> mVibrator = ndk::SharedRefBase::make<MockZelVibrator>();

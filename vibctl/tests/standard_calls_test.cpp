@@ -8,6 +8,7 @@
 #include <gtest/gtest.h>
 
 #include "vibctl/find_method.h"
+#include "vibctl/tests/prepared_call.h"
 
 namespace vibctl {
 namespace {
@@ -27,10 +28,6 @@ using ::testing::IsEmpty;
 using ::testing::SaveArg;
 using ::testing::SetArgPointee;
 using ::testing::Truly;
-
-auto answerOk() {
-    return [](auto&&...) { return ndk::ScopedAStatus::ok(); };
-}
 
 class MockVibrator : public IVibratorDefault {
   public:
@@ -56,19 +53,7 @@ class StandardCall : public ::testing::Test {
   protected:
     // Makes the call that the words ask for.
     Outcome call(const std::vector<std::string>& words, const Callback& callback = nullptr) {
-        CommandLine line;
-        line.command = "std";
-        line.method = words.at(0);
-        line.arguments.assign(words.begin() + 1, words.end());
-        const Method* method = nullptr;
-        Call prepared;
-        Problem problem = findMethod(line, method);
-        if (!problem) problem = prepareCall(line, *method, prepared);
-        if (problem) {
-            ADD_FAILURE() << *problem;
-            return {};
-        }
-        return prepared(*mVibrator, callback);
+        return makeCall("std", words, *mVibrator, callback);
     }
 
     std::shared_ptr<MockVibrator> mVibrator = ndk::SharedRefBase::make<MockVibrator>();

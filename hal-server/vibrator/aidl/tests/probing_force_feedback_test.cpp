@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "tests/force_feedback_phone.h"
+#include "tests/node_paths.h"
 
 namespace aidl::android::hardware::vibrator {
 namespace {
@@ -36,26 +37,8 @@ TEST_F(ProbingForceFeedback, SetsItsTwoPathsAndLeavesTheOthersEmpty) {
     const HwApi hwApi;
     EXPECT_EQ(THE_DEVICE_FF, "/dev/input/event7");
     EXPECT_EQ(THE_DEVICE_EVENT_CMD, "/sys/class/qvx_vib_inputff/control/event_cmd");
-    for (const std::string* path : {&THE_DEVICE_INTENSITY,
-                                    &THE_DEVICE_FORCE_TOUCH_INTENSITY,
-                                    &THE_DEVICE_MULTI_FREQ,
-                                    &THE_DEVICE_HAPTIC_ENGINE,
-                                    &THE_DEVICE_HAPTIC_ENGINE_INDEX,
-                                    &THE_DEVICE_HAPTIC_PLAYBACK_QUEUE,
-                                    &THE_DEVICE_HAPTIC_ENGINE_NUM_WAVES,
-                                    &THE_DEVICE_MOTOR_TYPE,
-                                    &THE_DEVICE_PATTERN_LENGTH,
-                                    &THE_DEVICE_EXT_CONTROL,
-                                    &THE_DEVICE_CAL_INTENSITIES,
-                                    &THE_DEVICE_CAL_HAPTIC_INTENSITIES,
-                                    &THE_DEVICE_FIFO_HAPTIC_ENGINE,
-                                    &THE_DEVICE_HYBRID_HAPTIC_ENGINE,
-                                    &THE_DEVICE_ASP_ENABLE,
-                                    &THE_DEVICE_GPIO1_FALL_INDEX,
-                                    &THE_DEVICE_GPIO1_FALL_DIG_SCALE,
-                                    &THE_DEVICE_GPIO1_RISE_INDEX,
-                                    &THE_DEVICE_GPIO1_RISE_DIG_SCALE,
-                                    &THE_DEVICE_VIB_STATE}) {
+    for (const std::string* path : kNodePaths) {
+        if (path == &THE_DEVICE_FF || path == &THE_DEVICE_EVENT_CMD) continue;
         EXPECT_EQ(*path, "");
     }
     EXPECT_TRUE(useForceFeedback);

@@ -20,9 +20,7 @@ namespace binder_test {
 namespace {
 
 TEST(Calls, TwoWayCallReturnsTheReply) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        const auto binder = find(testName());
+    callService(kRoot, [](const ndk::SpAIBinder& binder) {
         EXPECT_TRUE(AIBinder_isRemote(binder.get()));
         EXPECT_EQ(41, echo(binder, 41));
         EXPECT_EQ(-1, echo(binder, -1));
@@ -38,9 +36,7 @@ TEST(Symbols, CarryTheVersionNodesOfThePlatform) {
 }
 
 TEST(Calls, PingAnswersAndTheObjectIsAlive) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        const auto binder = find(testName());
+    callService(kRoot, [](const ndk::SpAIBinder& binder) {
         EXPECT_EQ(STATUS_OK, AIBinder_ping(binder.get()));
         EXPECT_TRUE(AIBinder_isAlive(binder.get()));
     });
@@ -81,9 +77,7 @@ TEST(Calls, ServiceSeesTheCallersEffectiveUser) {
 }
 
 TEST(Calls, OnewayCallsArriveInOrder) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        const auto binder = find(testName());
+    callService(kRoot, [](const ndk::SpAIBinder& binder) {
         for (int32_t i = 0; i < 50; ++i) {
             binder_status_t status = STATUS_UNKNOWN_ERROR;
             const auto reply = call(
@@ -130,9 +124,7 @@ TEST(Calls, WaitingThreadServesNestedCalls) {
 }
 
 TEST(Calls, NestedCallsGoDeep) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        const auto binder = find(testName());
+    callService(kRoot, [](const ndk::SpAIBinder& binder) {
         // Callback and service call each other until the number has counted down.
         std::function<int32_t(int32_t)> answer;
         const auto descend = [&](int32_t number) -> int32_t {
@@ -194,9 +186,7 @@ TEST(Calls, CallbackOfAnotherInterfaceRefusesTheCall) {
 }
 
 TEST(Calls, StatusTravelsAloneAndUnchanged) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        const auto binder = find(testName());
+    callService(kRoot, [](const ndk::SpAIBinder& binder) {
         for (const binder_status_t sent :
              {STATUS_BAD_VALUE, STATUS_PERMISSION_DENIED, STATUS_UNKNOWN_TRANSACTION,
               STATUS_UNEXPECTED_NULL, STATUS_TIMED_OUT}) {
@@ -211,9 +201,7 @@ TEST(Calls, StatusTravelsAloneAndUnchanged) {
 }
 
 TEST(Calls, StatusWithoutANameBecomesUnknownError) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        const auto binder = find(testName());
+    callService(kRoot, [](const ndk::SpAIBinder& binder) {
         for (const int32_t sent : {-5, -9999, 7}) {
             binder_status_t status = STATUS_OK;
             call(
@@ -225,9 +213,7 @@ TEST(Calls, StatusWithoutANameBecomesUnknownError) {
 }
 
 TEST(Calls, UnknownUserCodeIsAnswered) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        const auto binder = find(testName());
+    callService(kRoot, [](const ndk::SpAIBinder& binder) {
         binder_status_t status = STATUS_OK;
         call(binder, 0x00ffffff, nullptr, &status);
         EXPECT_EQ(STATUS_UNKNOWN_TRANSACTION, status);
@@ -235,9 +221,7 @@ TEST(Calls, UnknownUserCodeIsAnswered) {
 }
 
 TEST(Calls, ExtensionIsReachedThroughItsParent) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        const auto binder = find(testName());
+    callService(kRoot, [](const ndk::SpAIBinder& binder) {
         ndk::SpAIBinder extension;
         ASSERT_EQ(STATUS_OK, AIBinder_getExtension(binder.get(), extension.getR()));
         ASSERT_NE(nullptr, extension.get());
@@ -257,9 +241,7 @@ TEST(Calls, ExtensionIsReachedThroughItsParent) {
 }
 
 TEST(Calls, DumpReachesTheObjectWithItsArguments) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        const auto binder = find(testName());
+    callService(kRoot, [](const ndk::SpAIBinder& binder) {
         int ends[2];
         ASSERT_EQ(0, pipe(ends));
         const char* args[] = {"-a", "\xc3\xa4", ""};
@@ -273,9 +255,7 @@ TEST(Calls, DumpReachesTheObjectWithItsArguments) {
 }
 
 TEST(Calls, DescriptorArrivesAsADuplicate) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        const auto binder = find(testName());
+    callService(kRoot, [](const ndk::SpAIBinder& binder) {
         int ends[2];
         ASSERT_EQ(0, pipe(ends));
         const int32_t before = callForInt(binder, kDescriptors);
@@ -291,9 +271,7 @@ TEST(Calls, DescriptorArrivesAsADuplicate) {
 }
 
 TEST(Calls, LargeBytesSurvive) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        const auto binder = find(testName());
+    callService(kRoot, [](const ndk::SpAIBinder& binder) {
         std::vector<uint8_t> sent(200001);
         for (size_t i = 0; i < sent.size(); ++i) sent[i] = static_cast<uint8_t>(i * 7);
         std::vector<uint8_t> received;
@@ -305,9 +283,7 @@ TEST(Calls, LargeBytesSurvive) {
 }
 
 TEST(Calls, BufferSpaceDoesNotLeak) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        const auto binder = find(testName());
+    callService(kRoot, [](const ndk::SpAIBinder& binder) {
         const int before = countDescriptors();
         const int32_t serviceBefore = callForInt(binder, kDescriptors);
         for (int32_t i = 0; i < 20000; ++i) ASSERT_EQ(i, echo(binder, i));

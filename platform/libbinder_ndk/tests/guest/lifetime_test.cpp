@@ -22,9 +22,7 @@ ndk::SpAIBinder giveObject(const ndk::SpAIBinder& service) {
 }
 
 TEST(References, ObjectLivesAsLongAsARemoteReference) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        const auto binder = find(testName());
+    callService(kRoot, [](const ndk::SpAIBinder& binder) {
         auto object = giveObject(binder);
         EXPECT_EQ(1, callForInt(binder, kLiveObjects));
         EXPECT_EQ(STATUS_OK, AIBinder_ping(object.get()));
@@ -35,9 +33,7 @@ TEST(References, ObjectLivesAsLongAsARemoteReference) {
 }
 
 TEST(References, ObjectDiesWithTheClientProcess) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        const auto binder = find(testName());
+    callService(kRoot, [](const ndk::SpAIBinder& binder) {
         auto* const leaked = new ndk::SpAIBinder(giveObject(binder));
         EXPECT_NE(nullptr, leaked->get());
         EXPECT_EQ(1, callForInt(binder, kLiveObjects));
@@ -49,18 +45,14 @@ TEST(References, ObjectDiesWithTheClientProcess) {
 }
 
 TEST(References, UnreadObjectOfAReplyIsReleased) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        const auto binder = find(testName());
+    callService(kRoot, [](const ndk::SpAIBinder& binder) {
         for (int i = 0; i < 100; ++i) call(binder, kGiveObject);
         EXPECT_TRUE(eventually([&] { return callForInt(binder, kLiveObjects) == 0; }));
     });
 }
 
 TEST(References, ManyObjectsComeAndGo) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        const auto binder = find(testName());
+    callService(kRoot, [](const ndk::SpAIBinder& binder) {
         std::vector<ndk::SpAIBinder> objects;
         for (int i = 0; i < 500; ++i) {
             objects.push_back(giveObject(binder));
@@ -75,9 +67,7 @@ TEST(References, ManyObjectsComeAndGo) {
 }
 
 TEST(References, HandlesAreReusedByManyThreadsAtOnce) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        const auto binder = find(testName());
+    callService(kRoot, [](const ndk::SpAIBinder& binder) {
         std::vector<std::thread> threads;
         for (int t = 0; t < 4; ++t) {
             threads.emplace_back([&] {
@@ -93,9 +83,7 @@ TEST(References, HandlesAreReusedByManyThreadsAtOnce) {
 }
 
 TEST(References, OneObjectSentToManyThreadsIsOneProxy) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        const auto binder = find(testName());
+    callService(kRoot, [](const ndk::SpAIBinder& binder) {
         std::vector<std::thread> threads;
         for (int t = 0; t < 4; ++t) {
             threads.emplace_back([&] {
@@ -113,9 +101,7 @@ TEST(References, OneObjectSentToManyThreadsIsOneProxy) {
 }
 
 TEST(References, OwnObjectComesBackAsItself) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        const auto binder = find(testName());
+    callService(kRoot, [](const ndk::SpAIBinder& binder) {
         const auto mine = makeCallback([](int32_t number) { return number; });
         ndk::SpAIBinder returned;
         const auto reply = call(binder, kEchoBinder,
@@ -136,9 +122,7 @@ TEST(References, OwnObjectComesBackAsItself) {
 }
 
 TEST(References, NullBinderStaysNull) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        const auto binder = find(testName());
+    callService(kRoot, [](const ndk::SpAIBinder& binder) {
         ndk::SpAIBinder returned = makeService();
         const auto reply = call(binder, kEchoBinder,
                                 [](AParcel* to) { AParcel_writeStrongBinder(to, nullptr); });
@@ -193,9 +177,7 @@ class Death : public testing::Test {
 };
 
 TEST_F(Death, ServiceDyingInTheMiddleOfACallIsADeadObject) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        const auto binder = find(testName());
+    callService(kRoot, [](const ndk::SpAIBinder& binder) {
         binder_status_t status = STATUS_OK;
         call(binder, kDie, nullptr, &status);
         EXPECT_EQ(STATUS_DEAD_OBJECT, status);
@@ -283,9 +265,7 @@ TEST_F(Death, LinksCanBeTakenBackAndMadeAgain) {
 }
 
 TEST_F(Death, ServiceIsToldOfTheDeathOfItsClient) {
-    const Process service = startService();
-    inProcess(kApp, [] {
-        const auto binder = find(testName());
+    callService(kApp, [](const ndk::SpAIBinder& binder) {
         const auto mine = makeCallback([](int32_t number) { return number; });
         call(binder, kWatch, [&](AParcel* to) { AParcel_writeStrongBinder(to, mine.get()); });
         EXPECT_EQ(0, callForInt(binder, kDeaths));

@@ -20,9 +20,7 @@ namespace binder_test {
 namespace {
 
 TEST(Calls, OneThreadServesOneCallAfterTheOther) {
-    const Process service = startService();
-    inProcess(kRoot, [] {
-        const auto binder = find(testName());
+    callService(kRoot, [](const ndk::SpAIBinder& binder) {
         std::vector<std::thread> callers;
         for (int i = 0; i < 4; ++i) {
             callers.emplace_back(

@@ -270,6 +270,11 @@ Process startService() {
     return Process(kSystem, [](const Process::Ready& ready) { serve(testName(), ready); });
 }
 
+void callService(uid_t uid, const std::function<void(const ndk::SpAIBinder& binder)>& body) {
+    const Process service = startService();
+    inProcess(uid, [&] { body(find(testName())); });
+}
+
 ndk::SpAIBinder find(const std::string& name) {
     ndk::SpAIBinder service(AServiceManager_checkService(name.c_str()));
     EXPECT_NE(nullptr, service.get()) << "service " << name;

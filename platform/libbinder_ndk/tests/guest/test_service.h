@@ -73,6 +73,9 @@ std::string testName();
 // A process of the system user that serves under that name.
 Process startService();
 
+// Starts that process, and calls its service as `uid` in a process of its own.
+void callService(uid_t uid, const std::function<void(const ndk::SpAIBinder& binder)>& body);
+
 // Finds and associates the service of that name; a failed expectation and null otherwise.
 ndk::SpAIBinder find(const std::string& name);
 
