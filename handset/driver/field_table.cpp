@@ -5,7 +5,9 @@
 
 #include <algorithm>
 #include <cctype>
+#include <charconv>
 #include <cstddef>
+#include <cstdint>
 #include <set>
 
 #include <fmt/format.h>
@@ -71,13 +73,6 @@ class RepeatedKeys {
   private:
     std::vector<std::set<std::string>> mOpen;
 };
-
-int hexDigit(char c) {
-    if (c >= '0' && c <= '9') return c - '0';
-    if (c >= 'a' && c <= 'f') return c - 'a' + 10;
-    if (c >= 'A' && c <= 'F') return c - 'A' + 10;
-    return -1;
-}
 
 std::string placeOfKey(const std::string& where, std::string_view key) {
     return where.empty() ? std::string(key) : fmt::format("{}.{}", where, key);
@@ -158,10 +153,12 @@ std::string_view kindOf(const Json& value) {
 Result<std::string> decodeHex(std::string_view digits) {
     std::string bytes;
     for (size_t i = 0; i + 1 < digits.size(); i += 2) {
-        const int high = hexDigit(digits[i]);
-        const int low = hexDigit(digits[i + 1]);
-        if (high < 0 || low < 0) return Error() << "no hexadecimal digit";
-        bytes += static_cast<char>(high << 4 | low);
+        const char* const end = digits.data() + i + 2;
+        uint8_t byte = 0;
+        if (std::from_chars(end - 2, end, byte, 16).ptr != end) {
+            return Error() << "no hexadecimal digit";
+        }
+        bytes += static_cast<char>(byte);
     }
     if (digits.size() % 2 != 0) return Error() << "half a byte";
     return bytes;
