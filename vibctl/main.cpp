@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <cstdio>
 #include <exception>
+#include <iostream>
 #include <string>
 #include <vector>
 
@@ -21,9 +22,11 @@
 #include "vibctl/find_method.h"
 #include "vibctl/info.h"
 #include "vibctl/outcome.h"
+#include "vibctl/play/callers.h"
 #include "vibctl/play/player.h"
 #include "vibctl/raw_call.h"
 #include "vibctl/service_call.h"
+#include "vibctl/session.h"
 #include "vibctl/usage.h"
 
 #define VIBCTL_QUOTED(version) #version
@@ -73,6 +76,20 @@ Exit runMethod(const CommandLine& line) {
     const Outcome outcome = callMethod(line, *method, call);
     recordCall(line, method->name, outcome);
     return report(line, line.command, method->name, outcome);
+}
+
+// Calls that standard input names, each with its answer on a line; the status is that of the first
+// that is not 0.
+Exit runSession(const CommandLine&) {
+    auto first = Exit::kOk;
+    for (std::string text; std::getline(std::cin, text);) {
+        CommandLine line;
+        const Problem problem = parseSessionLine(text, line);
+        const Exit status = problem ? fail(line, *problem) : runMethod(line);
+        if (first == Exit::kOk) first = status;
+        if (std::fflush(stdout) != 0) break;
+    }
+    return first;
 }
 
 // "help std on" and "std help" are other spellings of "std on --help" and "std --help".
@@ -142,6 +159,29 @@ Problem makePlan(const CommandLine& line, const std::string& text, const Offers&
     return problem ? line.method + ": " + *problem : problem;
 }
 
+// Plays what this process is to play, each call with a line, or all with one JSON object.
+Exit playAndPrint(const Plan& plan, Callers& callers, const CommandLine& line) {
+    std::string results;
+    const auto onCall = [&](const TimedCall& call, const Outcome& one, int64_t late) {
+        const double at = static_cast<double>(call.at.count()) / 1000;
+        results += fmt::format(R"({}{{"at":{},"late_us":{},"exception":{}}})",
+                               results.empty() ? "" : ",", at, late, one.exception);
+        recordCall(commandLineOf(call), call.words[0], one);
+        if (line.json) return;
+        fmt::print("{} ms, {:.1f} ms late: {} {}\n", at, static_cast<double>(late) / 1000,
+                   call.iface, humanLine(fmt::format("{}", fmt::join(call.words, " ")), one));
+        std::fflush(stdout);
+    };
+    Outcome outcome = playPlan(
+            plan, line, [&callers] { return callers.start(); }, onCall);
+    if (line.json) {
+        outcome.result = "[" + results + "]";
+        return report(line, "", "play", outcome);
+    }
+    return outcome.reached == Outcome::Reached::kCalled ? exitStatusOf(outcome)
+                                                        : report(line, "", "play", outcome);
+}
+
 Exit runPlay(const CommandLine& line) {
     std::string text;
     if (line.method == "-") {
@@ -153,30 +193,24 @@ Exit runPlay(const CommandLine& line) {
     // What is wrong is said before anybody is asked or anything is played.
     Plan plan;
     if (const Problem problem = makePlan(line, text, {}, plan)) return fail(line, *problem);
+    if (const Problem problem = Callers::check(plan)) return fail(line, "play: " + *problem);
+    Callers callers(plan);
+    callers.keepOwn(plan);
+    if (plan.calls.empty()) {
+        callers.start();
+        return callers.join(Exit::kOk);
+    }
     turnOffOnInterrupt();
     Outcome outcome;
     const Offers offers = askOffers(line, outcome);
-    if (outcome.exception != EX_NONE) return report(line, "std", "play", outcome);
+    if (outcome.exception != EX_NONE) return callers.join(report(line, "std", "play", outcome));
     plan = {};
     makePlan(line, text, offers, plan);
+    callers.keepOwn(plan);
     if (line.explain && !line.json) {
         for (const std::string& note : plan.notes) fmt::print("{}\n", note);
     }
-    std::string results;
-    outcome = playPlan(plan, line, [&](const TimedCall& call, const Outcome& one, int64_t late) {
-        const double at = static_cast<double>(call.at.count()) / 1000;
-        results += fmt::format(R"({}{{"at":{},"late_us":{},"exception":{}}})",
-                               results.empty() ? "" : ",", at, late, one.exception);
-        if (line.json) return;
-        fmt::print("{} ms, {:.1f} ms late: {} {}\n", at, static_cast<double>(late) / 1000,
-                   call.iface, humanLine(fmt::format("{}", fmt::join(call.words, " ")), one));
-    });
-    if (line.json) {
-        outcome.result = "[" + results + "]";
-        return report(line, "", "play", outcome);
-    }
-    return outcome.reached == Outcome::Reached::kCalled ? exitStatusOf(outcome)
-                                                        : report(line, "", "play", outcome);
+    return callers.join(playAndPrint(plan, callers, line));
 }
 
 Exit runDoctor(const CommandLine& line) {
@@ -206,6 +240,7 @@ constexpr Command kCommands[] = {
         {"dump", 1, " [std|ext]", runDump},
         {"raw", kAnyCount, "", runRaw},
         {"play", kAnyCount, "", runPlay},
+        {"session", 0, "", runSession},
         {"list", 0, "", runList},
         {"doctor", 0, "", runDoctor},
 };

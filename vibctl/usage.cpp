@@ -23,6 +23,8 @@ Calls the vibrator service over binder.
   raw std|ext CODE [HEX]  a transaction by its number, with these bytes behind its header
   play STEP...            vibrate for steps of milliseconds, the first a pause
   play FILE               the same for an AHAP file or a sequence of calls, - for standard input
+  session                 calls that standard input names, ["std","on","500"] a line, each
+                          answered with one JSON object
   list                    the services registered
   doctor                  what keeps the phone from vibrating, and what to do next
   help [std|ext [METHOD]] this text; the methods; what the arguments of one accept
@@ -75,8 +77,9 @@ std::string programHelp() {
 }
 
 std::string unknownCommand(const std::string& word) {
-    return fmt::format("{}; there are std, ext, info, dump, raw, play, list, doctor and help",
-                       word.empty() ? "no command given" : "unknown command " + inQuotes(word));
+    return fmt::format(
+            "{}; there are std, ext, info, dump, raw, play, session, list, doctor and help",
+            word.empty() ? "no command given" : "unknown command " + inQuotes(word));
 }
 
 }  // namespace vibctl

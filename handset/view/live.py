@@ -1,12 +1,13 @@
 # SPDX-License-Identifier: Apache-2.0
 """A run that is under way: what the files have gained since the last look, on the run's clock."""
 
+import json
 import os
 import time
 
 import requests_of_log
 from drive import Drive
-from run import parse_op
+from run import parse_call, parse_op
 
 
 class _Tail:
@@ -31,11 +32,12 @@ class _Tail:
 
 
 class LiveRun:
-    """Follows the journal and the log in a directory."""
+    """Follows the journal, the log and the recorded calls in a directory."""
 
     def __init__(self, directory):
         self._journal = _Tail(os.path.join(directory, "journal.jsonl"))
         self._log = _Tail(os.path.join(directory, "service.log"))
+        self._calls = _Tail(os.path.join(directory, "calls.jsonl"))
         self._drive = Drive()
         self._ahead = None  # by how much the run's clock is ahead of this machine's, microseconds
 
@@ -61,6 +63,14 @@ class LiveRun:
             parsed = requests_of_log.parse(text)
             if parsed is not None:
                 found.append({"us": parsed[0], "source": "log", "bad": False, "text": parsed[2]})
+        for text in self._calls.lines():
+            try:
+                call = parse_call(json.loads(text))
+            except (ValueError, KeyError, TypeError):
+                continue
+            # A callback is awaited after the answer, and the call is recorded when that has come.
+            found.append({"us": call.end, "source": "answer", "bad": call.failed,
+                          "text": call.said})
         if any(line["us"] is None for line in found):  # a log without the clock follows the driver
             return found
         return sorted(found, key=lambda line: line["us"])

@@ -86,6 +86,7 @@ class Request:
     arguments: list
     answer: str   # "ok", "EX_ILLEGAL_STATE", "" where unknown
     callback: int = None  # when onComplete came, on the run's clock
+    said: str = ""        # what the client printed of the answer
 
     @property
     def failed(self):
@@ -209,7 +210,8 @@ def parse_call(fields):
     callback = start + int(waited * 1000) if isinstance(waited, (int, float)) else None
     interface, method, *arguments = fields["call"]
     return Request(start, start + (answer.get("us") or 0), f"uid {fields['uid']}",
-                   f"{interface} {method}", arguments, _answer(answer), callback)
+                   f"{interface} {method}", arguments, _answer(answer), callback,
+                   answer.get("text") or _answer(answer))
 
 
 def _answer(answer):

@@ -9,6 +9,7 @@ change. Only who has the token gets in, and only from this machine.
 
 import argparse
 import asyncio
+import collections
 import json
 import os
 import secrets
@@ -31,15 +32,19 @@ _FILES = {"scope.js": _PAGE, "scope.css": _PAGE, "dygraph.min.js": _PLOTS, "dygr
 _LOOK_SECONDS = 0.02
 _PHONE_WORDS = ("fault", "unplug", "plug", "service", "node", "status")
 _ENDED = (3, "the handset has ended")
+_CALL_SECONDS = 120  # vibctl itself gives up earlier, unless it is told to wait so long
+_NO_CLIENT = "the client was started anew"
 _KEPT = 2000  # lines that a page gets when it is opened
 
 
 class Guest:
-    """A handset whose guest runs one command after the other, or several at a time."""
+    """A handset whose guest runs one command after the other, or several at a time, and in which one
+    client goes on living and makes call after call."""
 
     def __init__(self, options):
         self._options = options
         self._waiting, self._number = {}, 0
+        self._calls = collections.deque()  # what the client owes, in the order of the calls
         self._process = None
 
     async def start(self, out):
@@ -61,13 +66,42 @@ class Guest:
         self._process.stdin.write(f"{self._number} {shlex.join(words)}\n".encode())
         return await answer
 
+    def start_client(self):
+        """Starts the client, anew where there is one. To be called when the phone is up."""
+        self._give_up(_NO_CLIENT)
+        self._process.stdin.write(b"client\n")
+
+    async def call(self, *words):
+        """The client's answer to a call, as vibctl prints it with --json."""
+        if self.reader.done():
+            return _ENDED[1]
+        answer = asyncio.get_running_loop().create_future()
+        self._calls.append(answer)
+        self._process.stdin.write(f"call {json.dumps(words)}\n".encode())
+        try:
+            return await asyncio.wait_for(answer, _CALL_SECONDS)
+        except asyncio.TimeoutError:
+            self.start_client()
+            return _NO_CLIENT
+
+    def _give_up(self, why):
+        while self._calls:
+            answer = self._calls.popleft()
+            if not answer.done():
+                answer.set_result(why)
+
     async def _read(self):
         while line := await self._process.stdout.readline():
+            if line.startswith(b"{"):
+                if self._calls:
+                    self._calls.popleft().set_result(line.decode(errors="replace"))
+                continue
             number, status, output = line.decode(errors="replace").rstrip("\n").split(" ", 2)
             self._waiting.pop(number).set_result((int(status), output.replace("\x1e", "\n")))
         for answer in self._waiting.values():
             answer.set_result(_ENDED)
         self._waiting.clear()
+        self._give_up(_ENDED[1])
 
     async def stop(self):
         """Ends the guest in an orderly way, or, when that takes long, at once."""
@@ -93,6 +127,8 @@ class Scope:
             name[:-5] for name in os.listdir(os.path.join(_HANDSET, "profiles"))
             if name.endswith(".json"))}
         self._guest, self._run, self._sent = Guest(options), None, []
+        self._client = False    # whether there is one to make calls
+        self._recorded = False  # whether it has recorded the call under way
 
     def application(self):
         application = web.Application(middlewares=[self._guard])
@@ -205,11 +241,17 @@ class Scope:
             self._cause = {"number": self._cause["number"] + 1, "text": " ".join(words)}
             await self._add([{"us": None, "source": "call", "bad": False,
                               "text": " ".join(words)}])
-            status, output = await self._guest.run("vibctl", "--json", *words)
+            if not self._client:
+                return {"status": 3, "output": "the phone is not up"}
+            self._recorded = False
+            output = await self._guest.call(*words)
+            fields = _fields(output)
             await self._look()
-            await self._add([{"us": None, "source": "answer", "bad": status != 0,
-                              "text": _said(output)}])
-            return {"status": status, "output": output}
+            if not self._recorded:  # nothing was called
+                await self._add([{"us": None, "source": "answer", "bad": True,
+                                  "text": fields.get("text") or output}])
+            well = fields.get("exception") == 0 and fields.get("callback") != "timeout"
+            return {"status": 0 if well else 1, "output": output}
 
     async def _add(self, lines, cause=None):
         for line in lines:
@@ -241,6 +283,7 @@ class Scope:
             raise ValueError(f"no profile {profile}")
         self._state.update(profile=profile)
         await self._show_phone("starting")
+        self._client = False
         if self._run is not None:
             await self._guest.run("phone", "down")
         out = os.path.join(self._directory, profile)
@@ -251,6 +294,9 @@ class Scope:
         self._run = LiveRun(out)
         answer = _answer(await self._guest.run("phone", "up", "--profile", profile, "--out",
                                                f"/run/handset/out/{profile}"))
+        self._client = answer["status"] < 2
+        if self._client:
+            self._guest.start_client()
         await self._show_phone(answer["output"])
         return await self._examine()
 
@@ -260,10 +306,13 @@ class Scope:
             await self._look()
 
     async def _look(self):
+        """Tells the pages what is new."""
         run = self._run
         if run is None:
             return
-        await self._add(run.look())
+        lines = run.look()
+        self._recorded = self._recorded or any(line["source"] == "answer" for line in lines)
+        await self._add(lines)
         drive = run.drive()
         if drive is not None and run is self._run:
             self._sent[drive["from"]:] = drive["stretches"]
@@ -274,22 +323,13 @@ def _answer(result):
     return {"status": result[0], "output": result[1]}
 
 
-def _said(output):
-    """vibctl's answer in a few words."""
+def _fields(output):
+    """What vibctl printed with --json, as a dictionary; an empty one where it is none."""
     try:
-        fields = json.loads(output.splitlines()[-1])
-    except (ValueError, IndexError):
-        return output
-    if fields.get("text"):
-        return fields["text"]
-    words = fields.get("message") or ("ok" if not fields.get("exception") and
-                                      not fields.get("status") else
-                                      f"exception {fields.get('exception')}")
-    if fields.get("result") is not None:
-        words += f", result {fields['result']}"
-    if fields.get("callback") is not None:
-        words += f", callback {fields['callback']}"
-    return words
+        fields = json.loads(output)
+    except ValueError:
+        return {}
+    return fields if isinstance(fields, dict) else {}
 
 
 def main(program, description, words):

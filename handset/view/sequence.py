@@ -1,10 +1,11 @@
 # SPDX-License-Identifier: Apache-2.0
-"""A run's calls, or what a log tells of a phone's, as a sequence: one JSON object a line.
+"""A run's calls, or what a log tells of a phone's, as a sequence that `vibctl play` takes: one JSON
+object a line.
 
-    {"at_ms":1250.4,"uid":1000,"call":["std","perform","TICK","STRONG"]}
+    {"at":1250.4,"uid":1000,"iface":"std","method":"perform","args":["TICK","STRONG"]}
 
-at_ms counts from the first call; call is a command line of vibctl from std or ext on; uid is who
-called, left out where the log does not tell.
+at is in milliseconds from the first call; uid is who called, left out where the log does not tell;
+callback is there where one was passed, or could have been and was not.
 """
 
 import json
@@ -43,6 +44,21 @@ def of(source):
     return _of_log(logged)
 
 
+_AWAITED = ("std compose", "std composePwle")  # played with a callback unless told
+
+
+def _call(at, method, words, uid=None):
+    """A call of a sequence; `words` are those of a command line."""
+    call = {"at": round(at, 3)}
+    if uid is not None:
+        call["uid"] = uid
+    iface, name = method.split()
+    call.update(iface=iface, method=name, args=[word for word in words if word != "--callback"])
+    if "--callback" in words or method in _AWAITED:
+        call["callback"] = "--callback" in words
+    return call
+
+
 def line(call):
     """One line of a sequence."""
     return json.dumps(call, separators=(",", ":")) + "\n"
@@ -50,8 +66,8 @@ def line(call):
 
 def _of_calls(requests):
     first = requests[0].start if requests else 0
-    return [{"at_ms": round((one.start - first) / 1000, 3), "uid": int(one.client.split()[1]),
-             "call": [*one.method.split(), *one.arguments]} for one in requests]
+    return [_call((one.start - first) / 1000, one.method, one.arguments, int(one.client.split()[1]))
+            for one in requests]
 
 
 def _of_log(logged):
@@ -69,7 +85,7 @@ def _of_log(logged):
             left_out.append(f"{one.method} at {at / 1000:.3f} s: its arguments are not logged")
             continue
         at += 86_400_000 if at < 0 else 0  # past midnight
-        calls.append({"at_ms": round(at, 3), "call": [*one.method.split(), *arguments]})
+        calls.append(_call(at, one.method, arguments))
     return calls, left_out
 
 

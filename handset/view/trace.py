@@ -21,13 +21,22 @@ def write(run, path):
 
 
 class _Threads:
-    """Numbers for names, and the events that tell the viewer."""
+    """Numbers for names, and the events that tell the viewer. What overlaps on a thread would have to
+    be nested, so it goes to another thread of the name, with a number behind it."""
 
     def __init__(self, process):
-        self._process, self._numbers = process, {}
+        self._process, self._numbers, self._busy = process, {}, {}
 
-    def __getitem__(self, name):
-        return self._numbers.setdefault(name, len(self._numbers) + 1)
+    def take(self, name, start, end):
+        """The thread for a slice; the slices of a name come in the order of their starts."""
+        count = 1
+        while True:
+            number = self._numbers.setdefault(name if count == 1 else f"{name} ({count})",
+                                              len(self._numbers) + 1)
+            if self._busy.get(number, start) <= start:
+                self._busy[number] = start + _length(start, end)
+                return number
+            count += 1
 
     def names(self):
         for name, number in self._numbers.items():
@@ -44,7 +53,7 @@ def _events(run):
     flows = {id(request): at for at, request in enumerate(run.requests, 1)}
     clients, nodes = _Threads(_CLIENTS), _Threads(_DRIVER)
     for request in run.requests:
-        thread = clients[request.client]
+        thread = clients.take(request.client, request.start, request.end)
         yield _slice(request.describe(), _CLIENTS, thread, request.start, request.end,
                      arguments=request.arguments, answer=request.answer)
         yield _flow("s", flows[id(request)], _CLIENTS, thread, request.start)
@@ -52,16 +61,18 @@ def _events(run):
         yield {"ph": "i", "s": "t", "name": method, "pid": _SERVICE, "tid": 1, "ts": us}
     marks = {id(op): text for op, text in run.marks}
     for op in run.ops:
-        thread, start = nodes[op.name], op.us - op.took
+        start = op.us - op.took
+        thread = nodes.take(op.name, start, op.us)
         wrong = marks.get(id(op))
         yield _slice(f"{op.describe()} ({wrong})" if wrong else op.describe(), _DRIVER, thread,
                      start, op.us, **op.fields)
         cause = run.cause(op.us)
         if cause:
             yield _flow("t", flows[id(cause)], _DRIVER, thread, start)
-    for request in run.requests:
+    for request in sorted(run.requests, key=lambda one: one.callback or 0):
         if request.callback:
-            thread = clients[request.client]
+            thread = clients.take(f"callbacks of {request.client}", request.callback,
+                                  request.callback)
             yield _slice("onComplete", _CLIENTS, thread, request.callback, request.callback)
             yield _flow("f", flows[id(request)], _CLIENTS, thread, request.callback)
     for us in run.callbacks:
@@ -85,13 +96,17 @@ def _motor(run):
 
 
 def _level(us, level):
-    return {"ph": "C", "name": "level %", "pid": _MOTOR, "ts": us,
+    return {"ph": "C", "name": "level %", "pid": _MOTOR, "ts": round(us),
             "args": {"level": round(level * 100, 2)}}
 
 
 def _slice(name, process, thread, start, end, **arguments):
-    return {"ph": "X", "name": name, "pid": process, "tid": thread, "ts": start,
-            "dur": max(end - start, _SHORTEST), "args": arguments}
+    return {"ph": "X", "name": name, "pid": process, "tid": thread, "ts": round(start),
+            "dur": _length(start, end), "args": arguments}
+
+
+def _length(start, end):
+    return max(round(end) - round(start), _SHORTEST)
 
 
 def _flow(phase, number, process, thread, us):

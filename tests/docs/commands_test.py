@@ -37,7 +37,7 @@ TOOLS = {
 }
 PHONE_COMMANDS = {"up", "down", "status", "service", "reset", "fault", "unplug", "plug", "node",
                   "journal", "log", "exec"}
-VIBCTL_COMMANDS = {"std", "ext", "info", "dump", "raw", "play", "list", "doctor", "help"}
+VIBCTL_COMMANDS = {"std", "ext", "info", "dump", "raw", "play", "session", "list", "doctor", "help"}
 
 
 def is_host(block):

@@ -36,7 +36,8 @@ class Completion(unittest.TestCase):
         self.assertEqual(result.stdout, "complete -F _vibctl vibctl\n")
 
     def test_offers_commands_first(self):
-        self.assertEqual(offered(""), ["std", "ext", "info", "dump", "raw", "play", "list", "doctor", "help"])
+        self.assertEqual(offered(""), ["std", "ext", "info", "dump", "raw", "play", "session", "list",
+                                       "doctor", "help"])
         self.assertEqual(offered("do"), ["doctor"])
         self.assertEqual(offered("dump", ""), ["std", "ext"])
         self.assertEqual(offered("raw", "e"), ["ext"])

@@ -41,7 +41,7 @@ _vibctl() {
         choices="--json --timeout --wait --callback --off-on-interrupt --amplitudes --repeat --explain
             --help --version"
     elif ((${#plain[@]} == 0)); then
-        choices="std ext info dump raw play list doctor help"
+        choices="std ext info dump raw play session list doctor help"
     elif [[ ${plain[0]} == help && ${#plain[@]} == 2 ]]; then
         choices=$(_vibctl_methods "$program" "${plain[1]}")
     elif ((${#plain[@]} == 1)) && [[ ${plain[0]} =~ ^(dump|raw|help)$ ]]; then

@@ -71,6 +71,14 @@ std::string JsonFields::string(const char* key, const std::string& missing) {
     return missing;
 }
 
+std::optional<bool> JsonFields::boolean(const char* key) {
+    if (!mObject.isObject() || !mObject.isMember(key)) return std::nullopt;
+    const Json::Value& value = mObject[key];
+    if (value.isBool()) return value.asBool();
+    complain(value, fmt::format("{}: true and false are accepted", key));
+    return std::nullopt;
+}
+
 const Json::Value& JsonFields::list(const char* key) {
     static const Json::Value kEmpty(Json::arrayValue);
     if (!mObject.isObject() || !mObject.isMember(key)) return kEmpty;

@@ -4,6 +4,7 @@
 // its line, key and what is accepted.
 #pragma once
 
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -28,6 +29,9 @@ class JsonFields {
     double number(const char* key, double lowest, double highest, double missing);
 
     std::string string(const char* key, const std::string& missing);
+
+    // Nothing when there is no such key.
+    std::optional<bool> boolean(const char* key);
 
     // A list, empty when there is no such key.
     const Json::Value& list(const char* key);

@@ -4,10 +4,12 @@
 #pragma once
 
 #include <chrono>
+#include <optional>
 #include <string>
 #include <vector>
 
 #include "vibctl/arguments.h"
+#include "vibctl/command_line.h"
 
 namespace vibctl {
 
@@ -15,7 +17,12 @@ struct TimedCall {
     std::chrono::microseconds at{};  // from the start
     std::string iface;               // "std" or "ext"
     std::vector<std::string> words;  // the method and its arguments
+    std::optional<bool> callback{};  // whether to pass one; compositions get one unless told
+    std::optional<unsigned> uid{};   // the user who makes it, unless whoever plays
 };
+
+// The call as it would be written on a command line; a composition has a callback unless told.
+CommandLine commandLineOf(const TimedCall& timed);
 
 struct Plan {
     std::vector<TimedCall> calls;    // in the order of their times
@@ -46,7 +53,8 @@ Problem planPattern(const Pattern& pattern, const Offers& offers, Plan& plan);
 //     {"at": 120.5, "iface": "std", "method": "on", "args": [100]}
 //
 // with `at` in milliseconds from the start, never before the line above. `iface` is "std" when it is
-// missing; `args` are strings, numbers and booleans. Empty lines count for nothing.
+// missing; `args` are strings, numbers and booleans; `callback`, a boolean, and `uid` are those of
+// TimedCall. Empty lines count for nothing.
 Problem planSequence(const std::string& text, Plan& plan);
 
 // An AHAP document: transient and continuous events with intensity and sharpness, parameters and

@@ -33,14 +33,11 @@ struct Prepared {
 };
 
 Prepared prepare(const TimedCall& timed, const Callback& callback) {
-    CommandLine words;
-    words.command = timed.iface;
-    words.method = timed.words[0];
-    words.arguments.assign(timed.words.begin() + 1, timed.words.end());
+    const CommandLine words = commandLineOf(timed);
     const Method* method = nullptr;
     Prepared prepared;
     if (!findMethod(words, method)) prepareCall(words, *method, prepared.call);
-    if (method != nullptr && method->traits.awaitsCompletion) prepared.callback = callback;
+    if (words.callback) prepared.callback = callback;
     return prepared;
 }
 
@@ -70,7 +67,8 @@ Offers askOffers(const CommandLine& line, Outcome& outcome) {
     return offers;
 }
 
-Outcome playPlan(const Plan& plan, const CommandLine& line, const OnCall& onCall) {
+Outcome playPlan(const Plan& plan, const CommandLine& line, const Start& start,
+                 const OnCall& onCall) {
     ABinderProcess_startThreadPool();
     const Callback callback = ndk::SharedRefBase::make<IgnoredCallback>();
     std::map<std::string, Service> services;
@@ -89,11 +87,11 @@ Outcome playPlan(const Plan& plan, const CommandLine& line, const OnCall& onCall
         calls.push_back(prepare(timed, callback));
     }
     Outcome result;
-    const Clock::time_point start = Clock::now();
+    const Clock::time_point zero = start();
     for (size_t i = 0; i < calls.size(); ++i) {
         const TimedCall& timed = plan.calls[i];
-        std::this_thread::sleep_until(start + timed.at);
-        const auto late = Clock::now() - (start + timed.at);
+        std::this_thread::sleep_until(zero + timed.at);
+        const auto late = Clock::now() - (zero + timed.at);
         const auto answer =
                 within(line.timeout, [call = calls[i].call, service = services[timed.iface],
                                       given = calls[i].callback] { return call(*service, given); });

@@ -15,8 +15,11 @@ namespace {
 // A day.
 constexpr double kLatestMs = 86400000;
 
+// The number above means "no user" to the kernel.
+constexpr double kLargestUser = 4294967294;
+
 TimedCall readCall(JsonFields& fields, double earliest) {
-    fields.expectKeys({"at", "iface", "method", "args"});
+    fields.expectKeys({"at", "iface", "method", "args", "callback", "uid"});
     TimedCall call;
     const double at = fields.number("at", earliest, kLatestMs, earliest);
     call.at = std::chrono::microseconds(static_cast<int64_t>(at * 1000));
@@ -29,6 +32,10 @@ TimedCall readCall(JsonFields& fields, double earliest) {
             call.words.push_back(word.asString());
         }
     }
+    call.callback = fields.boolean("callback");
+    constexpr double kNobody = -1;
+    const double uid = fields.number("uid", 0, kLargestUser, kNobody);
+    if (uid != kNobody) call.uid = static_cast<unsigned>(uid);
     return call;
 }
 
@@ -37,10 +44,7 @@ Problem checkCall(const TimedCall& timed) {
     if (timed.iface != "std" && timed.iface != "ext") {
         return fmt::format("iface: {} is neither std nor ext", inQuotes(timed.iface));
     }
-    CommandLine line;
-    line.command = timed.iface;
-    line.method = timed.words[0];
-    line.arguments.assign(timed.words.begin() + 1, timed.words.end());
+    const CommandLine line = commandLineOf(timed);
     const Method* method = nullptr;
     if (Problem problem = findMethod(line, method)) return "method: " + *problem;
     Call call;
@@ -49,6 +53,18 @@ Problem checkCall(const TimedCall& timed) {
 }
 
 }  // namespace
+
+CommandLine commandLineOf(const TimedCall& timed) {
+    CommandLine line;
+    line.command = timed.iface;
+    line.method = timed.words[0];
+    line.arguments.assign(timed.words.begin() + 1, timed.words.end());
+    const Method* method = nullptr;
+    const bool awaits = (timed.iface == "std" || timed.iface == "ext") &&
+                        !findMethod(line, method) && method->traits.awaitsCompletion;
+    line.callback = timed.callback.value_or(awaits);
+    return line;
+}
 
 Problem planSequence(const std::string& text, Plan& plan) {
     int number = 0;

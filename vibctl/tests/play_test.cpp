@@ -120,13 +120,27 @@ TEST(SequencePlan, HasACallOnEachLine) {
                                            "2.5 ms std setExternalControl true"));
 }
 
+TEST(SequencePlan, SaysWhoCallsAndWhetherThereIsACallback) {
+    Plan plan;
+    EXPECT_FALSE(
+            planSequence("{\"method\": \"off\", \"uid\": 1000}\n"
+                         "{\"method\": \"on\", \"args\": [5], \"callback\": true}\n",
+                         plan));
+    ASSERT_EQ(plan.calls.size(), 2U);
+    EXPECT_EQ(plan.calls[0].uid, 1000U);
+    EXPECT_EQ(plan.calls[0].callback, std::nullopt);
+    EXPECT_EQ(plan.calls[1].uid, std::nullopt);
+    EXPECT_EQ(plan.calls[1].callback, true);
+}
+
 TEST(SequencePlan, NamesTheLineAndTheKeyThatIsWrong) {
     EXPECT_EQ(sequenceProblem(""), "no call in it");
     EXPECT_EQ(sequenceProblem("{\"method\": \"off\"}\n{\"method\" \"off\"}\n"),
               "line 2: Missing ':' after object member name");
     EXPECT_EQ(sequenceProblem("[]"), "line 1: an object is accepted");
     EXPECT_EQ(sequenceProblem("\n{\"methd\": \"off\"}"),
-              "line 2: unknown key \"methd\"; accepted are at, iface, method, args");
+              "line 2: unknown key \"methd\"; accepted are at, iface, method, args, callback, "
+              "uid");
     EXPECT_EQ(sequenceProblem("{\"at\": 5, \"method\": \"off\"}\n{\"at\": 4, \"method\": \"off\"}"),
               "line 2: at: a number from 5 to 86400000 is accepted");
     EXPECT_EQ(sequenceProblem("{\"iface\": \"sdt\", \"method\": \"off\"}"),
@@ -135,6 +149,12 @@ TEST(SequencePlan, NamesTheLineAndTheKeyThatIsWrong) {
               "line 1: method: std: unknown method \"preform\"; did you mean perform");
     EXPECT_THAT(sequenceProblem("{\"method\": \"on\", \"args\": [\"soon\"]}"),
                 HasSubstr("line 1: args: std on: TIMEOUT_MS \"soon\" is not an integer"));
+    EXPECT_EQ(sequenceProblem("{\"method\": \"off\", \"uid\": -1}"),
+              "line 1: uid: a number from 0 to 4294967294 is accepted");
+    EXPECT_EQ(sequenceProblem("{\"method\": \"on\", \"args\": [1], \"callback\": 1}"),
+              "line 1: callback: true and false are accepted");
+    EXPECT_THAT(sequenceProblem("{\"method\": \"off\", \"callback\": true}"),
+                HasSubstr("line 1: args: std off: takes no --callback"));
     EXPECT_EQ(sequenceProblem("{\"method\": \"on\", \"args\": [[1]]}"),
               "line 1: args: strings, numbers and booleans are accepted");
 }

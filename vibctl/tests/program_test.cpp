@@ -61,12 +61,11 @@ TEST_P(WrongUsageOf, GetsOneLineAndStatus2) {
 
 constexpr WrongUsage kWrongUsages[] = {
         {"NoCommand", "",
-         "vibctl: no command given; there are std, ext, info, dump, raw, play, list, doctor and "
-         "help\n"},
+         "vibctl: no command given; there are std, ext, info, dump, raw, play, session, list, "
+         "doctor and help\n"},
         {"Command", "foo",
-         "vibctl: unknown command \"foo\"; there are std, ext, info, dump, raw, play, list, doctor "
-         "and "
-         "help\n"},
+         "vibctl: unknown command \"foo\"; there are std, ext, info, dump, raw, play, session, "
+         "list, doctor and help\n"},
         {"Option", "--jsno list",
          "vibctl: unknown option \"--jsno\"; there are --json, --timeout SECONDS, --wait SECONDS, "
          "--callback, --off-on-interrupt, --amplitudes A,..., --repeat COUNT, --explain, --help, "

@@ -151,10 +151,12 @@ TEST(CallbackOption, GoesOnlyWithMethodsThatTakeOne) {
 
 TEST(UnknownCommand, GetsTheOnesThereAre) {
     EXPECT_EQ(unknownCommand("foo"),
-              "unknown command \"foo\"; there are std, ext, info, dump, raw, play, list, doctor "
-              "and help");
+              "unknown command \"foo\"; there are std, ext, info, dump, raw, play, session, list, "
+              "doctor and help");
     EXPECT_EQ(unknownCommand(""),
-              "no command given; there are std, ext, info, dump, raw, play, list, doctor and help");
+              "no command given; there are std, ext, info, dump, raw, play, session, list, doctor "
+              "and "
+              "help");
 }
 
 TEST(Help, OfAMethodSaysWhatItsArgumentsAccept) {

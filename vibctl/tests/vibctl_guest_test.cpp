@@ -5,7 +5,9 @@
 #include <chrono>
 #include <memory>
 #include <string>
+#include <vector>
 
+#include <android-base/strings.h>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
@@ -165,6 +167,36 @@ TEST_F(VibctlWithService, SendsATransactionByItsNumber) {
                           R"("result":"00000000",)"));
     EXPECT_EQ(run("raw std 999").status, 3);
     EXPECT_EQ(run("raw std 6").status, 3) << "a transaction that is cut short";
+}
+
+CommandResult session(const std::string& lines) {
+    return qvx::test::runShell("printf '%s\\n' " + lines + " | " VIBCTL_PROGRAM " session 2>&1");
+}
+
+TEST_F(VibctlWithService, AnswersCallAfterCallInASession) {
+    const CommandResult result = session(
+            R"('["std","on","500"]' 'nonsense' '["std","compose","20,CLICK,1","--callback"]' )"
+            R"('["std","setAmplitude","1"]' '["ext","hasFeature","x"]')");
+    EXPECT_EQ(result.status, 2);
+    std::vector<std::string> texts;
+    for (const std::string& line : android::base::Split(result.out, "\n")) {
+        if (!line.empty()) texts.push_back(nlohmann::json::parse(line).at("text"));
+    }
+    ASSERT_EQ(texts.size(), 5U) << result.out;
+    EXPECT_EQ(texts[0], "ok");
+    EXPECT_THAT(texts[1], testing::StartsWith("session: a list such as "));
+    EXPECT_THAT(texts[2], testing::StartsWith("ok, completed after "));
+    EXPECT_THAT(texts[3], testing::StartsWith("EX_ILLEGAL_ARGUMENT"));
+    EXPECT_EQ(texts[4], "ok, false");
+}
+
+TEST_F(VibctlWithService, GoesOnWithASessionWhenTheServiceDies) {
+    const qvx::test::ExpectBinderComplaints expected;
+    const CommandResult result = session(
+            R"('["std","compose","20,CLICK,1","--callback"]' '["std","on","3"]' '["std","off"]')");
+    EXPECT_EQ(result.status, 3);
+    EXPECT_THAT(result.out, HasSubstr("STATUS_DEAD_OBJECT; see vibctl doctor"));
+    EXPECT_THAT(result.out, HasSubstr("IVibrator/default is not registered; see vibctl doctor"));
 }
 
 TEST_F(VibctlWithService, PrintsWhatTheServiceDumps) {

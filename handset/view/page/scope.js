@@ -24,7 +24,8 @@ const find = id => document.getElementById(id);
 const waiting = new Map();
 let socket = null;
 let asked = 0;
-let tapped = null;     // when the last call was asked for, until its first write is seen
+let tapped = null;     // when the last call was asked for, until its answer is seen
+let wrote = null;      // when its first and its last write were seen
 let stretches = [];
 let faults = [];       // milliseconds of the run's clock
 let clock = null;      // {run, here}: the run's clock and this page's, at one moment
@@ -47,6 +48,7 @@ function ask(message) {
 
 async function call(words) {
     tapped = performance.now();
+    wrote = null;
     find("tap").textContent = "";
     find("last").textContent = words.join(" ") + " …";
     const answer = await ask({call: words});
@@ -110,11 +112,7 @@ function showLines(lines) {
     const atEnd = box.scrollTop + box.clientHeight >= box.scrollHeight - 30;
     const rows = document.createDocumentFragment();
     for (const line of lines) {
-        if (tapped !== null && line.source === "driver" && line.op !== "open") {
-            find("tap").textContent = "first write after " +
-                Math.round(performance.now() - tapped) + " ms";
-            tapped = null;
-        }
+        if (tapped !== null) showTap(line);
         if (line.source === "driver" && line.bad) faults.push(line.us / 1000);
         const row = element("tr");
         row.className = line.source + (line.bad ? " bad" : "");
@@ -128,6 +126,16 @@ function showLines(lines) {
     body.append(rows);
     while (body.children.length > SHOWN_LINES) body.firstChild.remove();
     if (atEnd) box.scrollTop = box.scrollHeight;
+}
+
+// How long the last tap took, to the writes that it caused and to its answer.
+function showTap(line) {
+    const after = Math.round(performance.now() - tapped);
+    if (line.source === "driver") wrote = [wrote === null ? after : wrote[0], after];
+    if (line.source !== "answer") return;
+    find("tap").textContent = (wrote === null ? "" : "writes after " + wrote[0] + " to " + wrote[1] +
+        " ms, ") + "answer after " + after + " ms";
+    tapped = null;
 }
 
 function showDrive(drive) {

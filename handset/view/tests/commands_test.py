@@ -72,6 +72,8 @@ class Trace(unittest.TestCase):
         directory.upload(2000, 0, "00000200" "00640100" "00000032" "00327c00" "00000000")
         directory.event(2010, 0, 1)
         directory.call(1990, 40, "std compose 0,CLICK,1 --callback", callback=400)
+        directory.call(2012, 5, "std getCapabilities")  # while the same user waits
+        directory.call(2017.02, 0.01, "std off")
         done = command("trace", directory.path)
         self.assertEqual((done.returncode, done.stderr), (0, ""))
         file = directory.path / "trace.json"
@@ -82,11 +84,41 @@ class Trace(unittest.TestCase):
         names = [event["args"]["name"] for event in self.events if event["ph"] == "M" and
                  event["name"].endswith("_name")]
         self.assertEqual(names, ["clients", "service", "driver", "motor", "uid 1000", "uid 0",
-                                 "state", "duration", "activate", "motor"])
+                                 "uid 0 (2)", "callbacks of uid 0", "state", "duration",
+                                 "activate", "motor"])
         slices = [(event["name"], event["ts"], event["dur"]) for event in self.events
                   if event["ph"] == "X" and event["pid"] == 4]
         self.assertEqual(slices, [("500 ms", 1012000, 500000), ("pattern 1", 2010000, 20000),
                                   ("pattern 124", 2080000, 300000)])
+
+    def test_is_what_the_viewer_takes(self):
+        common = {"ph", "pid", "name"}
+        keys = {"X": common | {"tid", "ts", "dur", "args"}, "C": common | {"ts", "args"},
+                "i": common | {"tid", "ts", "s"}, "M": common | {"args"},
+                **dict.fromkeys("stf", common | {"tid", "ts", "id", "cat", "bp"})}
+        slices = {}
+        for event in self.events:
+            self.assertEqual(set(event) - {"tid"}, keys[event["ph"]] - {"tid"}, event)
+            self.assertEqual("tid" in event, "tid" in keys[event["ph"]] or
+                             event["name"] == "thread_name", event)
+            self.assertTrue(all(isinstance(event[key], int) and event[key] >= 0
+                                for key in ("pid", "tid", "ts", "dur", "id") if key in event), event)
+            if event["ph"] == "X":
+                slices.setdefault((event["pid"], event["tid"]), []).append(
+                    (event["ts"], event["ts"] + event["dur"]))
+        for thread in slices.values():
+            for (_, end), (start, _) in zip(sorted(thread), sorted(thread)[1:]):
+                self.assertLessEqual(end, start, "slices overlap")
+        flows = {}
+        for event in self.events:
+            if event["ph"] in "stf":
+                self.assertTrue(any(start <= event["ts"] < end for start, end in
+                                    slices[event["pid"], event["tid"]]), "a flow without a slice")
+                flows.setdefault(event["id"], []).append((event["ts"], event["ph"]))
+        self.assertGreater(len(flows), 3)
+        for steps in flows.values():
+            self.assertRegex("".join(phase for _, phase in steps), "^st*f?$")
+            self.assertEqual(steps, sorted(steps, key=lambda step: step[0]))
 
     def test_leads_from_a_call_to_its_writes_and_its_callback(self):
         flows = {}
@@ -96,7 +128,8 @@ class Trace(unittest.TestCase):
         self.assertEqual(flows, {
             1: [("s", 1000000), ("t", 1005000), ("t", 1009000), ("t", 1012000)],
             2: [("s", 1190000), ("t", 1200000)],
-            3: [("s", 1990000), ("t", 2000000), ("t", 2010000), ("f", 2390000)]})
+            3: [("s", 1990000), ("t", 2000000), ("t", 2010000), ("f", 2390000)],
+            4: [("s", 2012000)], 5: [("s", 2017020)]})
 
 
 if __name__ == "__main__":

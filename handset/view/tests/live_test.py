@@ -48,6 +48,15 @@ class Looking(unittest.TestCase):
         self.directory.write(11, "activate", "0\n")
         self.assertEqual(self.texts(), ["state ← 1", "V_2_0: Vibrator off", "activate ← 0"])
 
+    def test_puts_an_answer_behind_what_its_call_caused(self):
+        self.directory.call(9, 3, "std on 5", exception=-5, text="EX_ILLEGAL_STATE; no motor")
+        self.directory.write(10, "state", "1\n")
+        self.directory.write(13, "activate", "0\n")
+        self.assertEqual([(line["source"], line["text"], line["bad"]) for line in self.live.look()],
+                         [("driver", "state ← 1", False),
+                          ("answer", "EX_ILLEGAL_STATE; no motor", True),
+                          ("driver", "activate ← 0", False)])
+
     def test_tells_what_has_changed_of_the_drive(self):
         self.directory.write(self.now - 40, "fifo", "1\n")
         self.directory.write(self.now - 30, "fifo", "2\n")

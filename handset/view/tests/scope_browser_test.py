@@ -1,6 +1,7 @@
 # SPDX-License-Identifier: Apache-2.0
-"""handset/scope as somebody with a browser meets it: a tap and its writes, a broken node, a reload, a
-wrong token. Prints how long a page load and a tap took; no test depends on it."""
+"""handset/scope as somebody with a browser meets it: a tap and its writes, a broken node, a motor that
+is unplugged, a service that dies, a reload, a wrong token. Prints how long a page load, a tap and its
+writes took; no test depends on it."""
 
 import os
 import shutil
@@ -73,7 +74,51 @@ class Scope(unittest.TestCase):
         writes = self.call_and_read("TICK")
         self.assertEqual(writes, ["intensity ← 10000", "cp_trigger_index ← 50", "state ← 1",
                                   "duration ← 1000", "activate ← 1"])
-        print("tap:", self.browser.find_element(By.ID, "tap").text)
+        self.assertRegex(self.tap(), r"^writes after \d+ to \d+ ms, answer after \d+ ms$")
+        self.call_and_read("TICK")  # the first one has found everything cold
+        print("tap:", self.tap())
+
+    def tap(self):
+        return self.browser.find_element(By.ID, "tap").text
+
+    def bring_up(self, profile):
+        self.choose("profile", profile)
+        self.wait_for("phone", f"profile {profile}, service registered")
+        self.wait_for("findings", "problem" if profile == "none" else "all is well")
+
+    def test_shows_a_motor_that_is_unplugged_and_comes_back(self):
+        self.addCleanup(self.bring_up, "leds")
+        self.bring_up("ff")
+        self.press("Unplug")
+        self.wait_for("lines", "motor ← unplug")
+        self.call_and_read("On")
+        self.assertIn("EX_ILLEGAL_STATE", self.rows("answer")[-1])
+        self.press("Plug")
+        self.wait_for("lines", "motor ← plug")
+        self.call_and_read("On")
+        self.assertEqual(self.rows("answer")[-1], "ok")
+
+    def test_shows_a_service_that_is_killed_and_restarted(self):
+        self.press("Kill service")
+        self.wait_for("last", "phone service kill: done")
+        self.press("Restart")
+        self.wait_for("last", "phone service restart: phone is up: profile leds, service registered")
+        self.wait_for("phone", "service registered")
+        self.assertEqual(self.call_and_read("Off"), ["activate ← 0"])
+        you = self.browser.find_elements(By.CSS_SELECTOR, "#lines tr.you")
+        self.assertEqual([row.text.split("you")[-1].strip() for row in you][-2:],
+                         ["phone service kill", "phone service restart"])
+
+    def test_gives_each_line_the_call_that_caused_it(self):
+        self.call_and_read("TICK")
+        self.call_and_read("Off")
+        rows = self.browser.execute_script(
+            "return [...document.querySelectorAll('#lines tr')].slice(-40).map(row => "
+            "[row.className, row.cells[1].textContent, row.cells[3].textContent, row.title])")
+        answers = [row for row in rows if row[0].startswith("answer")][-2:]
+        self.assertEqual([row[3] for row in answers], ["std perform TICK STRONG", "std off"])
+        (off,) = [row for row in rows if row[1] == answers[1][1] and row[0] == "driver"]
+        self.assertEqual(off[2:], ["activate ← 0", "std off"])
 
     def test_shows_the_drive(self):
         duration = self.browser.find_element(By.ID, "duration")

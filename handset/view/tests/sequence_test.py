@@ -21,15 +21,17 @@ class Sequence(unittest.TestCase):
         return sequence.of(path)
 
     def calls_of_log(self, *messages):
-        return [" ".join(call["call"]) for call in self.of_log(*messages)[0]]
+        return [" ".join([call["iface"], call["method"], *call["args"],
+                          *["--callback"] * call.get("callback", False)])
+                for call in self.of_log(*messages)[0]]
 
     def test_of_recorded_calls_has_their_times_and_callers(self):
         self.directory.call(20.5, 3, "std off", uid=1000)
         self.directory.call(10, 2, "std perform TICK STRONG")
         calls, left_out = sequence.of(self.directory.path)
         self.assertEqual([sequence.line(call) for call in calls], [
-            '{"at_ms":0.0,"uid":0,"call":["std","perform","TICK","STRONG"]}\n',
-            '{"at_ms":10.5,"uid":1000,"call":["std","off"]}\n'])
+            '{"at":0.0,"uid":0,"iface":"std","method":"perform","args":["TICK","STRONG"]}\n',
+            '{"at":10.5,"uid":1000,"iface":"std","method":"off","args":[]}\n'])
         self.assertEqual(left_out, [])
 
     def test_of_a_phone_s_log_says_what_is_not_told(self):
@@ -37,8 +39,9 @@ class Sequence(unittest.TestCase):
                                       "Not support on() callback",
                                       "V_2_0: Vibrator getPrimitiveDuration ",
                                       "Vibrator set external control: 1")
-        self.assertEqual(calls, [{"at_ms": 0, "call": ["std", "on", "30", "--callback"]},
-                                 {"at_ms": 3, "call": ["std", "setExternalControl", "true"]}])
+        self.assertEqual(calls, [
+            {"at": 0, "iface": "std", "method": "on", "args": ["30"], "callback": True},
+            {"at": 3, "iface": "std", "method": "setExternalControl", "args": ["true"]}])
         self.assertEqual(left_out, [
             "who called; the service does not log it",
             "std getPrimitiveDuration at 0.002 s: its arguments are not logged"])
@@ -73,7 +76,7 @@ class Sequence(unittest.TestCase):
         path = self.directory.path / "report.txt"
         line = "11-2%d %s.000 1 1 E QvxVibrator-HAL-AIDL-CORE: V_2_0: Vibrator off\n"
         path.write_text(line % (2, "23:59:59") + line % (3, "00:00:01"), "utf-8")
-        self.assertEqual([call["at_ms"] for call in sequence.of(path)[0]], [0, 2000])
+        self.assertEqual([call["at"] for call in sequence.of(path)[0]], [0, 2000])
 
     def test_needs_a_line_of_the_service(self):
         with self.assertRaisesRegex(sequence.run.Unreadable, "no line of the vibrator service"):
