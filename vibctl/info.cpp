@@ -124,7 +124,7 @@ class Survey {
                 line.clear();
                 head.clear();
             }
-            line = line.empty() ? fmt::format("  {:<32} {}", head, word) : line + " " + word;
+            line += line.empty() ? fmt::format("  {:<32} {}", head, word) : " " + word;
         }
         if (!text.empty()) mText += line + "\n";
     }

@@ -21,7 +21,7 @@ Problem parseSessionLine(const std::string& text, CommandLine& line) {
         if (!word.isString()) return kAccepted;
         words.push_back(word.asString());
     }
-    const Problem problem = parseCommandLine(words, line);
+    Problem problem = parseCommandLine(words, line);
     line.json = true;
     if (problem) return problem;
     if (line.command != "std" && line.command != "ext") {

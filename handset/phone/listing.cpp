@@ -118,7 +118,7 @@ ListingLine listed(int64_t us, std::string_view kind, std::string_view text) {
 }
 
 std::string answerOf(const Json& answer) {
-    if (const std::string text = answer.value("text", ""); !text.empty()) return text;
+    if (std::string text = answer.value("text", ""); !text.empty()) return text;
     if (answer.value("exception", 0) != 0) {
         return fmt::format("exception {} {}", answer.value("exception", 0),
                            answer.value("message", ""));

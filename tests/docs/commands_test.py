@@ -1,5 +1,6 @@
 # SPDX-License-Identifier: Apache-2.0
-"""Every command that README.md and docs/*.md show, run. documents.py says how one is found."""
+"""Every command that README.md, docs/*.md and the man pages show, run. documents.py says how one is
+found."""
 
 import os
 import pathlib
@@ -9,7 +10,8 @@ import subprocess
 import tempfile
 import unittest
 
-from documents import PRELUDE, PROJECT, all_blocks, blocks_of, documents, inline_commands, script
+from documents import (PRELUDE, PROJECT, all_blocks, blocks_of, documents, inline_commands,
+                       man_examples, script)
 
 BUILD = pathlib.Path(os.environ["QVX_BUILD"])
 LABELS = {"", "text", "json", "xml", "c", "cpp", "make", "rc"}  # of blocks that hold no command
@@ -86,8 +88,8 @@ class Commands(unittest.TestCase):
                     (directory / entry.name).symlink_to(entry)
             (directory / "build").mkdir()
             (directory / "build" / "release").symlink_to(BUILD)
-            blocks = [block for block in all_blocks() if is_host(block)]
-            self.assertGreater(len(blocks), 3)
+            blocks = [block for block in [*all_blocks(), *man_examples()] if is_host(block)]
+            self.assertGreater(len(blocks), 8)
             for block in blocks:
                 with self.subTest(block.place):
                     lines = [with_build(replaced(line)) for line in block.lines]
@@ -106,8 +108,8 @@ class Commands(unittest.TestCase):
             self.assertIn(line, printed)
 
     def test_of_the_guest_work(self):
-        blocks = [block for block in all_blocks() if is_guest(block)]
-        self.assertGreater(len(blocks), 3)
+        blocks = [block for block in [*all_blocks(), *man_examples()] if is_guest(block)]
+        self.assertGreater(len(blocks), 5)
         for block in blocks:
             with self.subTest(block.place):
                 text = PRELUDE + script(block.lines)

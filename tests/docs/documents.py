@@ -1,12 +1,13 @@
 # SPDX-License-Identifier: Apache-2.0
-"""Finds the commands that README.md and docs/*.md show.
+"""Finds the commands that README.md, docs/*.md and the man pages show.
 
     ```sh               run on the host, in a directory that looks like the project's
     ```sh guest PROFILE run in the handset, where the nodes of a phone of that profile are seen
 
 A command that is meant to fail is followed by "# status N". A block that cannot be run has, on the
 line before it, the reason: <!-- not run: REASON -->. In README.md, blocks that are indented by four
-columns are commands too; two spaces or more end the command, what follows describes it.
+columns are commands too; two spaces or more end the command, what follows describes it. In a man
+page the commands are what stands in the displays of the section EXAMPLES.
 """
 
 import dataclasses
@@ -57,6 +58,20 @@ def blocks_of(name, text):
 def all_blocks():
     return [block for path in documents()
             for block in blocks_of(str(path.relative_to(PROJECT)), path.read_text("utf-8"))]
+
+
+def man_examples():
+    """For each man page with examples, all of them as one block: they may build on each other."""
+    blocks = []
+    for path in sorted((PROJECT / "docs" / "man").iterdir()):
+        examples = path.read_text("utf-8").partition("\n.Sh EXAMPLES\n")[2].partition("\n.Sh ")[0]
+        displays = re.findall(r"(?ms)^\.Bd .*?\n(.*?)^\.Ed$", examples)
+        lines = [line.replace("\\e", "\\") for line in "".join(displays).splitlines()]
+        if lines:
+            blocks.append(Block(f"docs/man/{path.name}", "sh" if path.name.startswith("handset-")
+                                else "sh guest " + ("off" if path.name == "phone.1" else "ff"),
+                                lines))
+    return blocks
 
 
 def inline_commands(text):

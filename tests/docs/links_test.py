@@ -32,6 +32,14 @@ class Links(unittest.TestCase):
                     self.assertIn(anchor, anchors(path), f"{page.name}: {target}")
         self.assertGreater(seen, 10)
 
+    def test_the_readme_leads_to_the_paths_that_it_names(self):
+        readme = re.sub(r"(?ms)^```.*?^```$", "", (PROJECT / "README.md").read_text("utf-8"))
+        linked = set(re.findall(r"\]\(([^)#\s]+)", readme))
+        for span in re.findall(r"`([^`\n]+)`", readme):
+            path = span.split()[0].removeprefix("./").rstrip("/")
+            if path != "build" and re.match(r"[^/].*/", span) and (PROJECT / path).exists():
+                self.assertIn(path, linked, f"README.md names {path} and does not link it")
+
     def test_the_readme_names_every_page(self):
         readme = (PROJECT / "README.md").read_text("utf-8")
         for path in (PROJECT / "docs").glob("*.md"):

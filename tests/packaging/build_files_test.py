@@ -11,7 +11,7 @@ import project
 TESTS = project.HAL / "tests"
 DIRECTORIES = {name: project.ROOT / name for name in (
     "hal-server/vibrator/aidl", "hal-server/vibrator/aidl/default",
-    "hal-server/vibrator/aidl/tests", "hal-server/vibrator/aidl/fuzz", "vibctl")}
+    "hal-server/vibrator/aidl/tests", "hal-server/vibrator/aidl/fuzz", "platform/aidl", "vibctl")}
 
 # The kinds of module in use and their properties; a property that the build does not know ends it.
 COMMON = {"name", "defaults", "vendor", "cpp_std", "cflags", "cppflags", "srcs", "shared_libs",
@@ -24,7 +24,7 @@ PROPERTIES = {
     "cc_test": COMMON | {"test_suites"},
     "cc_fuzz": COMMON | {"corpus"},
     "aidl_interface": {"name", "owner", "vendor_available", "srcs", "stability", "imports",
-                       "backend", "versions"},
+                       "backend", "unstable", "versions"},
 }
 
 # What the platform's own build files define.
@@ -67,6 +67,19 @@ class BuildFiles(unittest.TestCase):
         return [self.joined(each.name) for each in self.modules if each.kind == kind]
 
 
+    def generated_libraries(self):
+        """The libraries that the interfaces here become, with the directory of their package."""
+        packages = {}
+        for interface in self.of_kind("aidl_interface"):
+            (pattern,) = interface["srcs"]
+            if interface["backend"]["ndk"]["enabled"]:
+                # An unstable interface has one version, which its library does not name.
+                for version in [f"-V{number}" for number in interface.get("versions", [])] or [""]:
+                    library = f"{interface['name']}{version}-ndk_platform"
+                    packages[library] = pattern.rsplit("/", 1)[0]
+        return packages
+
+
 class EveryModule(BuildFiles):
     def test_every_build_file_is_looked_at(self):
         found = {str(path.parent.relative_to(project.ROOT)) for directory in (
@@ -102,9 +115,7 @@ class EveryModule(BuildFiles):
                         self.assertTrue(list(directory.glob(pattern)))
 
     def test_libraries_exist(self):
-        interface = self.joined(project.EXTENSION_PACKAGE)
-        generated = {f"{interface['name']}-V{version}-ndk_platform"
-                     for version in interface["versions"] if interface["backend"]["ndk"]["enabled"]}
+        generated = set(self.generated_libraries())
         built = {module.name for module in self.modules if module.kind == "cc_library_static"}
         for module in self.modules:
             with self.subTest(module.name):
@@ -177,6 +188,16 @@ class Client(BuildFiles):
                         self.assertTrue(header.startswith("vibctl/"))
                     elif "/" in header or header == "tinyxml2.h":
                         self.assertRegex(header, rf"^(sys/|{libraries})")
+
+    def test_interfaces_that_it_includes_come_from_its_libraries(self):
+        packages = {"android.hardware.vibrator-V2-ndk_platform": "android/hardware/vibrator",
+                    **self.generated_libraries()}
+        linked = {packages.get(library) for library in self.program["shared_libs"]}
+        included = {header.removeprefix("aidl/").rsplit("/", 1)[0]
+                    for path in DIRECTORIES["vibctl"].rglob("*")
+                    if path.suffix in (".cpp", ".h") and "tests" not in path.parts
+                    for _, header in project.includes(path) if header.startswith("aidl/")}
+        self.assertEqual(included, linked - {None})
 
     def test_version_is_that_of_the_build_here(self):
         version = project.cmake_words(project.ROOT / "CMakeLists.txt", "project(qvx-vibrator ")[1]

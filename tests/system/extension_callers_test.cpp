@@ -52,8 +52,7 @@ constexpr Method kMethods[] = {
         {"supportsFolderTentModeStatusSetting", "true", "false"},
         {"setFolderTentModeStatus 0", "null", "null"},
         {"supportsHasFeature", "true", "null", -1, "[supportsHasFeature]Fail - "},
-        // The list of this phone has a line for each word, and only spaces separate words here.
-        {"hasFeature INTENSITY", "false", "null", -1, "[hasFeature]Fail - "},
+        {"hasFeature INTENSITY", "true", "null", -1, "[hasFeature]Fail - "},
 };
 
 std::vector<json> callEveryMethodAs(const std::string& user) {

@@ -95,6 +95,14 @@ TEST(Extension, HasFeatureKnowsTheWholeWordsThatABuiltInPhoneLists) {
     }
 }
 
+TEST(Extension, OnlySpacesSeparateTheWordsOfHasFeature) {
+    json profile = builtInProfile("leds");
+    profile["nodes"][kInfoDirectory + "functions"]["text"] = "INTENSITY\nHAPTIC_ENGINE\n";
+    const Phone phone(profile);
+    EXPECT_EQ(phone.call({"ext", "hasFeature", "HAPTIC_ENGINE"})["result"], false);
+    EXPECT_EQ(phone.call({"ext", "supportsHapticEngine"})["result"], true);
+}
+
 TEST(Extension, WithoutADeviceNothingIsOfferedAndNothingWorks) {
     const Phone phone("none");
     EXPECT_EQ(phone.call({"ext", "supportsAmplitudeControl"})["result"], false);
