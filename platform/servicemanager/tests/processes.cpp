@@ -50,7 +50,7 @@ Manager::~Manager() {
     mProcess.wait();
     // The driver cleans up behind the process, and remarks on it while it does.
     qvx::test::eventually([this] { return !answers(); });
-    std::this_thread::sleep_for(std::chrono::milliseconds(20));
+    std::this_thread::sleep_for(std::chrono::milliseconds(100));
 }
 
 bool Manager::answers() const {
