@@ -33,7 +33,9 @@ TEST(References, ObjectLivesAsLongAsARemoteReference) {
 }
 
 TEST(References, ObjectDiesWithTheClientProcess) {
-    callService(kRoot, [](const ndk::SpAIBinder& binder) {
+    const Process service = startService();
+    inProcess(kRoot, [] {
+        const auto binder = find(testName());
         auto* const leaked = new ndk::SpAIBinder(giveObject(binder));
         EXPECT_NE(nullptr, leaked->get());
         EXPECT_EQ(1, callForInt(binder, kLiveObjects));
@@ -265,7 +267,9 @@ TEST_F(Death, LinksCanBeTakenBackAndMadeAgain) {
 }
 
 TEST_F(Death, ServiceIsToldOfTheDeathOfItsClient) {
-    callService(kApp, [](const ndk::SpAIBinder& binder) {
+    const Process service = startService();
+    inProcess(kApp, [] {
+        const auto binder = find(testName());
         const auto mine = makeCallback([](int32_t number) { return number; });
         call(binder, kWatch, [&](AParcel* to) { AParcel_writeStrongBinder(to, mine.get()); });
         EXPECT_EQ(0, callForInt(binder, kDeaths));
