@@ -1,7 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 //
-// The simulated vibrator driver: shows a profile's nodes, files and motor to whoever enters its
-// mount namespace, and keeps a journal of what they do with them.
+// The vibrator driver of the handset: shows a profile's nodes, files and motor to whoever enters its
+// mount namespace, and keeps a journal of what they do with them. Nodes and motor are simulated, or
+// with --module the kernel's.
 #include <fcntl.h>
 #include <poll.h>
 #include <sys/eventfd.h>
@@ -29,6 +30,7 @@
 #include "handset/driver/fault_injector.h"
 #include "handset/driver/input_devices.h"
 #include "handset/driver/journal.h"
+#include "handset/driver/kernel_module.h"
 #include "handset/driver/motor_device.h"
 #include "handset/driver/node_tree.h"
 #include "handset/driver/placed_files.h"
@@ -63,6 +65,8 @@ Requests on the control socket, one a line, answered by "ok ..." or "error MESSA
   get PATH          what a read of a node returns   reset   empty the journal
   set PATH "TEXT"   change a node's text            stop    end
   settle            wait until the journal has every close so far
+With --module the kernel's driver takes the place of the simulated one: its nodes are everybody's, the
+journal has no opens and closes, and of the requests there are reset, settle and stop.
 
 Exit status: 0 stopped, 1 could not start or lost its mount, 2 wrong usage or a wrong profile.)";
 
@@ -70,6 +74,7 @@ struct Options {
     std::string profile;
     std::string journal;
     std::string control;
+    std::string module;
     int readyFd = -1;
 };
 
@@ -107,6 +112,52 @@ Result<void> showFiles(const Profile& profile, PlacedFiles& files, StagingDirect
     return list.show();
 }
 
+// What a driver with the kernel module can be asked for; the journal is complete by then.
+std::string answerForModule(std::string_view request, Journal& journal, bool* stopWanted) {
+    if (request == "reset") journal.reset();
+    if (request == "stop") *stopWanted = true;
+    if (request == "reset" || request == "settle" || request == "stop") return "ok";
+    return "error with the kernel module only reset, settle and stop are accepted";
+}
+
+// The phone with the kernel module, until something asks for the end.
+int runModule(const Options& options, const Profile& profile, Journal& journal, int signals) {
+    Result<StagingDirectory> staging = StagingDirectory::create();
+    if (!staging) return fail(kFailed, staging.error().message());
+    const auto module = KernelModule::load(options.module, profile);
+    if (!module) return fail(kFailed, module.error().message());
+    PlacedFiles files;
+    InputDeviceList list(profile, (*module)->event(), *staging);
+    for (const FileProfile& file : profile.files) {
+        if (auto done = files.place(file, *staging); !done)
+            return fail(kFailed, done.error().message());
+    }
+    if (profile.inputDevices) {
+        if (auto done = list.show(); !done) return fail(kFailed, done.error().message());
+    }
+    bool stopWanted = false;
+    std::unique_ptr<ControlSocket> control;
+    if (!options.control.empty()) {
+        auto listening = ControlSocket::listenAt(options.control, [&](std::string_view line) {
+            (*module)->report(journal);
+            return answerForModule(line, journal, &stopWanted);
+        });
+        if (!listening) return fail(kBadInput, listening.error().message());
+        control = std::move(*listening);
+    }
+    announceReady(options.readyFd);
+    pollfd polled[] = {{signals, POLLIN, 0},
+                       {(*module)->descriptor(), POLLIN, 0},
+                       {control != nullptr ? control->descriptor() : -1, POLLIN, 0}};
+    while (!stopWanted && polled[0].revents == 0) {
+        if (poll(polled, std::size(polled), -1) < 0 && errno != EINTR) return kFailed;
+        if (polled[1].revents != 0) (*module)->report(journal);
+        if (polled[2].revents != 0) control->serve();
+    }
+    (*module)->report(journal);
+    return kStopped;
+}
+
 // Serves until something asks for the end. False when the mount was lost.
 bool serve(int signals, int ended, ControlSocket* control, ControlRequests& requests) {
     pollfd polled[] = {{signals, POLLIN, 0},
@@ -133,10 +184,11 @@ int run(const Options& options) {
     Result<std::unique_ptr<Journal>> journal = Journal::create(options.journal);
     if (!journal) return fail(kBadInput, journal.error().message());
 
+    if (auto done = enterPrivateMounts(); !done) return fail(kFailed, done.error().message());
+    if (!options.module.empty()) return runModule(options, *profile, **journal, signals.get());
     Result<unsigned> event = 0U;
     if (profile->motor) event = chooseEvent(*profile->motor);
     if (!event) return fail(kFailed, event.error().message());
-    if (auto done = enterPrivateMounts(); !done) return fail(kFailed, done.error().message());
     Result<StagingDirectory> staging = StagingDirectory::create();
     if (!staging) return fail(kFailed, staging.error().message());
     InputDeviceList list(*profile, *event, *staging);
@@ -182,6 +234,7 @@ int parseAndRun(int argc, char** argv) {
     app.add_option("--profile", options.profile, "the profile, a JSON file")->required();
     app.add_option("--journal", options.journal, "the journal to write; emptied first")->required();
     app.add_option("--control", options.control, "where to make the control socket");
+    app.add_option("--module", options.module, "the kernel module that drives, as a file");
     app.add_option("--ready-fd", options.readyFd,
                    "descriptor that gets the line \"ready\" once the nodes are there")
             ->check(CLI::Range(0, 1 << 20));

@@ -17,6 +17,10 @@ static unsigned int effects_max = 16;
 module_param(effects_max, uint, 0444);
 MODULE_PARM_DESC(effects_max, "Effects the motor holds at once, 1 to 96");
 
+static char *motor_name = "";
+module_param_named(motor, motor_name, charp, 0444);
+MODULE_PARM_DESC(motor, "Name of the input device; empty: no motor");
+
 static struct input_dev *motor;
 
 /* The motor's waveform memory: each effect's samples, at its id. */
@@ -114,10 +118,12 @@ int qvx_motor_init(void)
 {
 	int error;
 
+	if (!*motor_name)
+		return 0;
 	motor = input_allocate_device();
 	if (!motor)
 		return -ENOMEM;
-	motor->name = "qvx_vibrator_inputff";
+	motor->name = motor_name;
 	motor->phys = "qvx/input0";
 	motor->id.bustype = BUS_VIRTUAL;
 	input_set_capability(motor, EV_FF, FF_PERIODIC);
@@ -137,7 +143,8 @@ void qvx_motor_exit(void)
 {
 	int id;
 
-	input_unregister_device(motor);
+	if (motor)
+		input_unregister_device(motor);
 	for (id = 0; id < FF_MAX_EFFECTS; id++)
 		kvfree(samples[id]);
 }

@@ -1,108 +1,58 @@
 // SPDX-License-Identifier: GPL-2.0-only
 /*
- * The driver's nodes below /sys/class. Each shows the text last stored in it,
- * or its first one; a node that holds takes a store and forgets it.
+ * The driver's nodes below /sys/class: those that the module's parameter names.
+ * Each shows the text last stored in it, or its first one; a node that holds
+ * takes a store and forgets it.
  */
 #include <linux/device.h>
 #include <linux/err.h>
 #include <linux/kernel.h>
 #include <linux/leds.h>
+#include <linux/list.h>
 #include <linux/minmax.h>
 #include <linux/module.h>
 #include <linux/mutex.h>
+#include <linux/slab.h>
 #include <linux/string.h>
 
 #include "qvx_vibrator.h"
 
 struct qvx_node {
+	struct list_head link;
 	struct device_attribute attribute;
-	const char *first_text;
 	bool hold;
 	size_t length;
 	char text[PAGE_SIZE];
 };
 
-/* One device: /sys/class/<class>/<name> and the nodes in it. */
+/* One device: /sys/class/<class_name>/<name> and the nodes in it. */
 struct qvx_directory {
+	struct list_head link;
+	struct list_head nodes;
 	const char *class_name;
 	const char *name;
-	struct qvx_node *nodes;
-	size_t node_count;
-	struct class *class; /* null for the LED, whose class is there */
+	struct class *class; /* null for an LED, whose class is there */
 	struct device *device;
+	struct led_classdev led;
 };
 
 static DEFINE_MUTEX(text_lock); /* every node's text and length */
+static LIST_HEAD(directories);
 
-static ssize_t node_show(struct device *device,
-			 struct device_attribute *attribute, char *buffer);
-static ssize_t node_store(struct device *device,
-			  struct device_attribute *attribute, const char *bytes,
-			  size_t size);
+/* The parameter, cut up: names of nodes and directories lie in it. */
+static char *words;
 
-#define NODE(_name, _mode, _show, _store, _text, _hold)                        \
-	{                                                                      \
-		.attribute = __ATTR(_name, _mode, _show, _store),              \
-		.first_text = _text, .hold = _hold                             \
-	}
-#define RW(name, text) NODE(name, 0664, node_show, node_store, text, false)
-#define RO(name, text) NODE(name, 0444, node_show, NULL, text, false)
-#define WO(name) NODE(name, 0220, NULL, node_store, "", false)
-#define HOLD(name, text) NODE(name, 0664, node_show, node_store, text, true)
+/* Without the limit that a plain string parameter has. */
+static int keep_words(const char *value, const struct kernel_param *parameter)
+{
+	kfree(words);
+	words = kstrdup(value, GFP_KERNEL);
+	return words ? 0 : -ENOMEM;
+}
 
-static struct qvx_node timed_output_nodes[] = {
-	RW(enable, "0\n"),
-	RW(intensity, "10000\n"),
-	RW(force_touch_intensity, "10000\n"),
-	RW(multi_freq, "0\n"),
-	RW(haptic_engine, "\n"),
-	HOLD(motor_type, "LINEAR_1040\n"),
-	RO(intensities, "0,2000,4000,6000,8000,10000\n"),
-	RO(haptic_intensities, "0,2500,5000,7500,10000\n"),
-};
-
-static struct qvx_node led_nodes[] = {
-	RW(activate, "0\n"),
-	RW(duration, "0\n"),
-	RW(state, "0\n"),
-	RW(intensity, "10000\n"),
-	RW(force_touch_intensity, "10000\n"),
-	RW(multi_freq, "0\n"),
-	RW(haptic_engine, "\n"),
-	RW(cp_trigger_index, "0\n"),
-	RW(cp_trigger_queue, "\n"),
-	RO(num_waves, "137\n"),
-	HOLD(motor_type, "LINEAR_1040\n"),
-	RW(event_cmd, "NONE\n"),
-	RW(ext_control, "0\n"),
-	RO(intensities, "0,2000,4000,6000,8000,10000\n"),
-	RO(haptic_intensities, "0,2500,5000,7500,10000\n"),
-	WO(reset),
-};
-
-static struct qvx_node control_nodes[] = {
-	RW(use_kyp_index, "0\n"),
-	RW(f0_stored, "0\n"),
-	RW(event_cmd, "NONE\n"),
-};
-
-static struct qvx_node info_nodes[] = {
-	RO(functions, "INTENSITY\nINDEX_HAPTIC_PATTERN\n"),
-	RO(intensities, "0,1800,3600,5400,7200,10000\n"),
-	RO(haptic_intensities, "0,2200,4400,6600,10000\n"),
-};
-
-static struct qvx_directory directories[] = {
-	{"timed_output", "vibrator", timed_output_nodes,
-	 ARRAY_SIZE(timed_output_nodes)},
-	{"qvx_vib_inputff", "control", control_nodes,
-	 ARRAY_SIZE(control_nodes)},
-	{"vib_info_class", "vib_support_info", info_nodes,
-	 ARRAY_SIZE(info_nodes)},
-};
-
-static struct qvx_directory led_directory = {"leds", "vibrator", led_nodes,
-				       ARRAY_SIZE(led_nodes)};
+static const struct kernel_param_ops words_operations = {.set = keep_words};
+module_param_cb(nodes, &words_operations, NULL, 0);
+MODULE_PARM_DESC(nodes, "Nodes, each CLASS/DEVICE/NAME:rw|ro|wo|hold:TEXT IN HEX,");
 
 static struct qvx_node *node_of(struct device_attribute *attribute)
 {
@@ -150,44 +100,89 @@ static ssize_t node_store(struct device *device,
 	return size;
 }
 
-static int add_nodes(struct qvx_directory *directory)
+/* What a node may be asked for: the third word of its description. */
+static const struct {
+	const char *word;
+	umode_t mode;
+	bool hold;
+} accesses[] = {
+	{"rw", 0664, false},
+	{"ro", 0444, false},
+	{"wo", 0220, false},
+	{"hold", 0664, true},
+};
+
+static int set_access(struct qvx_node *node, const char *word)
 {
 	size_t i;
+
+	for (i = 0; i < ARRAY_SIZE(accesses); i++) {
+		umode_t mode = accesses[i].mode;
+
+		if (!word || strcmp(word, accesses[i].word))
+			continue;
+		node->attribute.attr.mode = mode;
+		node->attribute.show = mode & 0444 ? node_show : NULL;
+		node->attribute.store = mode & 0222 ? node_store : NULL;
+		node->hold = accesses[i].hold;
+		return 0;
+	}
+	return -EINVAL;
+}
+
+static int set_first_text(struct qvx_node *node, const char *digits)
+{
+	size_t length = digits ? strlen(digits) : 0;
+
+	if (length % 2 || length / 2 >= PAGE_SIZE)
+		return -EINVAL;
+	node->length = length / 2;
+	return hex2bin(node->text, digits, node->length);
+}
+
+static struct qvx_directory *directory_of(const char *class_name,
+					  const char *name)
+{
+	struct qvx_directory *directory;
+
+	list_for_each_entry(directory, &directories, link) {
+		if (!strcmp(directory->class_name, class_name) &&
+		    !strcmp(directory->name, name))
+			return directory;
+	}
+	directory = kzalloc(sizeof(*directory), GFP_KERNEL);
+	if (!directory)
+		return NULL;
+	INIT_LIST_HEAD(&directory->nodes);
+	directory->class_name = class_name;
+	directory->name = name;
+	list_add_tail(&directory->link, &directories);
+	return directory;
+}
+
+/* Takes in one description, CLASS/DEVICE/NAME:ACCESS:HEX. */
+static int add_node(char *description)
+{
+	const char *class_name = strsep(&description, "/");
+	const char *device = strsep(&description, "/");
+	const char *name = strsep(&description, ":");
+	struct qvx_directory *directory;
+	struct qvx_node *node;
 	int error;
 
-	for (i = 0; i < directory->node_count; i++) {
-		struct qvx_node *node = &directory->nodes[i];
-
-		node->length = strscpy(node->text, node->first_text,
-				       sizeof(node->text));
-		error = device_create_file(directory->device, &node->attribute);
-		if (error)
-			return error;
+	if (!name || strchr(name, '/'))
+		return -EINVAL;
+	directory = directory_of(class_name, device);
+	node = kzalloc(sizeof(*node), GFP_KERNEL);
+	if (!directory || !node) {
+		kfree(node);
+		return -ENOMEM;
 	}
-	return 0;
-}
-
-/* The nodes go with their device. */
-static void remove_directory(struct qvx_directory *directory)
-{
-	if (!IS_ERR_OR_NULL(directory->device))
-		device_unregister(directory->device);
-	if (!IS_ERR_OR_NULL(directory->class))
-		class_destroy(directory->class);
-	directory->device = NULL;
-	directory->class = NULL;
-}
-
-static int add_directory(struct qvx_directory *directory)
-{
-	directory->class = class_create(THIS_MODULE, directory->class_name);
-	if (IS_ERR(directory->class))
-		return PTR_ERR(directory->class);
-	directory->device =
-		device_create(directory->class, NULL, 0, NULL, "%s", directory->name);
-	if (IS_ERR(directory->device))
-		return PTR_ERR(directory->device);
-	return add_nodes(directory);
+	list_add_tail(&node->link, &directory->nodes);
+	sysfs_attr_init(&node->attribute.attr);
+	node->attribute.attr.name = name;
+	error = set_access(node, strsep(&description, ":"));
+	return error ? error : set_first_text(node, description);
 }
 
 /* The LED class insists on a brightness; a vibrator has none. */
@@ -196,51 +191,87 @@ static void set_brightness(struct led_classdev *led,
 {
 }
 
-static struct led_classdev led = {
-	.name = "vibrator",
-	.max_brightness = 1,
-	.brightness_set = set_brightness,
-};
-
-static int add_led(void)
+static int show_led(struct qvx_directory *directory)
 {
-	int error = led_classdev_register(NULL, &led);
+	struct led_classdev *led = &directory->led;
+	int error;
 
-	if (error)
-		return error;
-	led_directory.device = led.dev;
-	error = add_nodes(&led_directory);
-	if (error)
-		led_classdev_unregister(&led);
+	led->name = directory->name;
+	led->max_brightness = 1;
+	led->brightness_set = set_brightness;
+	error = led_classdev_register(NULL, led);
+	directory->device = error ? NULL : led->dev;
 	return error;
+}
+
+static int show_device(struct qvx_directory *directory)
+{
+	directory->class = class_create(THIS_MODULE, directory->class_name);
+	if (IS_ERR(directory->class))
+		return PTR_ERR(directory->class);
+	directory->device = device_create(directory->class, NULL, 0, NULL, "%s",
+					  directory->name);
+	return PTR_ERR_OR_ZERO(directory->device);
+}
+
+static int show_directory(struct qvx_directory *directory)
+{
+	bool is_led = !strcmp(directory->class_name, "leds");
+	int error = is_led ? show_led(directory) : show_device(directory);
+	struct qvx_node *node;
+
+	list_for_each_entry(node, &directory->nodes, link) {
+		if (error)
+			break;
+		error = device_create_file(directory->device, &node->attribute);
+	}
+	return error;
+}
+
+/* The nodes go with their device. */
+static void remove_directory(struct qvx_directory *directory)
+{
+	struct qvx_node *node, *next;
+
+	if (IS_ERR_OR_NULL(directory->device))
+		;
+	else if (directory->class)
+		device_unregister(directory->device);
+	else
+		led_classdev_unregister(&directory->led);
+	if (!IS_ERR_OR_NULL(directory->class))
+		class_destroy(directory->class);
+	list_for_each_entry_safe(node, next, &directory->nodes, link)
+		kfree(node);
+	list_del(&directory->link);
+	kfree(directory);
 }
 
 int qvx_nodes_init(void)
 {
-	size_t i;
-	int error;
+	struct qvx_directory *directory;
+	char *rest = words;
+	char *description;
+	int error = 0;
 
-	for (i = 0; i < ARRAY_SIZE(directories); i++) {
-		error = add_directory(&directories[i]);
+	while (!error && (description = strsep(&rest, ",")))
+		error = *description ? add_node(description) : 0;
+	list_for_each_entry(directory, &directories, link) {
 		if (error)
-			goto failed;
+			break;
+		error = show_directory(directory);
 	}
-	error = add_led();
 	if (error)
-		goto failed;
-	return 0;
-
-failed:
-	for (i = 0; i < ARRAY_SIZE(directories); i++)
-		remove_directory(&directories[i]);
+		qvx_nodes_exit();
 	return error;
 }
 
 void qvx_nodes_exit(void)
 {
-	size_t i;
+	struct qvx_directory *directory, *next;
 
-	led_classdev_unregister(&led);
-	for (i = 0; i < ARRAY_SIZE(directories); i++)
-		remove_directory(&directories[i]);
+	list_for_each_entry_safe(directory, next, &directories, link)
+		remove_directory(directory);
+	kfree(words);
+	words = NULL;
 }

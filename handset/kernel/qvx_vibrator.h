@@ -14,8 +14,8 @@
  * qvx_report - report one call as a line of the report device
  * @format: the line's members after "uid", as JSON, without braces
  *
- * The line reads {"uid":<of the caller>,<members>}. May be called in any
- * context; the members must fit in 160 bytes.
+ * The line reads {"pid":<of the caller>,"uid":<of the caller>,<members>}. May
+ * be called in any context; the members must fit in 200 bytes.
  */
 __printf(1, 2) void qvx_report(const char *format, ...);
 
@@ -25,7 +25,7 @@ __printf(1, 2) void qvx_report(const char *format, ...);
  * @size: how many
  * @format: members; the last one is a key with its colon, for the bytes
  *
- * Process context only; the members must fit in 600 bytes.
+ * Process context only; the members must fit in 580 bytes.
  */
 __printf(3, 4) void qvx_report_bytes(const void *bytes, size_t size,
 				     const char *format, ...);

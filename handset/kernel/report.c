@@ -3,12 +3,14 @@
  * /dev/qvx_vibrator_report: what the driver was asked, one JSON object a line,
  * with the members of the handset's journal.
  *
- *   {"uid":1000,"op":"write","node":"/sys/class/leds/vibrator/duration",
- *    "result":4,"hex":"3530300a"}                              (on one line)
+ *   {"pid":71,"uid":1000,"op":"write",
+ *    "node":"/sys/class/leds/vibrator/duration","result":4,
+ *    "hex":"3530300a"}                                         (on one line)
  *
  * A line is there before its caller has the answer. Reading takes lines away
- * and never waits: nothing left reads as the end of a file. When lines were
- * lost because nobody read them, the next read fails with EOVERFLOW, once.
+ * and never waits: nothing left reads as the end of a file; poll(2) waits. When
+ * lines were lost because nobody read them, the next read fails with EOVERFLOW,
+ * once.
  */
 #include <linux/cred.h>
 #include <linux/fs.h>
@@ -18,24 +20,32 @@
 #include <linux/mm.h>
 #include <linux/module.h>
 #include <linux/mutex.h>
+#include <linux/poll.h>
+#include <linux/sched.h>
 #include <linux/slab.h>
 #include <linux/spinlock.h>
+#include <linux/wait.h>
 
 #include "qvx_vibrator.h"
 
 #define QVX_REPORT_SIZE (1U << 18) /* bytes of lines nobody has read yet */
-#define QVX_SHORT_LINE 192
+#define QVX_SHORT_LINE 256
 #define QVX_LONG_HEAD 640 /* of a line with bytes: all before them */
 
 static DEFINE_SPINLOCK(report_lock); /* writers, among them the input core */
 static DEFINE_MUTEX(reader_lock);
+static DECLARE_WAIT_QUEUE_HEAD(readers);
 static struct kfifo report;
 static bool lost;
 
-static uid_t caller(void)
-{
-	return from_kuid_munged(&init_user_ns, current_fsuid());
-}
+static bool reporting = true;
+module_param_named(report, reporting, bool, 0644);
+MODULE_PARM_DESC(report, "Whether calls are reported, which costs them time");
+
+/* A line's first members. */
+#define HEAD "{\"pid\":%d,\"uid\":%u,"
+#define CALLER                                                                 \
+	task_tgid_nr(current), from_kuid_munged(&init_user_ns, current_fsuid())
 
 static void put_line(const char *line, size_t length)
 {
@@ -47,6 +57,7 @@ static void put_line(const char *line, size_t length)
 	else
 		kfifo_in(&report, line, length);
 	spin_unlock_irqrestore(&report_lock, flags);
+	wake_up_interruptible(&readers);
 }
 
 void qvx_report(const char *format, ...)
@@ -55,28 +66,33 @@ void qvx_report(const char *format, ...)
 	struct va_format members = {.fmt = format};
 	va_list arguments;
 
+	if (!reporting)
+		return;
 	va_start(arguments, format);
 	members.va = &arguments;
-	put_line(line, scnprintf(line, sizeof(line), "{\"uid\":%u,%pV}\n",
-				 caller(), &members));
+	put_line(line, scnprintf(line, sizeof(line), HEAD "%pV}\n", CALLER,
+				 &members));
 	va_end(arguments);
 }
 
 void qvx_report_bytes(const void *bytes, size_t size, const char *format, ...)
 {
-	char *line = kvmalloc(QVX_LONG_HEAD + 2 * size, GFP_KERNEL);
 	struct va_format members = {.fmt = format};
 	va_list arguments;
+	char *line;
 	char *end;
 
+	if (!reporting)
+		return;
+	line = kvmalloc(QVX_LONG_HEAD + 2 * size, GFP_KERNEL);
 	if (!line) {
 		lost = true;
 		return;
 	}
 	va_start(arguments, format);
 	members.va = &arguments;
-	end = line + scnprintf(line, QVX_LONG_HEAD - 4, "{\"uid\":%u,%pV\"",
-			       caller(), &members);
+	end = line + scnprintf(line, QVX_LONG_HEAD - 4, HEAD "%pV\"", CALLER,
+			       &members);
 	va_end(arguments);
 	end = bin2hex(end, bytes, size);
 	memcpy(end, "\"}\n", 3);
@@ -103,9 +119,16 @@ static ssize_t report_read(struct file *file, char __user *buffer, size_t size,
 	return error ? error : copied;
 }
 
+static __poll_t report_poll(struct file *file, poll_table *wait)
+{
+	poll_wait(file, &readers, wait);
+	return lost || !kfifo_is_empty(&report) ? EPOLLIN | EPOLLRDNORM : 0;
+}
+
 static const struct file_operations report_operations = {
 	.owner = THIS_MODULE,
 	.read = report_read,
+	.poll = report_poll,
 	.llseek = no_llseek,
 };
 

@@ -4,10 +4,12 @@
 import argparse
 import os
 
+import kernel_module
 from failure import Failure
 from guest_image import ARCHITECTURES, PROJECT
 from machine import find_emulator
 
+_DRIVERS = ("simulated", "kernel")
 _PRESETS = {"amd64": "release", "arm64": "arm64"}
 _ELF_MACHINES = {"amd64": 62, "arm64": 183}  # e_machine of <elf.h>
 _ELF_MACHINE_OFFSET = 18
@@ -64,6 +66,9 @@ def parse(program, description, words, takes_command):
                         help="the guest's memory (default 512, for a sanitized build 2048)")
     parser.add_argument("--smp", metavar="N", type=_positive(int, "a whole number"), default=1,
                         help="processors (default 1)")
+    parser.add_argument("--driver", metavar="WHICH", default="simulated",
+                        help="simulated (default), or kernel: the nodes and the motor of the kernel "
+                             "module, without faults and unplugging")
     parser.add_argument("--counted", action="store_true",
                         help="let the guest's clock count instructions: 1 ns is one instruction")
     parser.add_argument("--timing", metavar="FILE",
@@ -93,6 +98,8 @@ def parse(program, description, words, takes_command):
         if len(words) > 2 or not words[0].startswith("--join"):
             raise Failure("--join takes no other option")
         return options
+    if options.driver not in _DRIVERS:
+        raise Failure(f"unknown driver '{options.driver}': use {' or '.join(_DRIVERS)}")
     _check_architecture(options)
     _check_profile(options)
     _check_build(options)
@@ -116,6 +123,8 @@ def _check_directories(options):
     except FileNotFoundError:
         raise Failure("the working directory does not exist any more") from None
     paths = [options.directory, options.build, options.profile or "/"]
+    if options.driver == "kernel":
+        paths.append(kernel_module.module_path(options.arch))
     paths += [os.path.realpath(path) for path in paths if path.startswith("/")]
     for path in paths:
         if _is_below(path, _HIDDEN):

@@ -10,6 +10,7 @@ import sys
 import time
 
 import guest_image
+import kernel_module
 from failure import Failure
 from guest import Guest, NotStarted
 from machine import Machine
@@ -97,6 +98,8 @@ def run(options, arguments, streams, terminal=None, join_socket=None):
     raise_on_signals()
     with phases.measure("preparation"):
         guest_image.prepare(options.arch, say)
+        if options.driver == "kernel":
+            kernel_module.build(options.arch, say)
     machine = Machine(options, join_socket)
     try:
         guest = Guest(machine)
@@ -171,6 +174,8 @@ def _run_phone(guest, options, *words):
 def environment(options):
     variables = {"PATH": f"{os.path.join(options.build, 'bin')}:{_SYSTEM_PATH}",
                  "HOME": "/root", "USER": "root", "OUT": GUEST_OUT, "LANG": "C.UTF-8"}
+    if options.driver == "kernel":
+        variables["PHONE_MODULE"] = kernel_module.module_path(options.arch)
     for name, value in os.environ.items():
         if name in _PASSED_ON or name.startswith(_PASSED_ON_PREFIX):
             variables[name] = value

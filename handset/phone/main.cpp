@@ -64,6 +64,8 @@ void addUp(CLI::App& app, std::function<int()>& chosen, UpOptions& options) {
     up->add_option("--out", options.out, "directory for the journal and the logs");
     up->add_option("--service", options.service, "another build of the service")
             ->envname("PHONE_SERVICE");
+    up->add_option("--module", options.module, "the kernel module that drives, as a file")
+            ->envname("PHONE_MODULE");
     up->add_flag("--no-service", options.noService, "driver and service manager only");
 }
 

@@ -83,6 +83,7 @@ Result<PhonePlan> makePlan(const UpOptions& options) {
     Result<std::string> profile = findProfile(options.profile);
     if (!profile) return profile.error();
     plan.profilePath = *profile;
+    if (!options.module.empty()) plan.module = fs::absolute(options.module).string();
     const std::string service =
             options.service.empty() ? (here / kServiceFile).string() : options.service;
     struct Part {

@@ -12,6 +12,7 @@ struct UpOptions {
     std::string profile = "leds";    // a built-in profile's name, or a file
     std::string out = "/run/phone";  // directory for the journal and the logs
     std::string service;             // another build of the service; empty: the one beside phone
+    std::string module;              // the kernel module that drives; empty: the simulated driver
     bool noService = false;
 };
 

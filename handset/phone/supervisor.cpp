@@ -114,9 +114,11 @@ Result<Child> Supervisor::startServer(std::vector<std::string> command, const st
 
 std::optional<UpReport> Supervisor::startDriver() {
     unique_fd ready;
-    Result<Child> driver = startServer({mPlan.driver, "--profile", mPlan.profilePath, "--journal",
-                                        mState.journal(), "--control", kControlSocket},
-                                       mState.driverLog(), ready);
+    std::vector<std::string> command = {mPlan.driver,  "--profile",      mPlan.profilePath,
+                                        "--journal",   mState.journal(), "--control",
+                                        kControlSocket};
+    if (!mPlan.module.empty()) command.insert(command.end(), {"--module", mPlan.module});
+    Result<Child> driver = startServer(std::move(command), mState.driverLog(), ready);
     if (!driver) return UpReport::notStarted(driver.error().message());
     mDriver = std::move(*driver);
     mState.driver = mDriver->pid();

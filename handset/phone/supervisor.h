@@ -40,6 +40,7 @@ struct PhonePlan {
     std::string profilePath;
     std::string out;  // exists
     std::string driver;
+    std::string module;  // of the kernel; empty: the driver simulates
     std::string manager;
     std::string service;  // empty: none
     InitScript init;      // how the service is started again

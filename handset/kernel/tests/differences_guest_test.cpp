@@ -38,8 +38,8 @@ std::ostream &operator<<(std::ostream &out, const Difference &difference)
 
 std::string openAndRefusal(const std::string &)
 {
-	return joined(
-		{openNode(kReadWrite, O_RDWR), openNode(kReadOnly, O_RDWR)});
+	return joined({openNode(kReadWriteNode, O_RDWR),
+		       openNode(kReadOnlyNode, O_RDWR)});
 }
 
 std::string motorOpen(const std::string &motor)
@@ -121,11 +121,11 @@ std::string repeatSettings(const std::string &motor)
 
 std::string moreThanAPage(const std::string &)
 {
-	const int node = open(kReadWrite.c_str(), O_RDWR);
+	const int node = open(kReadWriteNode.c_str(), O_RDWR);
 	const std::string text(5000, '7');
 	std::string answers =
 		outcome(write(node, text.data(), text.size())) + " ";
-	answers += std::to_string(readNode(kReadWrite).size());
+	answers += std::to_string(readNode(kReadWriteNode).size());
 	close(node);
 	return answers;
 }
@@ -139,7 +139,7 @@ std::string aWholePage(const std::string &)
 
 std::string threeReads(const std::string &)
 {
-	const int node = open(kReadOnly.c_str(), O_RDONLY);
+	const int node = open(kReadOnlyNode.c_str(), O_RDONLY);
 	char text[2];
 	std::string answers;
 	for (int i = 0; i < 3; ++i)
@@ -150,7 +150,8 @@ std::string threeReads(const std::string &)
 
 std::string pollOfANode(const std::string &)
 {
-	pollfd polled{open(kReadWrite.c_str(), O_RDONLY), POLLIN | POLLPRI, 0};
+	pollfd polled{open(kReadWriteNode.c_str(), O_RDONLY), POLLIN | POLLPRI,
+		      0};
 	poll(&polled, 1, 0);
 	close(polled.fd);
 	return std::to_string(polled.revents);

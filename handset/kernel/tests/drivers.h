@@ -21,10 +21,10 @@ namespace handset
 using Json = nlohmann::json;
 
 // The nodes that requests go to.
-inline const std::string kReadWrite = "/sys/class/leds/vibrator/duration";
+inline const std::string kReadWriteNode = "/sys/class/leds/vibrator/duration";
 inline const std::string kHeld = "/sys/class/leds/vibrator/motor_type";
-inline const std::string kReadOnly = "/sys/class/leds/vibrator/num_waves";
-inline const std::string kWriteOnly = "/sys/class/leds/vibrator/reset";
+inline const std::string kReadOnlyNode = "/sys/class/leds/vibrator/num_waves";
+inline const std::string kWriteOnlyNode = "/sys/class/leds/vibrator/reset";
 inline const std::string kOtherClass =
 	"/sys/class/timed_output/vibrator/enable";
 inline const std::string kControlClass =

@@ -26,7 +26,8 @@ std::string randomReadsAndWrites(unsigned seed)
 	const auto below = [&](unsigned limit) {
 		return static_cast<unsigned>(random() % limit);
 	};
-	const NodeFile files[2] = {{kReadWrite, O_RDWR}, {kReadWrite, O_RDWR}};
+	const NodeFile files[2] = {{kReadWriteNode, O_RDWR},
+				   {kReadWriteNode, O_RDWR}};
 	std::string answers;
 	for (int i = 0; i < 600; ++i) {
 		const NodeFile &file = files[below(2)];

@@ -23,7 +23,8 @@ std::string opens(const std::string &)
 {
 	std::string answers;
 	for (const std::string &node :
-	     {kReadWrite, kReadOnly, kWriteOnly, kOtherClass, kMissing}) {
+	     {kReadWriteNode, kReadOnlyNode, kWriteOnlyNode, kOtherClass,
+	      kMissing}) {
 		for (const int mode : {O_RDONLY, O_WRONLY, O_RDWR})
 			answers += openNode(node, mode) + " ";
 		answers += "/ ";
@@ -33,26 +34,26 @@ std::string opens(const std::string &)
 
 std::string opensWithFlags(const std::string &)
 {
-	return joined(
-		{openNode(kReadWrite, O_WRONLY | O_TRUNC),
-		 openNode(kReadWrite, O_RDWR | O_CREAT),
-		 openNode(kReadWrite, O_RDONLY | O_TRUNC),
-		 openNode(kReadOnly, O_RDONLY | O_TRUNC),
-		 openNode(kReadWrite, O_RDWR | O_CREAT | O_EXCL),
-		 openNode(kMissing, O_RDWR | O_CREAT),
-		 openNode(kMissing, O_RDONLY | O_CREAT),
-		 openNode(kReadWrite, O_RDONLY | O_DIRECTORY),
-		 openNode("/sys/class/leds/vibrator", O_RDONLY),
-		 openNode("/sys/class/leds/vibrator", O_RDWR),
-		 openNode(kReadWrite, O_RDWR | O_APPEND | O_NONBLOCK | O_SYNC),
-		 readNode(kReadWrite)});
+	return joined({openNode(kReadWriteNode, O_WRONLY | O_TRUNC),
+		       openNode(kReadWriteNode, O_RDWR | O_CREAT),
+		       openNode(kReadWriteNode, O_RDONLY | O_TRUNC),
+		       openNode(kReadOnlyNode, O_RDONLY | O_TRUNC),
+		       openNode(kReadWriteNode, O_RDWR | O_CREAT | O_EXCL),
+		       openNode(kMissing, O_RDWR | O_CREAT),
+		       openNode(kMissing, O_RDONLY | O_CREAT),
+		       openNode(kReadWriteNode, O_RDONLY | O_DIRECTORY),
+		       openNode("/sys/class/leds/vibrator", O_RDONLY),
+		       openNode("/sys/class/leds/vibrator", O_RDWR),
+		       openNode(kReadWriteNode,
+				O_RDWR | O_APPEND | O_NONBLOCK | O_SYNC),
+		       readNode(kReadWriteNode)});
 }
 
 std::string accesses(const std::string &)
 {
 	std::string answers;
 	for (const std::string &node :
-	     {kReadWrite, kReadOnly, kWriteOnly, kMissing}) {
+	     {kReadWriteNode, kReadOnlyNode, kWriteOnlyNode, kMissing}) {
 		for (const int mode : {F_OK, R_OK, W_OK, X_OK, R_OK | W_OK}) {
 			answers += outcome(access(node.c_str(), mode)) + " ";
 		}
@@ -62,7 +63,7 @@ std::string accesses(const std::string &)
 
 std::string sizesOfWrites(const std::string &)
 {
-	const NodeFile file(kReadWrite, O_RDWR);
+	const NodeFile file(kReadWriteNode, O_RDWR);
 	std::string answers;
 	for (const size_t size : {1U, 2U, 7U, 255U, 4094U, 4095U, 4096U}) {
 		answers += file.put(std::string(size, 'x')) + " ";
@@ -82,28 +83,30 @@ std::string bytesOfWrites(const std::string &)
 
 std::string freshStores(const std::string &)
 {
-	const NodeFile file(kReadWrite, O_RDWR);
+	const NodeFile file(kReadWriteNode, O_RDWR);
 	iovec pieces[2] = {{const_cast<char *>("123"), 3},
 			   {const_cast<char *>("4567"), 4}};
-	const NodeFile appended(kReadWrite, O_WRONLY | O_APPEND);
-	return joined(
-		{file.put("12345\n"), file.put("7\n"), readNode(kReadWrite),
-		 outcome(pwrite(file.fd(), "9", 1, 100)), readNode(kReadWrite),
-		 outcome(writev(file.fd(), pieces, 2)), readNode(kReadWrite),
-		 appended.put("5"), readNode(kReadWrite)});
+	const NodeFile appended(kReadWriteNode, O_WRONLY | O_APPEND);
+	return joined({file.put("12345\n"), file.put("7\n"),
+		       readNode(kReadWriteNode),
+		       outcome(pwrite(file.fd(), "9", 1, 100)),
+		       readNode(kReadWriteNode),
+		       outcome(writev(file.fd(), pieces, 2)),
+		       readNode(kReadWriteNode), appended.put("5"),
+		       readNode(kReadWriteNode)});
 }
 
 std::string writesToNowhere(const std::string &)
 {
 	const char *nowhere = nullptr;
-	const NodeFile file(kReadWrite, O_RDWR);
-	const NodeFile readOnly(kReadOnly, O_RDONLY);
-	const NodeFile writeOnly(kWriteOnly, O_WRONLY);
+	const NodeFile file(kReadWriteNode, O_RDWR);
+	const NodeFile readOnly(kReadOnlyNode, O_RDONLY);
+	const NodeFile writeOnly(kWriteOnlyNode, O_WRONLY);
 	return joined(
 		{outcome(write(file.fd(), nowhere + 8, 4)),
 		 outcome(read(file.fd(), const_cast<char *>(nowhere) + 8, 4)),
 		 readOnly.put("1"), writeOnly.get(4), writeOnly.put("1"),
-		 readNode(kReadWrite)});
+		 readNode(kReadWriteNode)});
 }
 
 std::string heldText(const std::string &)
@@ -115,26 +118,26 @@ std::string heldText(const std::string &)
 
 std::string readsInPieces(const std::string &)
 {
-	writeNode(kReadWrite, "123456\n", O_WRONLY);
-	const NodeFile file(kReadWrite, O_RDONLY);
+	writeNode(kReadWriteNode, "123456\n", O_WRONLY);
+	const NodeFile file(kReadWriteNode, O_RDONLY);
 	const std::string first = file.get(3);
-	writeNode(kReadWrite, "x\n", O_WRONLY);
+	writeNode(kReadWriteNode, "x\n", O_WRONLY);
 	return joined({first, file.get(2), file.get(9), file.get(9),
 		       file.get(1), file.getAt(9, 0)});
 }
 
 std::string readsOutOfOrder(const std::string &)
 {
-	writeNode(kReadWrite, "123456\n", O_WRONLY);
-	const NodeFile file(kReadWrite, O_RDONLY);
+	writeNode(kReadWriteNode, "123456\n", O_WRONLY);
+	const NodeFile file(kReadWriteNode, O_RDONLY);
 	std::string answers =
 		joined({file.getAt(2, 3), file.getAt(9, 5), file.getAt(9, 7),
 			file.getAt(9, 100), file.get(2)});
-	writeNode(kReadWrite, "abcdef\n", O_WRONLY);
+	writeNode(kReadWriteNode, "abcdef\n", O_WRONLY);
 	// The piece that follows is of the text as it was; elsewhere it is the
 	// text as it is.
 	answers += joined({file.get(2), file.getAt(2, 2), file.getAt(2, 4)});
-	writeNode(kReadWrite, "z\n", O_WRONLY);
+	writeNode(kReadWriteNode, "z\n", O_WRONLY);
 	answers +=
 		joined({file.getAt(2, 6), file.getAt(2, 1), file.getAt(2, 0)});
 	lseek(file.fd(), 0, SEEK_SET);
@@ -152,14 +155,14 @@ std::string readsOfOneByte(const std::string &)
 
 std::string readAfterOwnWrite(const std::string &)
 {
-	const NodeFile file(kReadWrite, O_RDWR);
+	const NodeFile file(kReadWriteNode, O_RDWR);
 	return joined({file.get(1), file.put("5678\n"), file.get(9),
 		       file.get(9), file.getAt(9, 0)});
 }
 
 std::string seeks(const std::string &)
 {
-	const NodeFile file(kReadWrite, O_RDWR);
+	const NodeFile file(kReadWriteNode, O_RDWR);
 	return joined({outcome(lseek(file.fd(), 0, SEEK_END)),
 		       outcome(lseek(file.fd(), 5, SEEK_SET)),
 		       outcome(lseek(file.fd(), 2, SEEK_CUR)),
@@ -170,14 +173,14 @@ std::string seeks(const std::string &)
 
 std::string sizesAndSyncs(const std::string &)
 {
-	const NodeFile file(kReadWrite, O_RDWR);
-	const NodeFile readOnly(kReadWrite, O_RDONLY);
+	const NodeFile file(kReadWriteNode, O_RDWR);
+	const NodeFile readOnly(kReadWriteNode, O_RDONLY);
 	return joined({outcome(ftruncate(file.fd(), 0)),
 		       outcome(ftruncate(file.fd(), 100)),
 		       outcome(ftruncate(readOnly.fd(), 0)),
-		       outcome(truncate(kReadWrite.c_str(), 0)),
-		       outcome(truncate(kReadOnly.c_str(), 0)),
-		       outcome(fsync(file.fd())), readNode(kReadWrite)});
+		       outcome(truncate(kReadWriteNode.c_str(), 0)),
+		       outcome(truncate(kReadOnlyNode.c_str(), 0)),
+		       outcome(fsync(file.fd())), readNode(kReadWriteNode)});
 }
 
 std::string attributesOf(const std::string &path)
@@ -194,21 +197,21 @@ std::string attributesOf(const std::string &path)
 
 std::string attributes(const std::string &)
 {
-	return attributesOf(kReadWrite) + attributesOf(kReadOnly) +
-	       attributesOf(kWriteOnly) + attributesOf(kMissing);
+	return attributesOf(kReadWriteNode) + attributesOf(kReadOnlyNode) +
+	       attributesOf(kWriteOnlyNode) + attributesOf(kMissing);
 }
 
 std::string changedAttributes(const std::string &)
 {
 	const auto change = [](int mode) {
-		return outcome(chmod(kReadWrite.c_str(), mode));
+		return outcome(chmod(kReadWriteNode.c_str(), mode));
 	};
-	return joined({change(0444), openNode(kReadWrite, O_RDWR), change(0220),
-		       openNode(kReadWrite, O_RDONLY), change(0),
-		       openNode(kReadWrite, O_WRONLY), change(0666),
-		       openNode(kReadWrite, O_RDWR),
-		       outcome(chown(kReadWrite.c_str(), 2000, 2000)),
-		       attributesOf(kReadWrite)});
+	return joined({change(0444), openNode(kReadWriteNode, O_RDWR),
+		       change(0220), openNode(kReadWriteNode, O_RDONLY),
+		       change(0), openNode(kReadWriteNode, O_WRONLY),
+		       change(0666), openNode(kReadWriteNode, O_RDWR),
+		       outcome(chown(kReadWriteNode.c_str(), 2000, 2000)),
+		       attributesOf(kReadWriteNode)});
 }
 
 // The bits alone say who may open; without the method in the driver the access
@@ -216,10 +219,10 @@ std::string changedAttributes(const std::string &)
 std::string bitsWithoutMethods(const std::string &)
 {
 	std::string answers =
-		joined({outcome(chmod(kReadOnly.c_str(), 0666)),
-			outcome(chmod(kWriteOnly.c_str(), 0666))});
-	const NodeFile readOnly(kReadOnly, O_RDWR);
-	const NodeFile writeOnly(kWriteOnly, O_RDWR);
+		joined({outcome(chmod(kReadOnlyNode.c_str(), 0666)),
+			outcome(chmod(kWriteOnlyNode.c_str(), 0666))});
+	const NodeFile readOnly(kReadOnlyNode, O_RDWR);
+	const NodeFile writeOnly(kWriteOnlyNode, O_RDWR);
 	return answers + joined({readOnly.put("1"), readOnly.put(""),
 				 readOnly.getAt(9, 0), writeOnly.get(9),
 				 writeOnly.put("1"), writeOnly.get(9)});
@@ -228,15 +231,16 @@ std::string bitsWithoutMethods(const std::string &)
 std::string changedDirectories(const std::string &)
 {
 	const std::string directory = "/sys/class/leds/vibrator/new";
-	return joined({outcome(unlink(kReadWrite.c_str())),
-		       outcome(unlink(kMissing.c_str())),
-		       outcome(mkdir(directory.c_str(), 0755)),
-		       outcome(rmdir(directory.c_str())),
-		       outcome(rename(kReadWrite.c_str(), kMissing.c_str())),
-		       outcome(symlink("duration", kMissing.c_str())),
-		       outcome(link(kReadWrite.c_str(), kMissing.c_str())),
-		       outcome(mknod(kMissing.c_str(), S_IFREG | 0644, 0)),
-		       outcome(mknod(kMissing.c_str(), S_IFIFO | 0644, 0))});
+	return joined(
+		{outcome(unlink(kReadWriteNode.c_str())),
+		 outcome(unlink(kMissing.c_str())),
+		 outcome(mkdir(directory.c_str(), 0755)),
+		 outcome(rmdir(directory.c_str())),
+		 outcome(rename(kReadWriteNode.c_str(), kMissing.c_str())),
+		 outcome(symlink("duration", kMissing.c_str())),
+		 outcome(link(kReadWriteNode.c_str(), kMissing.c_str())),
+		 outcome(mknod(kMissing.c_str(), S_IFREG | 0644, 0)),
+		 outcome(mknod(kMissing.c_str(), S_IFIFO | 0644, 0))});
 }
 
 const Agreement kCases[] = {

@@ -54,6 +54,10 @@ class Options(unittest.TestCase):
         self.assertEqual(self.refused("--arch", "mips", "--", "true"),
                          "handset/run: unknown architecture 'mips': use amd64 or arm64")
 
+    def test_unknown_driver(self):
+        self.assertEqual(self.refused("--driver", "real", "--", "true"),
+                         "handset/run: unknown driver 'real': use simulated or kernel")
+
     def test_unknown_profile_names_the_built_in_ones(self):
         refusal = self.refused("--profile", "nope", "--", "true")
         beginning, end = "handset/run: no profile 'nope': use ", ", off, or a file"
