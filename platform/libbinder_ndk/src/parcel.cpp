@@ -42,13 +42,13 @@ void Parcel::clear() {
 void Parcel::releaseOwned() {
     for (AIBinder* const binder : mHeld)
         if (binder != nullptr) AIBinder_decStrong(binder);
-    closeDescriptors();
+    if (!mOffsets.empty()) closeDescriptors();
     if (mSensitive) explicit_bzero(mData, mSize);
     if (mData != mInline) std::free(mData);
 }
 
 void Parcel::releaseAdopted() {
-    closeDescriptors();
+    if (mAdoptedOffsetCount != 0) closeDescriptors();
     mRelease(mData);
 }
 
@@ -95,12 +95,12 @@ binder_status_t Parcel::reserve(size_t length, uint8_t** out) {
     if (length > kMaxSize || mPosition > kMaxSize) return STATUS_BAD_VALUE;
     const size_t end = mPosition + roundUp(length);
     if (end > kMaxSize) return STATUS_BAD_VALUE;
-    if (touchesObject(mPosition, end)) return STATUS_PERMISSION_DENIED;
+    if (offsetCount() != 0 && touchesObject(mPosition, end)) return STATUS_PERMISSION_DENIED;
     if (const auto status = grow(end); status != STATUS_OK) return status;
 
     // Nothing of the process's memory may travel: neither a gap nor padding is left as it was.
     if (mPosition > mSize) std::memset(mData + mSize, 0, mPosition - mSize);
-    std::memset(mData + mPosition + length, 0, end - mPosition - length);
+    for (size_t at = mPosition + length; at < end; ++at) mData[at] = 0;
     *out = mData + mPosition;
     mPosition = end;
     mSize = std::max(mSize, end);
@@ -124,15 +124,6 @@ binder_status_t Parcel::writeString16(std::u16string_view text) {
         return status;
     if (bytes != 0) std::memcpy(to, text.data(), bytes);
     std::memset(to + bytes, 0, sizeof(char16_t));
-    return STATUS_OK;
-}
-
-binder_status_t Parcel::take(size_t length, const uint8_t** bytes) const {
-    if (length > available()) return STATUS_NOT_ENOUGH_DATA;
-    const size_t begin = mPosition;
-    mPosition += length;
-    if (touchesObject(begin, mPosition)) return STATUS_PERMISSION_DENIED;
-    *bytes = mData + begin;
     return STATUS_OK;
 }
 

@@ -80,7 +80,12 @@ class Parcel {
     template <typename T>
     binder_status_t write(T value) {
         static_assert(std::is_arithmetic_v<T> && (sizeof(T) == 4 || sizeof(T) == 8));
-        return writeBytes(&value, sizeof value);
+        // At the end of what a parcel holds, which is nearly always, there is nothing to look after.
+        if (mAdopted || mPosition != mSize || mCapacity - mSize < sizeof value)
+            return writeBytes(&value, sizeof value);
+        std::memcpy(mData + mSize, &value, sizeof value);
+        mPosition = mSize += sizeof value;
+        return STATUS_OK;
     }
 
     // Count, units, a zero unit.
@@ -120,7 +125,14 @@ class Parcel {
     binder_status_t readFileDescriptor(int* fd) const;
 
   private:
-    binder_status_t take(size_t length, const uint8_t** bytes) const;
+    binder_status_t take(size_t length, const uint8_t** bytes) const {
+        if (length > available()) return STATUS_NOT_ENOUGH_DATA;
+        const size_t begin = mPosition;
+        mPosition += length;
+        if (offsetCount() != 0 && touchesObject(begin, mPosition)) return STATUS_PERMISSION_DENIED;
+        *bytes = mData + begin;
+        return STATUS_OK;
+    }
     bool touchesObject(size_t begin, size_t end) const;
     bool isObjectAt(size_t offset) const;
     flat_binder_object objectAt(size_t offset) const;

@@ -16,6 +16,18 @@
 namespace binder_ndk {
 namespace {
 
+// A reply without objects and with no more bytes is worth no system call of its own to be given back:
+// it waits for what the thread sends next. One such buffer at most does, so a process that makes calls
+// from many threads may hold so much for each of them.
+constexpr size_t kSmallReply = 1024;
+
+void freeSmallBuffer(const uint8_t* buffer) {
+    ThreadState& thread = ThreadState::self();
+    const bool isFirst = !thread.hasQueued();
+    thread.queue(BC_FREE_BUFFER, reinterpret_cast<binder_uintptr_t>(buffer));
+    if (!isFirst) thread.flushUnlessServing();
+}
+
 thread_local ThreadState* threadState = nullptr;
 
 // A pthread key rather than a thread_local destructor: it runs after those, whose objects may still
@@ -62,15 +74,10 @@ ThreadState::~ThreadState() {
     Driver::instance().exitThread();
 }
 
-void ThreadState::append(const void* bytes, size_t length) {
-    // A forked child's references were never the driver's to count.
-    if (Driver::isForkedCopy()) return;
-    const auto* const begin = static_cast<const uint8_t*>(bytes);
-    mQueue.insert(mQueue.end(), begin, begin + length);
-}
-
 void ThreadState::flush() {
-    if (Driver::isForkedCopy()) return;
+    // A forked child's references were never the driver's to count.
+    if (Driver::isForkedCopy()) mQueued = 0;
+    if (mQueued == 0) return;
     if (const binder_status_t status = talk(false); status != STATUS_OK)
         logError("the binder driver refuses commands: %s", std::strerror(-status));
 }
@@ -85,7 +92,7 @@ binder_status_t ThreadState::talk(bool read) {
     binder_write_read exchange = {};
     // While commands are left only a flush may write: they may ask for answers that come first.
     if (!read || wantsRead) {
-        exchange.write_size = mQueue.size();
+        exchange.write_size = mQueued;
         exchange.write_buffer = reinterpret_cast<binder_uintptr_t>(mQueue.data());
     }
     if (wantsRead) {
@@ -96,7 +103,8 @@ binder_status_t ThreadState::talk(bool read) {
 
     const int error = Driver::instance().writeRead(exchange);
     // The driver stops behind a transaction that failed; the rest goes with the next write.
-    mQueue.erase(mQueue.begin(), mQueue.begin() + static_cast<ptrdiff_t>(exchange.write_consumed));
+    mQueued -= exchange.write_consumed;
+    if (mQueued != 0) std::memmove(mQueue.data(), mQueue.data() + exchange.write_consumed, mQueued);
     if (wantsRead) {
         mReceived = 0;
         mReceivedSize = error == 0 ? exchange.read_consumed : 0;
@@ -140,10 +148,14 @@ binder_status_t ThreadState::transact(uint32_t handle, uint32_t code, const Parc
 
 binder_status_t ThreadState::waitFor(Until until, Parcel* reply) {
     for (;;) {
-        if (const auto status = talk(true); status != STATUS_OK) return status;
-        if (!hasReceived()) continue;
+        if (!hasReceived()) {
+            if (const auto status = talk(true); status != STATUS_OK) return status;
+            continue;
+        }
         const auto command = receive<uint32_t>();
         switch (command) {
+            case BR_NOOP:
+                break;
             case BR_ONEWAY_SPAM_SUSPECT:
                 logError("this process floods another one with oneway calls");
                 [[fallthrough]];
@@ -166,19 +178,17 @@ binder_status_t ThreadState::waitFor(Until until, Parcel* reply) {
 
 binder_status_t ThreadState::acceptReply(Parcel* reply) {
     const auto transaction = receive<binder_transaction_data>();
-    const auto* const data =
-            reinterpret_cast<const uint8_t*>(transaction.data.ptr.buffer);  // NOLINT
-    Parcel received;
-    received.adopt(data, transaction.data_size,
-                   reinterpret_cast<const binder_size_t*>(transaction.data.ptr.offsets),  // NOLINT
-                   transaction.offsets_size / sizeof(binder_size_t), kernel::freeBuffer);
-    if ((transaction.flags & TF_STATUS_CODE) != 0) {
-        int32_t status = STATUS_UNKNOWN_ERROR;
-        received.read(&status);
-        return status;
-    }
-    reply->adoptFrom(received);
-    return STATUS_OK;
+    const bool isSmall = transaction.offsets_size == 0 && transaction.data_size <= kSmallReply;
+    reply->adopt(reinterpret_cast<const uint8_t*>(transaction.data.ptr.buffer),  // NOLINT
+                 transaction.data_size,
+                 reinterpret_cast<const binder_size_t*>(transaction.data.ptr.offsets),  // NOLINT
+                 transaction.offsets_size / sizeof(binder_size_t),
+                 isSmall ? freeSmallBuffer : kernel::freeBuffer);
+    if ((transaction.flags & TF_STATUS_CODE) == 0) return STATUS_OK;
+    int32_t status = STATUS_UNKNOWN_ERROR;
+    reply->read(&status);
+    reply->reset();
+    return status;
 }
 
 namespace kernel {

@@ -37,8 +37,10 @@ class ThreadState {
     // Queues a command and its payload, zero bytes of none.
     template <typename... Payload>
     void queue(uint32_t command, const Payload&... payload) {
-        append(&command, sizeof command);
-        (append(&payload, sizeof payload), ...);
+        uint8_t* to = append(sizeof command + (sizeof payload + ... + 0));
+        std::memcpy(to, &command, sizeof command);
+        to += sizeof command;
+        ((std::memcpy(to, &payload, sizeof payload), to += sizeof payload), ...);
     }
 
     // Sends what is queued.
@@ -46,6 +48,9 @@ class ThreadState {
 
     // As above, unless this thread is about to talk to the driver anyway.
     void flushUnlessServing();
+
+    // Whether anything is queued.
+    bool hasQueued() const { return mQueued != 0; }
 
     // Serves until the driver is gone. `isMain`: the thread joined of its own accord, else the
     // driver asked for it.
@@ -63,7 +68,12 @@ class ThreadState {
     // What ends a wait: our transaction was taken, or its reply is there.
     enum class Until { kSent, kReplied };
 
-    void append(const void* bytes, size_t length);
+    // Room for so many bytes at the queue's end, which the caller fills.
+    uint8_t* append(size_t length) {
+        if (mQueue.size() - mQueued < length) mQueue.resize(2 * (mQueued + length));
+        mQueued += length;
+        return mQueue.data() + mQueued - length;
+    }
     // The next value received. The driver never splits a command; a missing rest reads as zero.
     template <typename T>
     T receive() {
@@ -99,7 +109,8 @@ class ThreadState {
     // Drops the references the driver gave back; only between read buffers, because user code runs.
     void dropReleased();
 
-    std::vector<uint8_t> mQueue;
+    std::vector<uint8_t> mQueue = std::vector<uint8_t>(256);
+    size_t mQueued = 0;  // bytes of it that are in use
 
     // The platform's size. The driver needs no more than 80 bytes for a command of its own.
     alignas(8) uint8_t mIn[256];
