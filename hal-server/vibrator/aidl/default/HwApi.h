@@ -93,7 +93,7 @@ class HwApi : public std::enable_shared_from_this<HwApi> {
     // Closes the streams; writes nothing to the driver.
     virtual ~HwApi();
 
-    // Whether the audio stream switch was opened and its last use did not fail.
+    // Whether the audio stream switch was opened.
     virtual bool hasAspEnable();
     // Reads the switch from its start ("0" or "1") into `out`; false when that fails.
     virtual bool getAspEnable(bool* out);

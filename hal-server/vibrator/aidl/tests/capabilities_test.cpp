@@ -275,12 +275,17 @@ TEST_F(DynamicIntensityNode, DeviceClassStandsIn) {
 }
 
 TEST_F(DynamicIntensityNode, HalfAPairOnEachSideIsNone) {
-    kernel.addNode(kInfo + "intensities", "1\n", Access::kReadOnly);
-    kernel.addNode(kLeds + "haptic_intensities", "1\n", Access::kReadOnly);
-    const auto hwApi = makeHwApi();
-    EXPECT_FALSE(hwApi->isDynamicIntensityNodeExist());
-    EXPECT_EQ(log.lines().back(),
-              "I HW_API: [isDynamicIntensityNodeExist]dynamic intensity node Not exist");
+    for (const auto& [shared, own] : {std::pair("intensities", "haptic_intensities"),
+                                      std::pair("haptic_intensities", "intensities")}) {
+        kernel.addNode(kInfo + shared, "1\n", Access::kReadOnly);
+        kernel.addNode(kLeds + own, "1\n", Access::kReadOnly);
+        const auto hwApi = makeHwApi();
+        EXPECT_FALSE(hwApi->isDynamicIntensityNodeExist());
+        EXPECT_EQ(log.lines().back(),
+                  "I HW_API: [isDynamicIntensityNodeExist]dynamic intensity node Not exist");
+        kernel.removeNode(kInfo + shared);
+        kernel.removeNode(kLeds + own);
+    }
 }
 
 }  // namespace

@@ -120,6 +120,16 @@ TEST_F(Dump, OfTheExtensionIsTheSame) {
 
 using DumpOnForceFeedback = ForceFeedbackPhone;
 
+TEST_F(DumpOnForceFeedback, TellsThePatternNumbersAndExternalControl) {
+    kernel.addNode(kControl + "use_kyp_index");
+    kernel.addNode(kInfo + "functions", "CAPABILITY_EXTERNAL_CONTROL\n", fake::Access::kReadOnly);
+    EXPECT_THAT(dump(*ndk::SharedRefBase::make<Vibrator>(makeHwApi()), 0).second,
+                HasSubstr("platform's pattern numbers: yes\n"
+                          "capabilities: amplitude-control external-control "
+                          "external-amplitude-control\n"
+                          "features: CAPABILITY_EXTERNAL_CONTROL\n"));
+}
+
 TEST_F(DumpOnForceFeedback, TellsTheUploadedEffect) {
     const auto hwApi = makeHwApi();
     const auto vibrator = ndk::SharedRefBase::make<Vibrator>(hwApi);

@@ -2,6 +2,8 @@
 //
 // The one effect of the process on the force-feedback device: what is sent, to the byte, what is
 // logged, and what is left after a failure.
+#include <unistd.h>
+
 #include <cerrno>
 #include <cstring>
 #include <memory>
@@ -75,6 +77,18 @@ TEST_F(ForceFeedback, LaterUploadErasesTheEffectBeforeAndKeepsTheDeviceOpen) {
     EXPECT_THAT(log.lines(),
                 ElementsAre("I HW_API: [uploadForceFeedbackeffect]ioctl success ,uploaded effect "
                             "with ID: 0"));
+}
+
+TEST_F(ForceFeedback, DescriptorZeroIsAsGoodAsAnother) {
+    const int kept = dup(STDIN_FILENO);
+    close(STDIN_FILENO);
+    EXPECT_TRUE(hwApi->uploadForceFeedbackeffect());
+    EXPECT_EQ(inputFD, 0);
+    EXPECT_TRUE(hwApi->setForceFeedbackAmplitude(5000));
+    EXPECT_THAT(kernel.calls(), Contains("open /dev/input/event7 O_RDWR").Times(1));
+    closeMotor();
+    if (kept >= 0) dup2(kept, STDIN_FILENO);
+    close(kept);
 }
 
 TEST_F(ForceFeedback, FailedOpenIsLoggedAndTriedAgainByTheNextCall) {

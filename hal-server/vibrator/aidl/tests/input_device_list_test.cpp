@@ -200,6 +200,10 @@ TEST_P(ParseField, GivesACopyOfTheValueAndCutsTheLine) {
     EXPECT_STREQ(line.data(), GetParam().lineAfterwards.c_str());
 }
 
+TEST_F(ServiceTest, NoLineHasNoField) {
+    EXPECT_EQ(makeHwApi()->parse_field(nullptr, 'H'), nullptr);
+}
+
 INSTANTIATE_TEST_SUITE_P(Lines, ParseField, ValuesIn(kFieldCases),
                          [](const auto& tested) { return tested.param.name; });
 

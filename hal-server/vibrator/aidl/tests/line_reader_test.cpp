@@ -86,5 +86,16 @@ TEST_F(LineReaderTest, FailedReadEndsTheFileAndLosesThePartialLine) {
     EXPECT_THAT(linesOf("one\ntwo\nthree\n"), ElementsAre("one\n"));
 }
 
+TEST_F(LineReaderTest, FailedReadIsNotTriedAgain) {
+    kernel.addNode(kFile, "one\n");
+    kernel.addFault({.path = kFile, .operation = Operation::kRead, .error = EIO});
+    LineReader reader(kFile);
+    char line[LineReader::kLineSize];
+    EXPECT_FALSE(reader.next(line));
+    EXPECT_FALSE(reader.next(line));
+    EXPECT_THAT(kernel.calls(), ElementsAre("open /sys/class/test/list O_RDONLY",
+                                            "read /sys/class/test/list 1024 = EIO"));
+}
+
 }  // namespace
 }  // namespace aidl::android::hardware::vibrator

@@ -52,12 +52,14 @@ TEST_F(NodeStreams, AreOpenedWithoutCreatingOrTruncatingAndClosedAtTheEnd) {
 TEST_F(NodeStreams, EachAccessorWritesItsOwnNode) {
     const auto hwApi = makeHwApi();
     EXPECT_TRUE(hwApi->setAspEnable(true));
+    EXPECT_TRUE(hwApi->setAspEnable(false));
     EXPECT_TRUE(hwApi->setGpioFallIndex(1));
     EXPECT_TRUE(hwApi->setGpioFallScale(20));
     EXPECT_TRUE(hwApi->setGpioRiseIndex(300));
     EXPECT_TRUE(hwApi->setGpioRiseScale(4294967295U));
     EXPECT_THAT(kernel.calls(),
                 ElementsAre("write /sys/class/timed_output/vibrator/asp_enable \"1\\n\"",
+                            "write /sys/class/timed_output/vibrator/asp_enable \"0\\n\"",
                             "write /sys/class/timed_output/vibrator/gpio1_fall_index \"1\\n\"",
                             "write /sys/class/timed_output/vibrator/gpio1_fall_dig_scale \"20\\n\"",
                             "write /sys/class/timed_output/vibrator/gpio1_rise_index \"300\\n\"",

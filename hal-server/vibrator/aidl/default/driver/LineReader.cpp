@@ -36,7 +36,7 @@ bool LineReader::next(char (&line)[kLineSize]) {
 
 bool LineReader::fill() {
     const ssize_t count = kernel::read(mDescriptor.get(), mAhead, sizeof(mAhead));
-    mFailed = mFailed || count < 0;
+    mFailed = count < 0;
     mPosition = 0;
     mCount = count > 0 ? static_cast<size_t>(count) : 0;
     return mCount > 0;

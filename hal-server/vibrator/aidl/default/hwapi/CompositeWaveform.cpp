@@ -30,11 +30,9 @@ __attribute__((format(printf, 1, 2))) int refuse(const char* format, ...) {
     char line[80];
     va_list arguments;
     va_start(arguments, format);
-    const int length = vsnprintf(line, sizeof(line), format, arguments);
+    vsnprintf(line, sizeof(line), format, arguments);
     va_end(arguments);
-    if (length > 0) {
-        kernel::write(STDOUT_FILENO, line, std::min(static_cast<size_t>(length), sizeof(line) - 1));
-    }
+    kernel::write(STDOUT_FILENO, line, strlen(line));
     return -EINVAL;
 }
 
@@ -96,9 +94,9 @@ wt_type10_comp_section* currentSection(wt_type10_comp* comp) {
                                                          : nullptr;
 }
 
-// Moves to the next section, cleared, and returns it as currentSection() does.
+// Moves from a section to the next, cleared, and returns it as currentSection() does.
 wt_type10_comp_section* nextSection(wt_type10_comp* comp) {
-    if (comp->nsections < WT_TYPE10_COMP_SECTIONS_MAX) ++comp->nsections;
+    ++comp->nsections;
     wt_type10_comp_section* section = currentSection(comp);
     if (section != nullptr) *section = {};
     return section;
@@ -222,7 +220,7 @@ class WordWriter {
 }  // namespace
 
 int HwApi::wt_type10_comp_waveform_get(char* token, wt_type10_comp_wvfrm* out) {
-    unsigned long numbers[3] = {0, 0, 0};  // index, amplitude, duration
+    unsigned long numbers[3] = {};  // index, amplitude, duration
     int count = 0;
     for (const char* at = token; count < 3;) {
         const Number number = readNumber(at);

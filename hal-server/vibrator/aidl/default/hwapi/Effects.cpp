@@ -78,24 +78,16 @@ bool doubleClick(HwApi& hardware, int amplitude) {
     return amplitudeSet;
 }
 
-bool playHapticEngine(HwApi& hardware, const EffectRow& row, int amplitude) {
-    switch (row.hapticEngine.action) {
-        case Action::kPulse:
-            return pulse(hardware, amplitude);
-        case Action::kDoubleClick:
-            return doubleClick(hardware, amplitude);
-        case Action::kPacket:
-            // The amplitude counts twice: here, and as the scale of the whole request.
-            return hardware.performHapticEngine(
-                    {{kPulseMs, amplitude, row.hapticEngine.frequency, row.hapticEngine.overdrive}},
-                    amplitude);
-    }
-    return false;
+bool playTimed(HwApi& hardware, Action action, int amplitude) {
+    return action == Action::kDoubleClick ? doubleClick(hardware, amplitude)
+                                          : pulse(hardware, amplitude);
 }
 
-bool playAmplitude(HwApi& hardware, const EffectRow& row, int amplitude) {
-    return row.amplitude.action == Action::kDoubleClick ? doubleClick(hardware, amplitude)
-                                                        : pulse(hardware, amplitude);
+bool playHapticEngine(HwApi& hardware, const EffectRow& row, int amplitude) {
+    const auto& [durationMs, action, frequency, overdrive] = row.hapticEngine;
+    if (action != Action::kPacket) return playTimed(hardware, action, amplitude);
+    // The amplitude counts twice: here, and as the scale of the whole request.
+    return hardware.performHapticEngine({{kPulseMs, amplitude, frequency, overdrive}}, amplitude);
 }
 
 }  // namespace
@@ -144,11 +136,9 @@ bool HwApi::preparePerform(Effect effect, int amplitude, int& durationMs) {
                 durationMs = row->hapticEngine.durationMs;
                 accepted = playHapticEngine(*this, *row, amplitude);
                 break;
-            case PERFORM_AMPLITUDE:
+            default:  // PERFORM_AMPLITUDE
                 durationMs = row->amplitude.durationMs;
-                accepted = playAmplitude(*this, *row, amplitude);
-                break;
-            default:
+                accepted = playTimed(*this, row->amplitude.action, amplitude);
                 break;
         }
     }

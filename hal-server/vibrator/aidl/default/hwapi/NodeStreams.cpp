@@ -78,8 +78,8 @@ bool HwApi::writeNumber(uint32_t value, std::ostream* stream) {
 }
 
 bool HwApi::hasAspEnable() {
-    // Clearing a failed access must not make a node appear that was never opened.
-    return mAspEnable.is_open() && !mAspEnable.fail();
+    // Not by the stream's state, which every access clears: a node that was never opened stays missing.
+    return mAspEnable.is_open();
 }
 
 bool HwApi::getAspEnable(bool* out) {
