@@ -18,7 +18,7 @@ def run(*words):
 
 class Help(unittest.TestCase):
     def test_begins_with_the_usage_and_starts_nothing(self):
-        for command in ("demo", "check", "bench/run", "fuzz/run"):
+        for command in ("demo", "check", "bench/run", "fuzz/run", "tests/mutation/run"):
             for option in ("--help", "-h"):
                 with self.subTest(command=command, option=option):
                     status, output, errors = run(command, option)
@@ -44,6 +44,13 @@ class WrongUsage(unittest.TestCase):
                 (["fuzz/run", "--all", "0"], "fuzz/run: '0' is no number above 0; it takes a "
                                              "fuzzer (...) and a number of "
                                              "executions, or --all MINUTES"),
+                (["tests/mutation/run", "--mutants", "0"],
+                 "tests/mutation/run: argument --mutants: '0' is no number above 0; it takes files "
+                 "below hal-server/vibrator/aidl/default and --mutants N, --jobs N, --help"),
+                (["tests/mutation/run", "README.md"],
+                 "tests/mutation/run: argument FILE: 'README.md' is no source of the service; it "
+                 "takes files below hal-server/vibrator/aidl/default and --mutants N, --jobs N, "
+                 "--help"),
                 (["scripts/install-packages", "-y"],
                  "install-packages: wrong arguments '-y'; it takes none or --all")):
             with self.subTest(words=words):
