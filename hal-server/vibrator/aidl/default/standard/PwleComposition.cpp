@@ -64,8 +64,7 @@ class SequenceBuilder {
         constructBrakingSegment(mText, mSegment++, 0, braking.braking);
         constructBrakingSegment(mText, mSegment++, braking.duration, braking.braking);
         mTotalMs += braking.duration;
-        mAmplitude = kNowhere;
-        mFrequency = kNowhere;
+        mAmplitude = kNowhere;  // which alone gives the next ramp its lead-in
     }
 
     PwleSequence finish() const { return {mText.str(), mTotalMs}; }
