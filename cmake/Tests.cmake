@@ -8,15 +8,16 @@
 #       few. Label "unit".
 #
 #   qvx_add_guest_test(NAME SOURCES ... LIBRARIES ... [PROFILE profile] [TIMEOUT seconds]
-#                      [FROM_OUTSIDE] [KERNEL_TESTS filter])
+#                      [COUNTED] [FROM_OUTSIDE] [KERNEL_TESTS filter])
 #       A GoogleTest program that runs as root inside the virtual handset, one boot for the whole
 #       program, which ends with a check that the kernel log holds no complaint about binder. The
 #       default profile is "off": the tests bring phones up themselves. The guest is of the build's
 #       own architecture. Label "guest". A build without the handset, or one that QVX_GUEST_TESTS
-#       keeps from running the program, leaves it out of "all". FROM_OUTSIDE: the program looks at
-#       the service through binder and the journal alone, so a build that takes another one's handset
-#       takes the program from there too. KERNEL_TESTS: those of its tests that run a second time, on
-#       the kernel module's nodes, as NAME.kernel_driver.
+#       keeps from running the program, leaves it out of "all". COUNTED: the guest's clock counts
+#       instructions. FROM_OUTSIDE: the program looks at the service through binder and the journal
+#       alone, so a build that takes another one's handset takes the program from there too.
+#       KERNEL_TESTS: those of its tests that run a second time, on the kernel module's nodes, as
+#       NAME.kernel_driver.
 #
 #   qvx_add_python_test(SUITE FILE [LABEL labels] [TIMEOUT seconds] [ENVIRONMENT NAME=VALUE ...])
 #       The unittest file FILE.py of the directory as the test SUITE.FILE. The default label is
@@ -81,7 +82,8 @@ function(qvx_add_unit_test name)
 endfunction()
 
 function(qvx_add_guest_test name)
-    cmake_parse_arguments(PARSE_ARGV 1 arg "FROM_OUTSIDE" "KERNEL_TESTS;PROFILE;TIMEOUT" "SOURCES;LIBRARIES")
+    cmake_parse_arguments(PARSE_ARGV 1 arg "COUNTED;FROM_OUTSIDE" "KERNEL_TESTS;PROFILE;TIMEOUT"
+                          "SOURCES;LIBRARIES")
     if(NOT arg_PROFILE)
         set(arg_PROFILE off)
     endif()
@@ -108,6 +110,9 @@ function(qvx_add_guest_test name)
     set(service $<TARGET_FILE:android.hardware.vibrator-service.quorvan>)
     set(run ${CMAKE_SOURCE_DIR}/handset/run --build ${QVX_HANDSET_BUILD} --arch ${guest_architecture}
             --profile ${arg_PROFILE} --timeout ${timeout})
+    if(arg_COUNTED)
+        list(APPEND run --counted)
+    endif()
     set(tests ${QVX_TEST_PREFIX}${name})
     add_test(NAME ${QVX_TEST_PREFIX}${name}
              COMMAND ${run} -- env PHONE_SERVICE=${service} ${program})

@@ -4,7 +4,6 @@
 // binder, its six streams and the motor's input device.
 #include <chrono>
 #include <filesystem>
-#include <fstream>
 #include <string>
 #include <thread>
 #include <vector>
@@ -14,6 +13,7 @@
 
 #include "handset/common/raw_binder.h"
 #include "tests/support/phone_control.h"
+#include "tests/support/process_view.h"
 
 namespace qvx::test {
 namespace {
@@ -24,39 +24,19 @@ using handset::RequestBytes;
 using testing::ElementsAre;
 using testing::UnorderedElementsAre;
 
-std::vector<std::string> entriesOf(const Phone& phone, const std::string& directory) {
-    std::vector<std::string> entries;
-    const std::string path = "/proc/" + std::to_string(phone.servicePid()) + "/" + directory;
-    for (const auto& entry : std::filesystem::directory_iterator(path)) {
-        entries.push_back(entry.path().filename());
-    }
-    return entries;
-}
-
 // What the descriptors beyond the three standard ones refer to.
 std::vector<std::string> openFiles(const Phone& phone) {
     const std::string directory = "/proc/" + std::to_string(phone.servicePid()) + "/fd/";
     std::vector<std::string> files;
-    for (const std::string& number : entriesOf(phone, "fd")) {
+    for (const std::string& number : entriesOf(phone.servicePid(), "fd")) {
         if (std::stoi(number) <= 2) continue;
         files.push_back(std::filesystem::read_symlink(directory + number));
     }
     return files;
 }
 
-// The service's memory that is its own, in KiB.
-int privateMemory(const Phone& phone) {
-    std::ifstream file("/proc/" + std::to_string(phone.servicePid()) + "/smaps_rollup");
-    int sum = 0;
-    for (std::string word; file >> word;) {
-        int size = 0;
-        if (word.starts_with("Private_") && file >> size) sum += size;
-    }
-    return sum;
-}
-
 size_t threadsOf(const Phone& phone) {
-    return entriesOf(phone, "task").size();
+    return entriesOf(phone.servicePid(), "task").size();
 }
 
 TEST(Footprint, OnTheLedClassIsOneThreadBinderAndSixStreams) {
@@ -111,8 +91,8 @@ TEST(Footprint, FallsBackAfterRequestsOfAMegabyte) {
         for (int i = 0; i < count; ++i) request.int32(1).int32(16).int32(0).int32(1).int32(0);
         EXPECT_EQ(client.transact(*service, 12, request.nullBinder()).kind, RawReply::Kind::kData);
     }
-    EXPECT_GT(privateMemory(phone), 0);
-    EXPECT_LT(privateMemory(phone), 3 * 1024);
+    EXPECT_GT(privateMemory(phone.servicePid()), 0);
+    EXPECT_LT(privateMemory(phone.servicePid()), 3 * 1024);
 }
 
 }  // namespace

@@ -2,13 +2,11 @@
 //
 // A driver that fails: what the client is told, what was written before, and that the service loses
 // no descriptor over it.
-#include <filesystem>
-#include <iterator>
-
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
 #include "tests/support/phone_control.h"
+#include "tests/support/process_view.h"
 
 namespace qvx::test {
 namespace {
@@ -22,11 +20,6 @@ constexpr int kIllegalState = -5;
 constexpr const char* kState = "/sys/class/leds/vibrator/state";
 constexpr const char* kDuration = "/sys/class/leds/vibrator/duration";
 constexpr const char* kActivate = "/sys/class/leds/vibrator/activate";
-
-size_t openDescriptors(int pid) {
-    return static_cast<size_t>(std::distance(
-            std::filesystem::directory_iterator("/proc/" + std::to_string(pid) + "/fd"), {}));
-}
 
 TEST(NodeFault, InterruptedOpenAndWriteAreRepeated) {
     const Phone phone("leds");
@@ -69,12 +62,12 @@ TEST(NodeFault, RefusedOpenWritesNothing) {
 TEST(NodeFault, NoDescriptorIsLostOverTwentyFailures) {
     const Phone phone("leds");
     phone.call({"std", "on", "500"});
-    const size_t before = openDescriptors(phone.servicePid());
+    const size_t before = entriesOf(phone.servicePid(), "fd").size();
     phone.fault({{"node", kDuration}, {"op", "write"}, {"errno", "EIO"}});
     for (int i = 0; i < 20; ++i) {
         EXPECT_EQ(phone.call({"std", "on", "500"})["exception"], kIllegalState);
     }
-    EXPECT_EQ(openDescriptors(phone.servicePid()), before);
+    EXPECT_EQ(entriesOf(phone.servicePid(), "fd").size(), before);
 }
 
 }  // namespace
