@@ -14,6 +14,7 @@
 #include <fmt/format.h>
 
 #include "handset/driver/error_names.h"
+#include "handset/driver/printable.h"
 
 namespace handset {
 namespace {
@@ -288,9 +289,7 @@ void addKeys(std::string_view name, const std::vector<Field<Object>>& table,
     for (const Field<Object>& field : table) keys.push_back({name, field.key, &field.accepted});
 }
 
-}  // namespace
-
-Result<Profile> parseProfile(std::string_view text) {
+Result<Profile> readDocument(std::string_view text) {
     Result<Json> document = parseJson(text);
     if (!document) return document.error();
     std::vector<std::string_view> keys;
@@ -303,6 +302,27 @@ Result<Profile> parseProfile(std::string_view text) {
         if (auto done = part.read(*value, profile); !done) return done.error();
     }
     return profile;
+}
+
+Result<Fault> readOneFault(std::string_view text, const Profile& profile) {
+    Result<Json> document = parseJson(text);
+    if (!document) return document.error();
+    Fault fault;
+    if (auto done = readFault(*document, "fault", profile, fault); !done) return done.error();
+    return fault;
+}
+
+// What is quoted from the JSON may hold anything, and a message is one line.
+template <typename T>
+Result<T> withPrintableError(Result<T> result) {
+    if (result) return result;
+    return Error() << printable(result.error().message());
+}
+
+}  // namespace
+
+Result<Profile> parseProfile(std::string_view text) {
+    return withPrintableError(readDocument(text));
 }
 
 Result<Profile> readProfile(const std::string& path) {
@@ -318,11 +338,7 @@ Result<Profile> readProfile(const std::string& path) {
 }
 
 Result<Fault> parseFault(std::string_view text, const Profile& profile) {
-    Result<Json> document = parseJson(text);
-    if (!document) return document.error();
-    Fault fault;
-    if (auto done = readFault(*document, "fault", profile, fault); !done) return done.error();
-    return fault;
+    return withPrintableError(readOneFault(text, profile));
 }
 
 std::vector<KnownKey> knownKeys() {

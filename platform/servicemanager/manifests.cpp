@@ -73,7 +73,7 @@ Fault readFqname(const XMLElement& element, Entry entry, std::vector<Entry>& ent
     const size_t slash = text.find('/');
     if (slash == 0 || slash == std::string::npos || slash + 1 == text.size() ||
         text.find_first_of("@:.") < slash) {
-        return atLine(element, fmt::format("fqname \"{}\" is not of the form IFoo/instance", text));
+        return atLine(element, fmt::format("fqname {:?} is not of the form IFoo/instance", text));
     }
     entry.interface = text.substr(0, slash);
     entry.instance = text.substr(slash + 1);
@@ -126,10 +126,10 @@ Fault readFile(const fs::path& file, const char* type, std::vector<Entry>& entri
     }
     const std::string version = attributeOf(*manifest, "version");
     if (!isReadableVersion(version)) {
-        return atLine(*manifest, fmt::format("version \"{}\" is not 1.0 to 4.0", version));
+        return atLine(*manifest, fmt::format("version {:?} is not 1.0 to 4.0", version));
     }
     if (attributeOf(*manifest, "type") != type) {
-        return atLine(*manifest, fmt::format("type \"{}\" where \"{}\" is expected",
+        return atLine(*manifest, fmt::format("type {:?} where {:?} is expected",
                                              attributeOf(*manifest, "type"), type));
     }
     std::vector<Entry> found;

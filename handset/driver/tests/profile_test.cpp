@@ -101,7 +101,7 @@ TEST(Profile, BadJsonNamesLineAndColumn) {
     EXPECT_EQ(refusal("{\n  nodes\n}"), "line 2, column 3: no valid JSON at \"nodes\"");
     EXPECT_EQ(refusal("{\"nodes\": nul}"), "line 1, column 11: no valid JSON at \"nul}\"");
     EXPECT_EQ(refusal("{\"description\": \"\xff\"}"),
-              "line 1, column 18: no valid JSON at \"\xff\"}\"");
+              "line 1, column 18: no valid JSON at \"?\"}\"");
     EXPECT_EQ(refusal("{} x"), "line 1, column 4: no valid JSON at \"x\"");
 }
 
@@ -143,6 +143,11 @@ TEST(Profile, WrongKindsAreNamed) {
     EXPECT_EQ(refusal(R"({"input_devices": {}})"),
               "input_devices: a string or null expected, not an object");
     EXPECT_EQ(refusal(R"({"faults": {}})"), "faults: an array expected, not an object");
+}
+
+TEST(Profile, WhatIsQuotedStaysOnTheLine) {
+    EXPECT_EQ(refusal(R"({"nodes": {"/sys/class/a\nb": 3}})"),
+              R"(nodes["/sys/class/a?b"]: an object expected, not a whole number)");
 }
 
 TEST(Profile, ModesAreThree) {

@@ -170,6 +170,10 @@ TEST_P(FaultyManifest, IsReportedInOneLineAndPassedOver) {
 
 constexpr Fault kFaults[] = {
         {"Empty", "", "XML_ERROR_EMPTY_DOCUMENT"},
+        {"NewlineInAQuotedText",
+         "<manifest version=\"1.0\" type=\"device\"><hal format=\"aidl\"><name>p</name>"
+         "<fqname>I\nFoo</fqname></hal></manifest>",
+         "line 1: fqname \"I\\nFoo\" is not of the form IFoo/instance"},
         {"CutOff", "<manifest version=\"1.0\" type=\"device\">\n<hal>\n",
          "line 2: XML_ERROR_PARSING"},
         {"MismatchedTag", "<manifest version=\"1.0\" type=\"device\">\n<hal>\n</lah></manifest>",
