@@ -159,17 +159,44 @@ def read(directory):
     return Run(ops, requests, served, log.callbacks, drive.stretches, start, end)
 
 
+def _check(fields, required, optional):
+    """Raises TypeError or KeyError where a key is missing or its value is of another kind."""
+    for key, kind in {**required, **optional}.items():
+        if (key in required or fields.get(key) is not None) and \
+                (not isinstance(fields[key], kind) or isinstance(fields[key], bool)):
+            raise TypeError(f"{key} is {fields[key]!r}")
+
+
+# The keys of each operation that are made use of, beside those of all.
+_REQUIRED = {"event": {"code": int, "value": int}, "erase": {"id": int}}
+_OPTIONAL = {"write": {"data": str, "hex": str}, "upload": {"custom_hex": str, "length": int}}
+
+
+def _op_of(fields):
+    """The Op of a line's fields. Raises ValueError, KeyError, TypeError."""
+    _check(fields, {"us": int, "op": str},
+           {"node": str, "took": int, "fault": dict, "result": (int, str), "error": (int, str)})
+    kind = fields["op"]
+    _check(fields, _REQUIRED.get(kind, {}), _OPTIONAL.get(kind, {}))
+    for key in ("hex", "custom_hex"):
+        bytes.fromhex(fields.get(key) or "")
+    result = fields.get("result", fields.get("error", 0))
+    op = Op(fields["us"], kind, fields.get("node") or "", result, fields.get("took") or 0,
+            fields.get("fault"), fields)
+    if kind == "write" and fields.get("data") is None and fields.get("hex") is None:
+        raise KeyError("data")
+    return op
+
+
 def parse_op(line):
-    """The Op of one journal line, or None for what is left out. Raises ValueError, KeyError."""
+    """The Op of one journal line, or None for what is left out. Raises ValueError, KeyError,
+    TypeError."""
     # Most lines are these; they are passed over unparsed. A fault or an error makes them count.
     if ('"op":"close"' in line or '"op":"open"' in line or '"op":"read"' in line) and \
             '"fault"' not in line and '"took"' not in line and '"error":"' not in line and \
             '"result":"' not in line and '"node":"motor"' not in line:
         return None
-    fields = json.loads(line)
-    result = fields.get("result", fields.get("error", 0))
-    op = Op(fields["us"], fields["op"], fields.get("node", ""), result, fields.get("took", 0),
-            fields.get("fault"), fields)
+    op = _op_of(json.loads(line))
     plain = op.op in ("open", "close", "read") and op.fault is None and not op.failed
     if plain and op.took < HANG_US and (op.node, op.op) != ("motor", "close"):
         return None
@@ -194,18 +221,21 @@ def _calls(path):
     if not os.path.isfile(path):
         return []
     found = []
-    with open(path, encoding="utf-8") as lines:
+    with open(path, encoding="utf-8", errors="replace") as lines:
         for number, line in enumerate(lines, 1):
             try:
                 found.append(parse_call(json.loads(line)))
-            except (ValueError, KeyError, TypeError) as error:
+            except (ValueError, KeyError, TypeError, OverflowError) as error:
                 raise Unreadable(f"{path}:{number}: no call: {error}") from None
     return sorted(found, key=lambda request: request.start)
 
 
 def parse_call(fields):
-    """The Request of one line of calls.jsonl."""
+    """The Request of one line of calls.jsonl. Raises ValueError, KeyError, TypeError and, for times
+    without end, OverflowError."""
+    _check(fields, {"us": int, "call": list, "answer": dict}, {})
     answer = fields["answer"]
+    _check(answer, {}, {"us": int})
     start, waited = fields["us"], answer.get("callback")
     callback = start + int(waited * 1000) if isinstance(waited, (int, float)) else None
     interface, method, *arguments = fields["call"]

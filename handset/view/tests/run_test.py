@@ -66,6 +66,27 @@ class Reading(unittest.TestCase):
         with self.assertRaisesRegex(run.Unreadable, r"journal\.jsonl:2: no journal line: 'us'"):
             self.read()
 
+    def test_names_the_line_whose_values_are_of_another_kind(self):
+        for line, reason in (('{"us":"5","op":"plug"}', "us is '5'"),
+                             ('{"us":5,"op":"write","node":"n"}', "'data'"),
+                             ('{"us":5,"op":"upload","custom_hex":"0"}', "non-hexadecimal"),
+                             ('{"us":5,"op":"event","code":"a","value":1}', "code is 'a'"),
+                             ('[]', "list indices")):
+            with self.subTest(line=line):
+                self.directory.text("journal.jsonl", line + "\n")
+                with self.assertRaisesRegex(run.Unreadable, "journal.jsonl:1: no journal line: .*"
+                                            + reason):
+                    self.read()
+
+    def test_names_the_call_that_is_none(self):
+        for call in (b'{"us":5,"call":["std","on"],"answer":\x9b}', b'{"us":5}', b'[]',
+                     b'{"us":5,"call":["std"],"answer":{}}', b'{"us":5,"call":"std","answer":{}}',
+                     b'{"us":5,"uid":0,"call":["std","on"],"answer":{"callback":Infinity}}'):
+            with self.subTest(call=call):
+                (self.directory.path / "calls.jsonl").write_bytes(call + b"\n")
+                with self.assertRaisesRegex(run.Unreadable, r"calls\.jsonl:1: no call: "):
+                    self.read()
+
     def test_wants_a_journal(self):
         (self.directory.path / "journal.jsonl").unlink()
         with self.assertRaisesRegex(run.Unreadable, "no journal.jsonl there"):
