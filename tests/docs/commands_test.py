@@ -25,6 +25,8 @@ INSTEAD = {
     "handset/scope": ("handset/scope --help >/dev/null",
                       "runs until it is stopped; view.scope_browser_test opens it"),
     "bench/run": ("bash -n bench/run", "measures for a minute on an idle machine"),
+    "tests/soak/run": ("tests/soak/run --help >/dev/null",
+                       "takes the minutes that it is given; soak_test and attack_test are short"),
     "fuzz/run": ("expect_status 2 fuzz/run no-such-fuzzer", "builds with another compiler"),
 }
 

@@ -18,7 +18,8 @@ def run(*words):
 
 class Help(unittest.TestCase):
     def test_begins_with_the_usage_and_starts_nothing(self):
-        for command in ("demo", "check", "bench/run", "fuzz/run", "tests/mutation/run"):
+        for command in ("demo", "check", "bench/run", "fuzz/run", "tests/mutation/run",
+                        "tests/soak/run"):
             for option in ("--help", "-h"):
                 with self.subTest(command=command, option=option):
                     status, output, errors = run(command, option)
@@ -51,6 +52,11 @@ class WrongUsage(unittest.TestCase):
                  "tests/mutation/run: argument FILE: 'README.md' is no source of the service; it "
                  "takes files below hal-server/vibrator/aidl/default and --mutants N, --jobs N, "
                  "--help"),
+                (["tests/soak/run"], "tests/soak/run: no minutes given; it takes MINUTES, --attack, "
+                                     "--arch amd64 or arm64, --smp N and --service asan"),
+                (["tests/soak/run", "1", "--arch", "mips"],
+                 "tests/soak/run: wrong argument '--arch'; it takes MINUTES, --attack, "
+                 "--arch amd64 or arm64, --smp N and --service asan"),
                 (["scripts/install-packages", "-y"],
                  "install-packages: wrong arguments '-y'; it takes none or --all")):
             with self.subTest(words=words):

@@ -78,7 +78,7 @@ class Counter : public BnVibratorCallback {
     {"getCapabilities", [](Client& c, int) { return get<&IVibrator::getCapabilities, IVibrator, int32_t>(c.standard()); }, {0, 0, 60}, ""}, \
     {"getCompositionDelayMax", [](Client& c, int) { return get<&IVibrator::getCompositionDelayMax, IVibrator, int32_t>(c.standard()); }, {0, 0, 1000}, ""}, \
     {"supportsAmplitudeControl", [](Client& c, int) { return get<&IZelVibrator::supportsAmplitudeControl, IZelVibrator, bool>(c.extension()); }, {0, 0, 1}, "", true}, \
-    {"folder", [](Client& c, int) { return answerOf(c.extension().setFolderStatus(ZelFolderStatus::CLOSED)); }, {}, "write event_cmd FOLDER_CLOSE\n", true}
+    {"posture", [](Client& c, int) { return answerOf(c.extension().setFolderStatus(ZelFolderStatus::CLOSED)); }, {}, "write event_cmd FOLDER_CLOSE\n", true}
 
 constexpr Request kLeds[] = {
     REFUSED_EVERYWHERE,

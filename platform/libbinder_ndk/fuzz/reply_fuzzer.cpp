@@ -24,6 +24,7 @@
 #include <android/binder_manager.h>
 #include <android/binder_parcel.h>
 
+#include "fuzz/input.h"
 #include "platform/libbinder_ndk/src/binder.h"
 #include "platform/libbinder_ndk/src/kernel.h"
 #include "platform/libbinder_ndk/src/parcel.h"
@@ -34,18 +35,8 @@ namespace {
 using aidl::android::os::IServiceManager;
 using aidl::android::os::ServiceDebugInfo;
 using binder_ndk::Parcel;
+using fuzz::Input;
 using ndk::SpAIBinder;
-
-struct Input {
-    const uint8_t* at = nullptr;
-    size_t left = 0;
-
-    uint8_t byte() {
-        if (left == 0) return 0;
-        --left;
-        return *at++;
-    }
-};
 
 struct Buffer {
     std::vector<uint8_t> data;
