@@ -60,7 +60,7 @@ uint32_t holders = 1;
 servicemanager::ServiceManager& manager() {
     static auto* const kManager = [] {
         // One manifest, and no more files than that.
-        static std::string root = "/tmp/manager_fuzzer.XXXXXX";
+        static std::string root = std::filesystem::temp_directory_path() / "manager.XXXXXX";
         require(mkdtemp(root.data()) != nullptr);
         std::atexit([] { std::filesystem::remove_all(root); });
         std::filesystem::create_directories(root + "/vendor/etc/vintf");

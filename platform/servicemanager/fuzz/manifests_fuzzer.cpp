@@ -29,7 +29,7 @@ struct Place {
     ~Place() { std::filesystem::remove_all(root); }
 
     const int file = memfd_create("manifest", MFD_CLOEXEC);
-    std::string root = "/tmp/manifests_fuzzer.XXXXXX";
+    std::string root = std::filesystem::temp_directory_path() / "manifests.XXXXXX";
 };
 
 const Place& place() {
