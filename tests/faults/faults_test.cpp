@@ -19,7 +19,7 @@
 #include <vector>
 
 #include "driver/ForceFeedbackEffect.h"
-#include "tests/faults/requests.h"
+#include "tests/faults/phones.h"
 #include "tests/refused_threads.h"
 
 namespace faults {
@@ -29,6 +29,8 @@ using aidl::android::hardware::vibrator::forceFeedbackEffect;
 using aidl::android::hardware::vibrator::useForceFeedback;
 using fake::Fault;
 using fake::Operation;
+using qvx::test::Answer;
+using qvx::test::Request;
 using Calls = std::vector<std::string>;
 
 // What a driver may answer instead of doing as it is asked.
@@ -196,7 +198,7 @@ class Case {
     }
 
     Answer ask(Phone& phone) const {
-        Answer answer = mRequest.ask(phone);
+        Answer answer = mRequest.ask(phone.services);
         phone.settle();
         return answer;
     }
@@ -253,7 +255,7 @@ class Faults : public testing::TestWithParam<PhoneClass> {};
 
 TEST_P(Faults, OfEveryCallOfEveryRequestAreEnduredAndTheNextRequestIsClean) {
     int points = 0;
-    for (const Request& request : requests()) {
+    for (const Request& request : qvx::test::allRequests()) {
         std::map<std::string, int> answeredOk;
         // The first request of a process opens the motor; the others find it open.
         for (const bool warm : {false, true}) {

@@ -4,24 +4,28 @@
 import importlib.machinery
 import importlib.util
 import pathlib
+import sys
 import unittest
 
 PROJECT = pathlib.Path(__file__).resolve().parent.parent.parent
+sys.path.insert(0, str(PROJECT / "bench"))
+import figures_document  # noqa: E402  (found through the line above)
+
 LOADER = importlib.machinery.SourceFileLoader("compare", str(PROJECT / "bench" / "compare"))
 compare = importlib.util.module_from_spec(importlib.util.spec_from_loader("compare", LOADER))
 LOADER.exec_module(compare)
 
 TABLE = """\
- ratio     median       99 %  call
-  1.00      10000      12000  ping, bare loop
-  1.20      12000      15000  ping, AIBinder_ping
+ratio   median     99 %    floor     trip   driver   logger     ours  request
+ 1.00    10000    12000    10000    10000        0        0        0  legacy std off
+ 0.96    12000    15000    12500    10000     1000     1500     -500  ff std setAmplitude
 """
 
 
 class Compare(unittest.TestCase):
-    def test_reads_the_median_of_each_call(self):
+    def test_reads_the_median_of_each_request(self):
         self.assertEqual(compare.medians(TABLE),
-                         {"ping, bare loop": 10000, "ping, AIBinder_ping": 12000})
+                         {"legacy std off": 10000, "ff std setAmplitude": 12000})
 
     def test_takes_two_percent_more_and_anything_less(self):
         self.assertEqual(compare.costlier({"a": 10000, "b": 5000}, {"a": 10200, "b": 10}), [])
@@ -35,10 +39,12 @@ class Compare(unittest.TestCase):
                          ["b: in one table alone", "c: in one table alone"])
 
     def test_document_shows_the_table_that_is_kept(self):
-        document = compare.DOCUMENT.read_text("utf-8")
+        document = figures_document.DOCUMENT.read_text("utf-8")
         kept = compare.KEPT.read_text("ascii")
         self.assertIn(kept, document)
-        self.assertIn(TABLE, compare.with_table(document, TABLE))
+        self.assertIn(TABLE, figures_document.with_table(document, "bench/compare", TABLE))
+        with self.assertRaises(ValueError):
+            figures_document.with_table(document, "no such table", TABLE)
 
 
 if __name__ == "__main__":

@@ -39,7 +39,7 @@ class WrongUsage(unittest.TestCase):
                 (["check", "-j4"], "check: unknown argument '-j4'; "
                                    "it takes --all, -R, -E and -L with a REGEX, --help"),
                 (["check", "-R"], "check: -R needs a regular expression"),
-                (["bench/run", "-x"], "bench/run: unknown argument '-x'; it takes none but --help"),
+                (["bench/run", "-x"], "bench/run: unknown argument '-x'; accepted: --write, --help"),
                 (["fuzz/run"], "fuzz/run: no fuzzer given; it takes a fuzzer (...) "
                                "and a number of executions, or --all MINUTES"),
                 (["fuzz/run", "--all", "0"], "fuzz/run: '0' is no number above 0; it takes a "

@@ -1,12 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 //
-// Phones, one for each way in which the service plays, and a request for each method of both
-// interfaces.
+// Phones, one for each way in which the service plays, and which calls may go wrong there with the
+// request ok all the same.
 #pragma once
 
 #include <cstddef>
-#include <functional>
-#include <memory>
 #include <string>
 #include <vector>
 
@@ -14,6 +12,7 @@
 #include "Vibrator_vendor.h"
 #include "tests/calling_uid.h"
 #include "tests/service_test.h"
+#include "tests/support/all_requests.h"
 
 namespace faults {
 
@@ -41,28 +40,13 @@ class Phone : public ServiceTest {
     using ServiceTest::kernel;
     using ServiceTest::log;
 
-    std::shared_ptr<aidl::android::hardware::vibrator::Vibrator> standard;
-    std::shared_ptr<aidl::vendor::quorvan::hardware::vibrator::Vibrator> extension;
+    qvx::test::Services services;
 
   private:
     void TestBody() override {}
 
     const CallingUid mSystem{1000};
     const ptrdiff_t mThreads;  // of the process, without those that requests start
-};
-
-struct Answer {
-    binder_exception_t exception;
-    std::string result;  // the out-value; empty where there is none
-
-    bool operator==(const Answer& other) const {
-        return exception == other.exception && result == other.result;
-    }
-};
-
-struct Request {
-    const char* name;
-    std::function<Answer(Phone&)> ask;
 };
 
 // How a call goes wrong: with an errno, with fewer bytes than there are, or with a count that is not
@@ -73,7 +57,5 @@ enum Way : unsigned { kFails = 1, kIsShort = 2, kLies = 4 };
 // not.
 const char* allowedBecause(const char* request, const std::vector<std::string>& calls,
                            size_t position, Way way);
-
-const std::vector<Request>& requests();
 
 }  // namespace faults
