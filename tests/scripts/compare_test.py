@@ -34,6 +34,10 @@ class Compare(unittest.TestCase):
         self.assertEqual(compare.costlier({"a": 10000}, {"a": 10201}),
                          ["a: 10201 instructions, 10000 before"])
 
+    def test_believes_the_lower_of_two_runs(self):
+        self.assertEqual(compare.lower({"a": 10300, "b": 20000, "c": 7}, {"a": 10010, "b": 20900}),
+                         {"a": 10010, "b": 20000, "c": 7})
+
     def test_names_a_call_of_one_table_alone(self):
         self.assertEqual(compare.costlier({"a": 1, "b": 1}, {"a": 1, "c": 1}),
                          ["b: in one table alone", "c: in one table alone"])
