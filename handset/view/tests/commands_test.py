@@ -52,6 +52,18 @@ class Picture(unittest.TestCase):
             drawn.append((directory.path / name).read_bytes())
         self.assertEqual(*drawn)
 
+    def test_of_a_long_run_has_no_more_words_than_find_room(self):
+        directory = Directory(self)
+        for number in range(1000):
+            start = 50 * number
+            directory.call(start, 10, f"std setAmplitude 0.{number % 10}")
+            directory.write(start + 1, "haptic_engine",
+                            f"8 10 10000 2050 0 10 {1000 * (number % 10)} 1700 0\n")
+            directory.write(start + 2, "activate", "1\n")
+        self.assertEqual(command("picture", directory.path).returncode, 0)
+        drawn = (directory.path / "run.svg").read_text("utf-8")
+        self.assertLess(drawn.count("<text"), 250)
+
     def test_of_an_empty_run_is_drawn(self):
         self.assertEqual(command("picture", Directory(self).path).returncode, 0)
 
