@@ -179,9 +179,8 @@ TEST(MotorFault, MotorUnpluggedBeforeItsFirstUseCannotBeOpened) {
     ASSERT_EQ(phone.up().status, 0) << phone.up().out << phone.up().err;
     EXPECT_EQ(phone.call({"std", "on", "500"})["exception"], kIllegalState);
     EXPECT_EQ(phone.call({"std", "on", "500"})["exception"], kIllegalState);
-    EXPECT_THAT(motorRequests(phone),
-                ElementsAre("unplug motor", "open motor O_RDWR = ENODEV",
-                            "open motor O_RDWR = ENODEV"));
+    EXPECT_THAT(motorRequests(phone), ElementsAre("unplug motor", "open motor O_RDWR = ENODEV",
+                                                  "open motor O_RDWR = ENODEV"));
 }
 
 size_t openDescriptors(int pid) {

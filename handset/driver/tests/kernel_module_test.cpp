@@ -43,8 +43,10 @@ TEST(ModuleParameters, RefuseWhatTheModuleCannotBe) {
     EXPECT_EQ(parametersOf(R"({"motor": {"name": "a b"}})"),
               "refused: motor \"a b\": the kernel module takes a name of ASCII characters without "
               "spaces, quotes, commas and colons");
-    EXPECT_EQ(parametersOf(R"({"motor": {}, "faults": [{"node": "motor", "op": "upload", "errno": "EIO"}]})"),
-              "refused: the kernel module takes no faults");
+    EXPECT_EQ(
+            parametersOf(
+                    R"({"motor": {}, "faults": [{"node": "motor", "op": "upload", "errno": "EIO"}]})"),
+            "refused: the kernel module takes no faults");
 }
 
 TEST(ModuleParameters, RefuseATextLongerThanSysfsShows) {
