@@ -20,14 +20,16 @@ set(linux ${CMAKE_SOURCE_DIR}/packaging/linux)
 install(TARGETS vibctl RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR})
 install(TARGETS servicemanager ${service} RUNTIME DESTINATION ${programs})
 install(TARGETS binder_ndk LIBRARY DESTINATION ${libraries})
-# From each program's directory to the libraries', so that an installation may stand anywhere.
+# From each program's directory to the libraries', so that an installation may stand anywhere. The
+# same words serve the build directory, where the library lies in ../lib: room for others would be
+# filled with an empty one, which is the directory that the program is started in.
 file(RELATIVE_PATH from_bin /${CMAKE_INSTALL_BINDIR} /${libraries})
 file(RELATIVE_PATH from_programs /${programs} /${libraries})
-get_filename_component(android ${QVX_log_LIBRARY} DIRECTORY)
-set_target_properties(vibctl PROPERTIES INSTALL_RPATH "$ORIGIN/${from_bin};${android}")
+set_target_properties(vibctl PROPERTIES INSTALL_RPATH "$ORIGIN/${from_bin};$ORIGIN/../lib")
 set_target_properties(servicemanager ${service} PROPERTIES
-    INSTALL_RPATH "$ORIGIN/${from_programs};${android}")
-set_target_properties(binder_ndk PROPERTIES INSTALL_RPATH ${android})
+    INSTALL_RPATH "$ORIGIN/${from_programs};$ORIGIN/../lib")
+set_target_properties(vibctl servicemanager ${service} binder_ndk PROPERTIES
+    BUILD_WITH_INSTALL_RPATH ON)
 
 install(FILES ${CMAKE_SOURCE_DIR}/hal-server/vibrator/aidl/default/${service}.xml
         DESTINATION ${CMAKE_INSTALL_DATADIR}/qvx-vibrator/vendor/etc/vintf/manifest)

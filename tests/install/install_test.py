@@ -4,12 +4,13 @@
 import configparser
 import os
 import pathlib
+import re
 import shutil
 import subprocess
 import tempfile
 import unittest
 
-from installation import FILES, PROJECT, SERVICE, files_below, install, run
+from installation import BUILD, FILES, PROJECT, SERVICE, files_below, install, run
 
 # What a unit needs of the system it is verified in.
 TARGETS = ("basic", "multi-user", "shutdown", "sysinit", "time-set", "time-sync", "timers")
@@ -58,6 +59,15 @@ class Installation(unittest.TestCase):
             needed = run("ldd", program)
             self.assertNotIn("not found", needed)
             self.assertIn(f"=> {programs}/../../lib/", needed)
+
+    def test_no_program_takes_a_library_from_where_it_is_started(self):
+        installed = [self.root / "usr/bin/vibctl", *self.root.glob("usr/libexec/qvx-vibrator/*")]
+        built = [BUILD / "bin" / program.name for program in installed]
+        self.assertEqual(len(built), 3)
+        for program in [*installed, *built, *BUILD.glob("lib/*.so")]:
+            path = re.search(r"R(?:UN)?PATH.*\[(.*)\]", run("readelf", "--dynamic", program)).group(1)
+            for directory in path.split(":"):
+                self.assertRegex(directory, r"^(/|\$ORIGIN/)", f"{program}: {path}")
 
     def test_fragment_is_the_phones(self):
         name = f"{SERVICE}.xml"
