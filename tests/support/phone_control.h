@@ -13,6 +13,10 @@
 
 namespace qvx::test {
 
+// What Phone::call() gives as "exception" for a request that is refused.
+constexpr int kIllegalArgument = -3;
+constexpr int kIllegalState = -5;
+
 // Brings a phone up for the life of the object. The out directory is emptied first.
 class Phone {
   public:

@@ -15,8 +15,6 @@ using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
 
-constexpr int kIllegalArgument = -3;
-constexpr int kIllegalState = -5;
 constexpr int kUnsupportedOperation = -7;
 
 const json kLedsWithAmplitude = {

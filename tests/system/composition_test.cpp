@@ -26,9 +26,6 @@ using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
 
-constexpr int kIllegalArgument = -3;
-constexpr int kIllegalState = -5;
-
 // The guest is emulated: a client may be told so much later than on the minute.
 constexpr double kLateMs = 60;
 

@@ -28,7 +28,6 @@ using testing::HasSubstr;
 using testing::IsEmpty;
 using testing::ValuesIn;
 
-constexpr int kIllegalState = -5;
 constexpr int kUnsupportedOperation = -7;
 
 // What the driver saw that drives its motor, in words: "LEAF DATA" of a write, and of a

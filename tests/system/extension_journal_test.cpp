@@ -14,8 +14,6 @@ using nlohmann::json;
 using testing::ElementsAre;
 using testing::HasSubstr;
 
-constexpr int kIllegalState = -5;
-
 struct Call {
     const char* words;
     int exception;

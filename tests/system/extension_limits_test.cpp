@@ -21,7 +21,6 @@ using nlohmann::json;
 using testing::ElementsAre;
 using testing::IsEmpty;
 
-constexpr int kIllegalArgument = -3;
 constexpr const char* kMin = "-2147483648";
 constexpr const char* kMax = "2147483647";
 

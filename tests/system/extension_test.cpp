@@ -14,8 +14,6 @@ using nlohmann::json;
 using testing::ElementsAre;
 using testing::HasSubstr;
 
-constexpr int kIllegalState = -5;
-
 const std::string kDirectory = "/sys/class/leds/vibrator/";
 const std::string kInfoDirectory = "/sys/class/vib_info_class/vib_support_info/";
 

@@ -20,8 +20,6 @@ using testing::HasSubstr;
 using testing::IsEmpty;
 using testing::Not;
 
-constexpr int kIllegalState = -5;
-
 // A phone whose motor is /dev/input/event9.
 json profile() {
     json profile = builtInProfile("ff");

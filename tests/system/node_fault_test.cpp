@@ -16,7 +16,6 @@ using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
 
-constexpr int kIllegalState = -5;
 constexpr const char* kState = "/sys/class/leds/vibrator/state";
 constexpr const char* kDuration = "/sys/class/leds/vibrator/duration";
 constexpr const char* kActivate = "/sys/class/leds/vibrator/activate";

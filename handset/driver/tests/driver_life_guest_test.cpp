@@ -18,9 +18,8 @@ using qvx::test::kRoot;
 using qvx::test::Process;
 
 constexpr const char* kCalibration = "/efs/FactoryApp/vibrator_calibration";
-const std::string kDuration = "/sys/class/leds/vibrator/duration";
 
-constexpr const char* kProfile = R"({
+constexpr const char* kOneNode = R"({
     "nodes": {"/sys/class/leds/vibrator/duration": {"mode": "rw", "text": "0\n"}},
     "files": {"/efs/FactoryApp/vibrator_calibration": "137\n", "/efs/other": "x",
               "/etc/hostname": "phone\n"},
@@ -28,7 +27,7 @@ constexpr const char* kProfile = R"({
 
 TEST(DriverLife, FilesAreSeenInsideOnly) {
     const std::string hostname = readNode("/etc/hostname");
-    const RunningDriver driver(kProfile);
+    const RunningDriver driver(kOneNode);
     ASSERT_TRUE(driver.isReady()) << driver.errors();
     EXPECT_EQ(driver.inside(1000, [] { return readNode(kCalibration); }), "137\n");
     EXPECT_EQ(driver.inside(1000, [] { return readNode("/efs/other"); }), "x");
@@ -42,7 +41,7 @@ TEST(DriverLife, FilesAreSeenInsideOnly) {
 }
 
 TEST(DriverLife, ATerminatedDriverLeavesNothingBehind) {
-    RunningDriver driver(kProfile);
+    RunningDriver driver(kOneNode);
     ASSERT_TRUE(driver.isReady()) << driver.errors();
     EXPECT_EQ(access("/efs", F_OK), 0);
     EXPECT_EQ(driver.end(SIGTERM), 0);
@@ -52,14 +51,14 @@ TEST(DriverLife, ATerminatedDriverLeavesNothingBehind) {
 }
 
 TEST(DriverLife, AnInterruptedDriverLeavesNothingBehind) {
-    RunningDriver driver(kProfile);
+    RunningDriver driver(kOneNode);
     ASSERT_TRUE(driver.isReady()) << driver.errors();
     EXPECT_EQ(driver.end(SIGINT), 0);
     EXPECT_NE(access("/efs", F_OK), 0);
 }
 
 TEST(DriverLife, StoppingIsARequestToo) {
-    RunningDriver driver(kProfile);
+    RunningDriver driver(kOneNode);
     ASSERT_TRUE(driver.isReady()) << driver.errors();
     EXPECT_EQ(driver.ask("stop"), "ok ");
     EXPECT_EQ(driver.end(0), 0);
@@ -82,7 +81,7 @@ TEST(DriverLife, TheParentsDeathEndsIt) {
     int ends[2];
     ASSERT_EQ(pipe2(ends, O_CLOEXEC), 0);
     Process parent(kRoot, [&] {
-        const RunningDriver driver(kProfile);
+        const RunningDriver driver(kOneNode);
         if (write(ends[1], driver.directory().data(), driver.directory().size()) < 0) _exit(1);
         pause();
     });
@@ -98,7 +97,7 @@ TEST(DriverLife, TheParentsDeathEndsIt) {
 }
 
 TEST(DriverLife, AKilledDriverFailsItsClients) {
-    RunningDriver driver(kProfile);
+    RunningDriver driver(kOneNode);
     ASSERT_TRUE(driver.isReady()) << driver.errors();
     int go[2];
     ASSERT_EQ(pipe2(go, O_CLOEXEC), 0);
@@ -145,7 +144,7 @@ TEST(DriverLife, ANodelessPhoneHasAnEmptyClassDirectory) {
 }
 
 TEST(DriverLife, FaultsAndTextsChangeWhileItRuns) {
-    const RunningDriver driver(kProfile);
+    const RunningDriver driver(kOneNode);
     ASSERT_TRUE(driver.isReady()) << driver.errors();
     EXPECT_EQ(driver.ask("set /sys/class/leds/vibrator/duration \"77\\n\""), "ok ");
     EXPECT_EQ(driver.inside([] { return readNode(kDuration); }), "77\n");
@@ -159,7 +158,7 @@ TEST(DriverLife, FaultsAndTextsChangeWhileItRuns) {
 }
 
 TEST(DriverLife, AResetJournalCountsFromOne) {
-    const RunningDriver driver(kProfile);
+    const RunningDriver driver(kOneNode);
     ASSERT_TRUE(driver.isReady()) << driver.errors();
     driver.inside([] { return openNode(kDuration, O_WRONLY); });
     EXPECT_EQ(driver.ask("reset"), "ok ");

@@ -19,19 +19,20 @@ std::string profileWith(const std::string& fault) {
            "]}";
 }
 
-std::string refusal(const std::string& fault) {
+std::string refusalOfFault(const std::string& fault) {
     const Result<Profile> profile = parseProfile(profileWith(fault));
     return profile ? std::string() : profile.error().message();
 }
 
-Fault accepted(const std::string& fault) {
+Fault acceptedFault(const std::string& fault) {
     const Result<Profile> profile = parseProfile(profileWith(fault));
     EXPECT_TRUE(profile) << profile.error().message();
     return profile ? profile->faults.at(0) : Fault();
 }
 
 TEST(ProfileFaults, AnErrorIsGivenByName) {
-    const Fault fault = accepted(R"({"node": "/sys/class/a/b", "op": "write", "errno": "EIO"})");
+    const Fault fault =
+            acceptedFault(R"({"node": "/sys/class/a/b", "op": "write", "errno": "EIO"})");
     EXPECT_EQ(fault.node, "/sys/class/a/b");
     EXPECT_EQ(fault.op, FaultOp::kWrite);
     EXPECT_EQ(fault.action.error, EIO);
@@ -41,12 +42,13 @@ TEST(ProfileFaults, AnErrorIsGivenByName) {
 }
 
 TEST(ProfileFaults, AShortCountMayBeNothing) {
-    EXPECT_EQ(accepted(R"({"node": "/sys/class/a/b", "op": "read", "short": 0})").action.shortCount,
+    EXPECT_EQ(acceptedFault(R"({"node": "/sys/class/a/b", "op": "read", "short": 0})")
+                      .action.shortCount,
               0U);
 }
 
 TEST(ProfileFaults, ADelayMayComeBeforeAnError) {
-    const Fault fault = accepted(
+    const Fault fault = acceptedFault(
             R"({"node": "motor", "op": "erase", "delay": 250, "errno": "EIO", "after": 1})");
     EXPECT_EQ(fault.action.delay.count(), 250);
     EXPECT_EQ(fault.action.error, EIO);
@@ -54,13 +56,14 @@ TEST(ProfileFaults, ADelayMayComeBeforeAnError) {
 }
 
 TEST(ProfileFaults, AnUnplugStandsAlone) {
-    EXPECT_TRUE(accepted(R"({"node": "motor", "op": "upload", "unplug": true})").action.unplug);
+    EXPECT_TRUE(
+            acceptedFault(R"({"node": "motor", "op": "upload", "unplug": true})").action.unplug);
 }
 
 TEST(ProfileFaults, TheNodeExists) {
-    EXPECT_EQ(refusal(R"({"op": "write", "errno": "EIO"})"),
+    EXPECT_EQ(refusalOfFault(R"({"op": "write", "errno": "EIO"})"),
               "faults[0].node: missing; accepted: a node's path, or motor");
-    EXPECT_EQ(refusal(R"({"node": "/sys/class/a", "op": "write", "errno": "EIO"})"),
+    EXPECT_EQ(refusalOfFault(R"({"node": "/sys/class/a", "op": "write", "errno": "EIO"})"),
               "faults[0].node: the profile has no node \"/sys/class/a\"");
     EXPECT_EQ(parseProfile(R"({"faults": [{"node": "motor", "op": "open", "errno": "EIO"}]})")
                       .error()
@@ -69,61 +72,64 @@ TEST(ProfileFaults, TheNodeExists) {
 }
 
 TEST(ProfileFaults, TheCallSuitsTheNode) {
-    EXPECT_EQ(refusal(R"({"node": "/sys/class/a/b", "errno": "EIO"})"),
+    EXPECT_EQ(refusalOfFault(R"({"node": "/sys/class/a/b", "errno": "EIO"})"),
               "faults[0].op: missing; accepted: open, read, write, upload, erase");
-    EXPECT_EQ(refusal(R"({"node": "/sys/class/a/b", "op": "upload", "errno": "EIO"})"),
+    EXPECT_EQ(refusalOfFault(R"({"node": "/sys/class/a/b", "op": "upload", "errno": "EIO"})"),
               "faults[0].op: \"upload\" unknown; accepted: open, read, write");
-    EXPECT_EQ(refusal(R"({"node": "motor", "op": "read", "errno": "EIO"})"),
+    EXPECT_EQ(refusalOfFault(R"({"node": "motor", "op": "read", "errno": "EIO"})"),
               "faults[0].op: \"read\" unknown; accepted: open, write, upload, erase");
 }
 
 TEST(ProfileFaults, ErrorsAreNames) {
-    EXPECT_EQ(refusal(R"({"node": "/sys/class/a/b", "op": "write", "errno": "EFOO"})"),
+    EXPECT_EQ(refusalOfFault(R"({"node": "/sys/class/a/b", "op": "write", "errno": "EFOO"})"),
               "faults[0].errno: \"EFOO\" unknown; accepted: an error's name, such as EIO, EINTR, "
               "EACCES");
-    EXPECT_EQ(refusal(R"({"node": "/sys/class/a/b", "op": "write", "errno": 5})"),
+    EXPECT_EQ(refusalOfFault(R"({"node": "/sys/class/a/b", "op": "write", "errno": 5})"),
               "faults[0].errno: a string expected, not a whole number");
 }
 
 TEST(ProfileFaults, OnlyATransferCanBeShort) {
-    EXPECT_EQ(refusal(R"({"node": "/sys/class/a/b", "op": "open", "short": 1})"),
+    EXPECT_EQ(refusalOfFault(R"({"node": "/sys/class/a/b", "op": "open", "short": 1})"),
               "faults[0].short: only a read or write can be short");
-    EXPECT_EQ(refusal(R"({"node": "/sys/class/a/b", "op": "write", "short": 1, "errno": "EIO"})"),
+    EXPECT_EQ(refusalOfFault(
+                      R"({"node": "/sys/class/a/b", "op": "write", "short": 1, "errno": "EIO"})"),
               "faults[0]: errno and short exclude each other");
-    EXPECT_EQ(refusal(R"({"node": "/sys/class/a/b", "op": "write", "short": -1})"),
+    EXPECT_EQ(refusalOfFault(R"({"node": "/sys/class/a/b", "op": "write", "short": -1})"),
               "faults[0].short: a whole number of bytes from 0 to 2147483647 expected, not -1");
 }
 
 TEST(ProfileFaults, DelaysAreBounded) {
-    EXPECT_EQ(refusal(R"({"node": "/sys/class/a/b", "op": "write", "delay": 600001})"),
+    EXPECT_EQ(refusalOfFault(R"({"node": "/sys/class/a/b", "op": "write", "delay": 600001})"),
               "faults[0].delay: a whole number of milliseconds from 0 to 600000 expected, not "
               "600001");
 }
 
 TEST(ProfileFaults, SomethingGoesWrong) {
-    EXPECT_EQ(refusal(R"({"node": "/sys/class/a/b", "op": "write"})"),
+    EXPECT_EQ(refusalOfFault(R"({"node": "/sys/class/a/b", "op": "write"})"),
               "faults[0]: nothing goes wrong; give one of errno, short, delay, unplug, text, hex");
-    EXPECT_EQ(refusal(R"({"node": "/sys/class/a/b", "op": "write", "unplug": false})"),
+    EXPECT_EQ(refusalOfFault(R"({"node": "/sys/class/a/b", "op": "write", "unplug": false})"),
               "faults[0]: nothing goes wrong; give one of errno, short, delay, unplug, text, hex");
 }
 
 TEST(ProfileFaults, CountsAreWholeNumbers) {
-    EXPECT_EQ(refusal(R"({"node": "/sys/class/a/b", "op": "write", "errno": "EIO", "times": -1})"),
+    EXPECT_EQ(refusalOfFault(
+                      R"({"node": "/sys/class/a/b", "op": "write", "errno": "EIO", "times": -1})"),
               "faults[0].times: a whole number of calls from 0 to 4294967295 expected, not -1");
     EXPECT_EQ(
-            refusal(R"({"node": "/sys/class/a/b", "op": "write", "errno": "EIO", "after": "1"})"),
+            refusalOfFault(
+                    R"({"node": "/sys/class/a/b", "op": "write", "errno": "EIO", "after": "1"})"),
             "faults[0].after: a whole number of calls from 0 to 4294967295 expected, not a string");
 }
 
 TEST(ProfileFaults, UnknownKeysAreRefused) {
-    EXPECT_EQ(refusal(R"({"node": "/sys/class/a/b", "op": "write", "error": "EIO"})"),
+    EXPECT_EQ(refusalOfFault(R"({"node": "/sys/class/a/b", "op": "write", "error": "EIO"})"),
               "faults[0]: unknown key \"error\"; accepted: node, op, errno, short, delay, unplug, "
               "text, hex, after, times, every");
-    EXPECT_EQ(refusal(R"("EIO")"), "faults[0]: an object expected, not a string");
+    EXPECT_EQ(refusalOfFault(R"("EIO")"), "faults[0]: an object expected, not a string");
 }
 
 TEST(ProfileFaults, TheMistakenOneIsCounted) {
-    EXPECT_EQ(refusal(R"({"node": "/sys/class/a/b", "op": "write", "errno": "EIO"},
+    EXPECT_EQ(refusalOfFault(R"({"node": "/sys/class/a/b", "op": "write", "errno": "EIO"},
                          {"node": "/sys/class/a/b", "op": "write", "errno": "EFOO"})"),
               "faults[1].errno: \"EFOO\" unknown; accepted: an error's name, such as EIO, EINTR, "
               "EACCES");
@@ -145,14 +151,16 @@ TEST(ProfileFaults, AFaultAddedLaterIsHeldAgainstTheProfile) {
 
 TEST(ProfileFaults, AReadMayShowOtherContents) {
     const Fault fault =
-            accepted(R"({"node": "/sys/class/a/b", "op": "read", "hex": "ff0a", "every": 3})");
+            acceptedFault(R"({"node": "/sys/class/a/b", "op": "read", "hex": "ff0a", "every": 3})");
     EXPECT_EQ(fault.action.text, "\xff\n");
     EXPECT_EQ(fault.every, 3U);
-    EXPECT_EQ(refusal(R"({"node": "/sys/class/a/b", "op": "write", "text": "1"})"),
+    EXPECT_EQ(refusalOfFault(R"({"node": "/sys/class/a/b", "op": "write", "text": "1"})"),
               "faults[0]: only a read can show other contents");
-    EXPECT_EQ(refusal(R"({"node": "/sys/class/a/b", "op": "read", "text": "1", "errno": "EIO"})"),
+    EXPECT_EQ(refusalOfFault(
+                      R"({"node": "/sys/class/a/b", "op": "read", "text": "1", "errno": "EIO"})"),
               "faults[0]: errno and other contents exclude each other");
-    EXPECT_EQ(refusal(R"({"node": "/sys/class/a/b", "op": "read", "errno": "EIO", "every": 0})"),
+    EXPECT_EQ(refusalOfFault(
+                      R"({"node": "/sys/class/a/b", "op": "read", "errno": "EIO", "every": 0})"),
               "faults[0].every: a whole number of calls from 1 to 4294967295 expected, not 0");
 }
 

@@ -13,6 +13,10 @@
 
 namespace handset {
 
+// Two nodes that many a test's profile has.
+inline const std::string kDuration = "/sys/class/leds/vibrator/duration";
+inline const std::string kWaves = "/sys/class/leds/vibrator/num_waves";
+
 class RunningDriver {
   public:
     // Starts the driver with a profile's text and waits until it is ready or has ended.

@@ -21,9 +21,6 @@ namespace {
 
 using Lines = std::vector<std::string>;
 
-const std::string kDuration = "/sys/class/leds/vibrator/duration";
-const std::string kWaves = "/sys/class/leds/vibrator/num_waves";
-
 std::string profileWith(const std::string& faults) {
     return R"({"nodes": {
         "/sys/class/leds/vibrator/duration": {"mode": "rw", "text": "0\n"},

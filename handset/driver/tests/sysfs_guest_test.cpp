@@ -22,9 +22,7 @@ namespace {
 using Lines = std::vector<std::string>;
 
 const std::string kDirectory = "/sys/class/leds/vibrator/";
-const std::string kDuration = kDirectory + "duration";
 const std::string kKind = kDirectory + "motor_type";
-const std::string kWaves = kDirectory + "num_waves";
 const std::string kTrigger = kDirectory + "trigger";
 
 constexpr const char* kProfile = R"({"nodes": {

@@ -118,8 +118,8 @@ const Agreement kQuestions[] = {
 	{"ThereIsNothingToRead", kSystem, nothingToRead, "EAGAIN EINVAL 1 4 "},
 };
 
-INSTANTIATE_TEST_SUITE_P(Motor, MotorAgreement, testing::ValuesIn(kQuestions),
-			 nameOf<Agreement>);
+INSTANTIATE_TEST_SUITE_P(MotorQuestions, MotorAgreement,
+			 testing::ValuesIn(kQuestions), nameOf<Agreement>);
 
 } // namespace
 } // namespace handset

@@ -94,7 +94,7 @@ class Painter : public BnPainter {
     }
 };
 
-class Listener : public BnListener {
+class QuietListener : public BnListener {
     ScopedAStatus onDone(int32_t /*result*/) override { return ScopedAStatus::ok(); }
 };
 
@@ -242,7 +242,7 @@ TEST_F(Stub, ForgedObjectIsABadType) {
 }
 
 TEST_F(Stub, CallbackOfThisProcessIsTheObjectItself) {
-    const auto listener = ndk::SharedRefBase::make<Listener>();
+    const auto listener = ndk::SharedRefBase::make<QuietListener>();
     ndk::ScopedAParcel in;
     ndk::ScopedAParcel out;
     ASSERT_EQ(AIBinder_prepareTransaction(binder.get(), in.getR()), STATUS_OK);
@@ -261,7 +261,7 @@ TEST_F(Stub, CallbackOfAnotherInterfaceReachesTheServiceAsNull) {
 }
 
 TEST_F(Stub, TokenOfAnotherInterfaceIsABadType) {
-    const auto listener = ndk::SharedRefBase::make<Listener>();
+    const auto listener = ndk::SharedRefBase::make<QuietListener>();
     const ndk::SpAIBinder other = listener->asBinder();
     ndk::ScopedAParcel foreign;
     ndk::ScopedAParcel in;

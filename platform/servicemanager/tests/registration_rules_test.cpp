@@ -11,7 +11,7 @@
 namespace servicemanager {
 namespace {
 
-constexpr const char* kVibrator = "android.hardware.vibrator.IVibrator/default";
+constexpr const char* kVibratorInstance = "android.hardware.vibrator.IVibrator/default";
 
 class RulesTest : public ::testing::Test {
   protected:
@@ -34,16 +34,16 @@ class RulesTest : public ::testing::Test {
 
 TEST_F(RulesTest, WithoutARuleRootAloneRegisters) {
     const RegistrationRules rules;
-    EXPECT_TRUE(rules.mayRegister(0, kVibrator));
-    EXPECT_FALSE(rules.mayRegister(1000, kVibrator));
+    EXPECT_TRUE(rules.mayRegister(0, kVibratorInstance));
+    EXPECT_FALSE(rules.mayRegister(1000, kVibratorInstance));
 }
 
 TEST_F(RulesTest, ARuleIsForOneUserAndOneName) {
     const auto rules = load("android.hardware.vibrator.IVibrator/default 1000\n");
     ASSERT_TRUE(rules.ok());
-    EXPECT_TRUE(rules->mayRegister(1000, kVibrator));
-    EXPECT_TRUE(rules->mayRegister(0, kVibrator));
-    EXPECT_FALSE(rules->mayRegister(1001, kVibrator));
+    EXPECT_TRUE(rules->mayRegister(1000, kVibratorInstance));
+    EXPECT_TRUE(rules->mayRegister(0, kVibratorInstance));
+    EXPECT_FALSE(rules->mayRegister(1001, kVibratorInstance));
     EXPECT_FALSE(rules->mayRegister(1000, "android.hardware.vibrator.IVibrator/defaul"));
     EXPECT_FALSE(rules->mayRegister(1000, "android.hardware.vibrator.IVibrator/default2"));
 }

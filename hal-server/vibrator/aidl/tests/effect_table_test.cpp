@@ -22,7 +22,7 @@ using ::testing::ValuesIn;
 
 constexpr int kOutOfRange[] = {0, 10001, 2147483647, -1, -2147483647 - 1};
 
-constexpr char kDoubleClickEnd[] =
+constexpr char kDoubleClickIsOver[] =
         "I HW_API: End perform on another thread - performEffect_DOUBLE_CLICK";
 
 struct Phone {
@@ -139,7 +139,7 @@ class EffectCell : public ServiceTest, public ::testing::WithParamInterface<Cell
         const bool played = hwApi->preparePerform(GetParam().effect, amplitude, durationMs);
         EXPECT_EQ(durationMs, GetParam().durationMs);
         if (GetParam().way == Way::kDoubleClick) {
-            EXPECT_TRUE(log.waitFor(kDoubleClickEnd));
+            EXPECT_TRUE(log.waitFor(kDoubleClickIsOver));
         }
         return played;
     }

@@ -220,7 +220,7 @@ TEST_F(FeatureQueries, EnhancedPatternWithoutAListAndAMotorTypeIsTheHapticEngine
     EXPECT_FALSE(ask(*extension, &Vibrator::supportsEnhancedQuorvanHapticPattern, false));
 }
 
-class NumberedMotor : public core::HwApi {
+class CountingMotor : public core::HwApi {
   public:
     int getMotorIndex() override { return index; }
 
@@ -228,7 +228,7 @@ class NumberedMotor : public core::HwApi {
 };
 
 TEST_F(FeatureQueries, EnhancedHybridPatternWithoutAListIsMotor11Alone) {
-    const auto motor = std::make_shared<NumberedMotor>();
+    const auto motor = std::make_shared<CountingMotor>();
     const auto extension = makeExtension(motor);
     for (motor->index = -1; motor->index <= 14; ++motor->index) {
         const bool expected = motor->index == 11;

@@ -13,7 +13,7 @@ using fake::Operation;
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 
-constexpr char kNode[] = "/sys/class/leds/vibrator/node";
+constexpr char kPresentNode[] = "/sys/class/leds/vibrator/node";
 
 class NodeExists : public ServiceTest {
   protected:
@@ -21,13 +21,13 @@ class NodeExists : public ServiceTest {
 };
 
 TEST_F(NodeExists, ReadWriteNodeExistsForEveryAccess) {
-    kernel.addNode(kNode);
-    EXPECT_TRUE(hwApi->isNodeExist(kNode));
+    kernel.addNode(kPresentNode);
+    EXPECT_TRUE(hwApi->isNodeExist(kPresentNode));
     EXPECT_THAT(log.lines(),
                 ElementsAre("I HW_API: isNodeExist node:/leds/vibrator/node", "I HW_API: true"));
     log.clear();
-    EXPECT_TRUE(hwApi->isNodeExistForRead(kNode));
-    EXPECT_TRUE(hwApi->isNodeExistForWrite(kNode));
+    EXPECT_TRUE(hwApi->isNodeExistForRead(kPresentNode));
+    EXPECT_TRUE(hwApi->isNodeExistForWrite(kPresentNode));
     EXPECT_THAT(log.lines(), IsEmpty());
     EXPECT_THAT(kernel.calls(), ElementsAre("open /sys/class/leds/vibrator/node O_RDWR",
                                             "close /sys/class/leds/vibrator/node",
@@ -38,10 +38,10 @@ TEST_F(NodeExists, ReadWriteNodeExistsForEveryAccess) {
 }
 
 TEST_F(NodeExists, ReadOnlyNodeExistsForReadingOnly) {
-    kernel.addNode(kNode, "1\n", Access::kReadOnly);
-    EXPECT_FALSE(hwApi->isNodeExist(kNode));
-    EXPECT_TRUE(hwApi->isNodeExistForRead(kNode));
-    EXPECT_FALSE(hwApi->isNodeExistForWrite(kNode));
+    kernel.addNode(kPresentNode, "1\n", Access::kReadOnly);
+    EXPECT_FALSE(hwApi->isNodeExist(kPresentNode));
+    EXPECT_TRUE(hwApi->isNodeExistForRead(kPresentNode));
+    EXPECT_FALSE(hwApi->isNodeExistForWrite(kPresentNode));
     EXPECT_THAT(log.lines(),
                 ElementsAre("I HW_API: isNodeExist node:/leds/vibrator/node", "I HW_API: false",
                             "I HW_API: isNodeExistForWrite node:/sys/class/leds/vibrator/node - "
@@ -49,10 +49,10 @@ TEST_F(NodeExists, ReadOnlyNodeExistsForReadingOnly) {
 }
 
 TEST_F(NodeExists, WriteOnlyNodeExistsForWritingOnly) {
-    kernel.addNode(kNode, "", Access::kWriteOnly);
-    EXPECT_FALSE(hwApi->isNodeExist(kNode));
-    EXPECT_FALSE(hwApi->isNodeExistForRead(kNode));
-    EXPECT_TRUE(hwApi->isNodeExistForWrite(kNode));
+    kernel.addNode(kPresentNode, "", Access::kWriteOnly);
+    EXPECT_FALSE(hwApi->isNodeExist(kPresentNode));
+    EXPECT_FALSE(hwApi->isNodeExistForRead(kPresentNode));
+    EXPECT_TRUE(hwApi->isNodeExistForWrite(kPresentNode));
     EXPECT_THAT(log.lines(),
                 ElementsAre("I HW_API: isNodeExist node:/leds/vibrator/node", "I HW_API: false",
                             "I HW_API: isNodeExistForRead node:/sys/class/leds/vibrator/node - "
@@ -60,13 +60,16 @@ TEST_F(NodeExists, WriteOnlyNodeExistsForWritingOnly) {
 }
 
 TEST_F(NodeExists, InterruptedOpensAreRepeated) {
-    kernel.addNode(kNode);
-    kernel.addFault({.path = kNode, .operation = Operation::kOpen, .error = EINTR, .times = 2});
-    EXPECT_TRUE(hwApi->isNodeExist(kNode));
-    kernel.addFault({.path = kNode, .operation = Operation::kOpen, .error = EINTR, .times = 2});
-    EXPECT_TRUE(hwApi->isNodeExistForRead(kNode));
-    kernel.addFault({.path = kNode, .operation = Operation::kOpen, .error = EINTR, .times = 2});
-    EXPECT_TRUE(hwApi->isNodeExistForWrite(kNode));
+    kernel.addNode(kPresentNode);
+    kernel.addFault(
+            {.path = kPresentNode, .operation = Operation::kOpen, .error = EINTR, .times = 2});
+    EXPECT_TRUE(hwApi->isNodeExist(kPresentNode));
+    kernel.addFault(
+            {.path = kPresentNode, .operation = Operation::kOpen, .error = EINTR, .times = 2});
+    EXPECT_TRUE(hwApi->isNodeExistForRead(kPresentNode));
+    kernel.addFault(
+            {.path = kPresentNode, .operation = Operation::kOpen, .error = EINTR, .times = 2});
+    EXPECT_TRUE(hwApi->isNodeExistForWrite(kPresentNode));
 }
 
 TEST_F(NodeExists, EachOperationAsksForItsNodeAndAccess) {
