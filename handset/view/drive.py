@@ -7,6 +7,7 @@ written. A force-feedback effect plays what was uploaded with it, each time it i
 """
 
 import dataclasses
+import math
 
 import waveform
 
@@ -16,6 +17,7 @@ _CONTROL = "/sys/class/qvx_vib_inputff/control/"
 FF_GAIN = 0x60   # FF_GAIN of linux/input-event-codes.h
 _FF_EVENT = 0x15
 _UNGAINED = ("packets", "queue")  # these carry levels of their own
+_ROUNDS = 1000  # of a program at once are laid out one by one
 
 
 @dataclasses.dataclass
@@ -28,6 +30,43 @@ class Stretch:
     kind: str    # "timed", "pattern", "packets", "queue", "composite"
     label: str
     known: bool  # whether the end is more than a guess
+
+    def gained(self, gain):
+        """The same at another gain."""
+        if self.kind in _UNGAINED:
+            return self
+        return dataclasses.replace(self, level=round(self.own * gain, 6))
+
+    def parts(self, step=0):  # pylint: disable=unused-argument  (Rounds' has a use for it)
+        """Itself."""
+        yield self
+
+
+@dataclasses.dataclass
+class Rounds(Stretch):
+    """What a program plays over and over, too often to be laid out. As a stretch, it is as strong as
+    its strongest part."""
+    first: tuple  # the stretches of the round that began it all
+    length: float
+
+    def gained(self, gain):
+        first = tuple(one.gained(gain) for one in self.first)
+        return dataclasses.replace(self, level=max(one.level for one in first), first=first)
+
+    def parts(self, step=0):
+        """The stretches in order, without those that end less than `step` microseconds after the
+        one before."""
+        at, count = self.start, -1
+        while True:
+            count = max(count + 1, math.floor((at - self.first[0].start) / self.length))
+            for one in self.first:
+                start = max(self.start, one.start + count * self.length)
+                end = min(self.end, one.end + count * self.length)
+                if start >= self.end:
+                    return
+                if end >= at and end > start:
+                    yield dataclasses.replace(one, start=start, end=end)
+                    at = end + step
 
 
 class Drive:
@@ -59,8 +98,9 @@ class Drive:
 
     def finish(self, us):
         """What has no end goes on until `us`. May be called again, later."""
-        while self._loop and self._loop[1] < us:
-            self._run(*self._loop)
+        if self._loop and self._loop[1] < us:
+            program, start = self._loop
+            self._run(program, start, math.ceil((us - start) / _length(program)))
 
     # --- sysfs -----------------------------------------------------------------------------------
 
@@ -131,21 +171,39 @@ class Drive:
 
     def _play(self, us, program):
         self._stop(us)
-        if program.forever and any(piece.ms > 0 for piece in program.pieces):
+        if program.times < math.inf:
+            self._run(program, us, program.times)
+            return
+        if _length(program) > 0:
             self._loop = (program, us)
-        self._run(program, us)
+        self._run(program, us, 1)
 
-    def _run(self, program, us):
-        """Lays a program out once, from `us` on."""
-        gain = 1.0 if program.kind in _UNGAINED else self._gain
+    def _run(self, program, us, rounds):
+        """Lays a program out, from `us` on, so many times."""
+        first, length = self._round(program, us), _length(program)
+        if first and rounds > _ROUNDS:
+            loudest = max(first, key=lambda one: one.level)
+            self._append(Rounds(
+                first[0].start, first[-1].end + (rounds - 1) * length, loudest.level, loudest.own,
+                loudest.kind, f"{loudest.label}, {rounds} times", loudest.known, first, length))
+        elif first:
+            for past in range(rounds):
+                for one in first:
+                    self._append(dataclasses.replace(one, start=one.start + past * length,
+                                                     end=one.end + past * length))
+        if self._loop:
+            self._loop = (program, us + rounds * length)
+
+    def _round(self, program, us):
+        """The stretches of a program that is played once, from `us` on."""
+        found = []
         for piece in program.pieces:
             end = us + piece.ms * 1000
             if piece.level > 0 and end > us:
-                self._append(Stretch(us, end, round(piece.level * gain, 6), piece.level,
-                                     program.kind, piece.label, piece.known))
+                found.append(Stretch(us, end, piece.level, piece.level, program.kind, piece.label,
+                                     piece.known).gained(self._gain))
             us = end
-        if self._loop:
-            self._loop = (program, us)
+        return tuple(found)
 
     def _append(self, stretch):
         self._note_change(len(self.stretches))
@@ -176,10 +234,13 @@ class Drive:
         gain = max(0.0, min(1.0, value / waveform.FULL))
         self.finish(us)
         for stretch in self._cut(us):
-            if stretch.kind not in _UNGAINED:
-                stretch.level = round(stretch.own * gain, 6)
-            self._append(stretch)
+            self._append(stretch.gained(gain))
         self._gain = gain
+
+
+def _length(program):
+    """Of one round, in microseconds."""
+    return sum(piece.ms for piece in program.pieces) * 1000
 
 
 def _timed(milliseconds):

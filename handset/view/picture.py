@@ -238,7 +238,8 @@ class _Sheet:
     def _drive(self):
         top = self._lane_name("", _DRIVE + 30) + 22
         bottom = top + _DRIVE
-        stretches = [one for one in self._run.stretches if one.start < self._run.end]
+        stretches = [part for one in self._run.stretches if one.start < self._run.end
+                     for part in one.parts(1 / self._axis.scale)]
 
         def level(axes):
             axes.text(_LEFT - 8, top - 14, "drive", ha="right", va="center", color=_INK)

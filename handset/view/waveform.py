@@ -6,6 +6,7 @@ grammars; what is drawn of a stored pattern is only what is known of it from out
 """
 
 import dataclasses
+import math
 import re
 
 FULL = 10000         # the driver's scale for intensities and the gain
@@ -32,10 +33,10 @@ class Piece:
 
 @dataclasses.dataclass(frozen=True)
 class Program:
-    """Pieces in order; `forever` starts again after the last one."""
+    """Pieces in order, all of them so many times; math.inf is until they are stopped."""
     kind: str
     pieces: tuple
-    forever: bool = False
+    times: float = 1
 
 
 def stored(index, level, primitives=False, platform_numbers=False):
@@ -77,10 +78,10 @@ def queue(text):
     the others' are percent."""
     tokens = [token for token in re.split(r"[,\s\0]+", text) if token]
     of = FULL if tokens[-1:] == ["0"] else 100
-    pieces, forever, times = [], False, 1
+    pieces, times = [], 1
     for token in tokens:
         if token.endswith("~"):
-            forever = True
+            times = math.inf
         elif token.endswith("!"):
             times = int(token[:-1])
         elif "." in token:
@@ -88,7 +89,7 @@ def queue(text):
             pieces.append(stored(int(index), int(level) / of, primitives=of == FULL))
         elif int(token) > 0:
             pieces.append(Piece(0, int(token)))
-    return Program("queue", tuple(pieces) * times, forever)
+    return Program("queue", tuple(pieces), times)
 
 
 def composite(data, platform_numbers=False):
@@ -123,8 +124,7 @@ def composite(data, platform_numbers=False):
             start = start if loop is None else loop
             pieces[start:] = pieces[start:] * repeat
             loop = None
-    times = data[3] if 0 < data[3] < FOREVER else 1
-    return Program("composite", tuple(pieces) * times, data[3] == FOREVER)
+    return Program("composite", tuple(pieces), math.inf if data[3] == FOREVER else data[3] or 1)
 
 
 def _share(intensity):

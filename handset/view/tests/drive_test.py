@@ -1,6 +1,8 @@
 # SPDX-License-Identifier: Apache-2.0
 """The drive of small runs: times and levels, reckoned by hand."""
 
+import dataclasses
+import time
 import unittest
 
 import view_path  # noqa: F401
@@ -110,6 +112,53 @@ class ForceFeedback(unittest.TestCase):
         self.run.upload(100, "ENOSPC", "00000000", length=500)
         self.run.event(110, 0xFFFF, 1)
         self.assertEqual(drive(self.run), [])
+
+
+class Rounds(unittest.TestCase):
+    HOUR = 3_600_000  # ms
+
+    def setUp(self):
+        self.run = Directory(self)
+
+    def drive(self):
+        begun = time.process_time()
+        stretches = run.read(self.run.path).stretches
+        self.assertLess(time.process_time() - begun, 0.3)
+        return stretches
+
+    def parts(self, stretch, ms):
+        """What is played at `ms` and next: (start ms, end ms, level, label)."""
+        parts = dataclasses.replace(stretch, start=ms * 1000).parts()
+        return [(one.start / 1000, one.end / 1000, one.level, one.label)
+                for one in (next(parts), next(parts))]
+
+    def test_of_an_hour_are_not_laid_out_one_by_one(self):
+        # pattern 1 for 1 ms, pattern 41 at half the level for 2 ms, a pause of 2 ms, for ever
+        self.run.upload(100, 0, "000002ff" "00640100" "00080000" "00000004"
+                                "00322900" "00080002" "00000008")
+        self.run.event(200, 0, 1)
+        self.run.event(201.5 + self.HOUR, 96, 5000)
+        self.run.event(200 + 2 * self.HOUR, 0, 0)
+        first, after, hour, cut, gained = self.drive()
+        self.assertEqual([(one.start, one.end) for one in (first, after, hour, cut, gained)], [
+            (200_000, 201_000), (201_000, 203_000), (205_000, 3_600_201_500),
+            (3_600_201_500, 3_600_203_000), (3_600_205_000, 7_200_198_000)])
+        self.assertEqual([(one.level, one.label) for one in cut.parts()], [(0.25, "pattern 41")])
+        self.assertEqual(self.parts(hour, 1_000_000.5), [(1_000_000.5, 1_000_001, 1.0, "pattern 1"),
+                                                         (1_000_001, 1_000_003, 0.5, "pattern 41")])
+        self.assertEqual(self.parts(gained, 7_000_002), [(7_000_002, 7_000_003, 0.25, "pattern 41"),
+                                                         (7_000_005, 7_000_006, 0.5, "pattern 1")])
+        self.assertIn(len(list(hour.parts(self.HOUR))), range(990, 1002))  # one a thousandth
+
+    def test_that_a_client_asked_for_are_not_either(self):
+        self.run.write(100, "cp_trigger_index", "65534\n")
+        self.run.write(101, "cp_trigger_queue", "10.80, 10, 2000000000!\0")
+        self.run.write(110, "activate", "1\n")
+        self.run.write(1_000_115, "activate", "0\n")
+        only, = self.drive()
+        self.assertEqual((only.start, only.end), (110_000, 1_000_115_000))
+        self.assertEqual(self.parts(only, 60_100), [(60_110, 60_160, 0.8, "pattern 10"),
+                                                    (60_170, 60_220, 0.8, "pattern 10")])
 
 
 class Legacy(unittest.TestCase):

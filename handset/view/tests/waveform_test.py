@@ -1,6 +1,7 @@
 # SPDX-License-Identifier: Apache-2.0
 """What the driver is handed to play, taken apart."""
 
+import math
 import unittest
 
 import view_path  # noqa: F401
@@ -13,7 +14,7 @@ class Packets(unittest.TestCase):
         program = waveform.packets("8 7 10000 2050 0 20 3000 1700 1\n")
         self.assertEqual(program.pieces, (Piece(1.0, 7, "packet 2050"),
                                           Piece(0.3, 20, "packet 1700 overdrive")))
-        self.assertFalse(program.forever)
+        self.assertEqual(program.times, 1)
 
     def test_that_are_fewer_than_announced_are_refused(self):
         for text in ("8 7 10000 2050 0\n", "", "3 1 2 3\n"):
@@ -30,24 +31,25 @@ class Queue(unittest.TestCase):
     def test_of_one_pattern_repeats_for_ever(self):
         program = waveform.queue("10.67, 10, 0~\0")
         self.assertEqual(program.pieces, (Piece(0.67, 50, "pattern 10"), Piece(0, 10)))
-        self.assertTrue(program.forever)
+        self.assertEqual(program.times, math.inf)
 
     def test_repeats_as_often_as_it_says(self):
-        self.assertEqual(waveform.queue("5.100,2!\0").pieces,
-                         (Piece(1.0, 50, "pattern 5", known=False),) * 2)
+        program = waveform.queue("5.100,2!\0")
+        self.assertEqual(program.pieces, (Piece(1.0, 50, "pattern 5", known=False),))
+        self.assertEqual(program.times, 2)
 
     def test_of_a_composition_has_levels_of_ten_thousand(self):
         program = waveform.queue("50,1.10000,124.5000,0")
         self.assertEqual(program.pieces, (Piece(0, 50), Piece(1.0, 20, "pattern 1"),
                                           Piece(0.5, 300, "pattern 124")))
-        self.assertFalse(program.forever)
+        self.assertEqual(program.times, 1)
 
 
 class Composite(unittest.TestCase):
     def test_of_one_section_repeats_for_ever(self):
         program = waveform.composite(bytes.fromhex("000001ff" "00640500" "0000000a"))
         self.assertEqual(program.pieces, (Piece(1.0, 50, "pattern 5", known=False), Piece(0, 10)))
-        self.assertTrue(program.forever)
+        self.assertEqual(program.times, math.inf)
 
     def test_with_a_duration_counts_quarter_milliseconds(self):
         program = waveform.composite(bytes.fromhex("00000100" "00320100" "00080000" "00000050"))
@@ -62,7 +64,8 @@ class Composite(unittest.TestCase):
         program = waveform.composite(bytes.fromhex(
             "00000303" "00640100" "00000000" "003229ff" "00000007" "00640102" "00000000"))
         inner = (Piece(0.5, 20, "pattern 41"), Piece(0, 7), Piece(1.0, 20, "pattern 1"))
-        self.assertEqual(program.pieces, ((Piece(1.0, 20, "pattern 1"),) + inner * 2) * 3)
+        self.assertEqual(program.pieces, (Piece(1.0, 20, "pattern 1"),) + inner * 2)
+        self.assertEqual(program.times, 3)
 
     def test_with_a_loop_that_is_one_section_repeats_that(self):
         program = waveform.composite(bytes.fromhex("00000100" "00500302" "00000032"))
