@@ -73,10 +73,10 @@ enum qvx_features : int32_t {
 
 // One step of a haptic-engine sequence. Time, frequency and overdrive are the driver's own units.
 struct HapticEnginePacket {
-    int32_t time = 0;
-    int32_t intensity = 0;  // 0 to 10000, scaled by the request's amplitude before it is sent
-    int32_t frequency = 0;
-    int32_t overdrive = 0;
+    int32_t time;
+    int32_t intensity;  // 0 to 10000, scaled by the request's amplitude before it is sent
+    int32_t frequency;
+    int32_t overdrive;
 };
 
 // Create it with std::make_shared: a double click keeps the object alive until its second pulse.

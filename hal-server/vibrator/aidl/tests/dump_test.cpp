@@ -75,6 +75,13 @@ TEST_F(Dump, TellsOfAPhoneOfTheLedClass) {
               "  /sys/class/leds/vibrator/hybrid_haptic_engine: No such file or directory\n");
 }
 
+TEST_F(Dump, NamesEveryPerformMethod) {
+    kernel.addNode(kLeds + "haptic_engine");
+    EXPECT_THAT(dump(*makeVibrator(), 0).second, HasSubstr("\nperform method: haptic engine\n"));
+    kernel.addNode(kLeds + "cp_trigger_index");
+    EXPECT_THAT(dump(*makeVibrator(), 0).second, HasSubstr("\nperform method: prebaked index\n"));
+}
+
 TEST_F(Dump, LogsAndWritesNothing) {
     const auto vibrator = makeVibrator();
     dump(*vibrator, 0);

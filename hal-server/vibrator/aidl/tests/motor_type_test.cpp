@@ -148,7 +148,7 @@ TEST_F(MotorIndex, FailedReadGivesZeroAndClosesTheNode) {
     EXPECT_EQ(kernel.calls().back(), "close /sys/class/leds/vibrator/motor_type");
 }
 
-TEST_F(MotorIndex, EmptyNodeCountsAsAFailedRead) {
+TEST_F(MotorIndex, EmptyNodeCountsAsAFailedReadAndANewlineDoesNot) {
     kernel.addNode(kMotorType, "");
     const auto hwApi = makeHwApi();
     errno = 0;
@@ -156,6 +156,9 @@ TEST_F(MotorIndex, EmptyNodeCountsAsAFailedRead) {
     EXPECT_EQ(log.lines().back(),
               "I HW_API: getMotorIndex node: /sys/class/leds/vibrator/motor_type "
               "read failed. errno: 0");
+    kernel.addNode(kMotorType, "\n");
+    EXPECT_EQ(hwApi->getMotorIndex(), 0);
+    EXPECT_THAT(log.lines(), Contains("I HW_API: getMotorIndex string len : 0"));
 }
 
 TEST_F(MotorIndex, InterruptedOpenAndReadAreRepeated) {
@@ -251,7 +254,7 @@ TEST_F(EnhancedPattern, FailedReadIsNo) {
               "/sys/class/leds/vibrator/motor_type read failed. errno: 5");
 }
 
-TEST_F(EnhancedPattern, EmptyNodeCountsAsAFailedRead) {
+TEST_F(EnhancedPattern, EmptyNodeCountsAsAFailedReadAndANewlineDoesNot) {
     kernel.addNode(kMotorType, "");
     const auto hwApi = makeHwApi();
     errno = 0;
@@ -259,6 +262,9 @@ TEST_F(EnhancedPattern, EmptyNodeCountsAsAFailedRead) {
     EXPECT_EQ(log.lines().back(),
               "I HW_API: supportsEnhancedQuorvanHapticPattern node: "
               "/sys/class/leds/vibrator/motor_type read failed. errno: 0");
+    kernel.addNode(kMotorType, "\n");
+    EXPECT_FALSE(hwApi->supportsEnhancedQuorvanHapticPattern());
+    EXPECT_EQ(log.line(3), "I HW_API: supportsEnhancedQuorvanHapticPattern string : ");
 }
 
 TEST_F(EnhancedPattern, MoreBytesThanAskedForAreLoggedAsAnError) {

@@ -250,6 +250,17 @@ TEST_F(ReadNodeAsString, EveryKindOfWhiteSpaceIsTrimmedAndInnerOnesKept) {
     EXPECT_EQ(hwApi->readNodeAsString(kNode), "a b");
 }
 
+TEST_F(ReadNodeAsString, EveryOtherCharacterIsKept) {
+    for (const char* const text : {"~a~", "!a!", "\"a\"",
+                                   "\x01"
+                                   "a\x7f",
+                                   "\ba\x0e"}) {
+        kernel.addNode(kNode, text);
+        EXPECT_EQ(hwApi->readNodeAsString(kNode), text);
+        EXPECT_EQ(hwApi->rtrim(text), text);
+    }
+}
+
 TEST_F(ReadNodeAsString, LongNodeGivesItsFirst511Bytes) {
     kernel.addNode(kNode, std::string(600, 'x'));
     EXPECT_EQ(hwApi->readNodeAsString(kNode), std::string(511, 'x'));

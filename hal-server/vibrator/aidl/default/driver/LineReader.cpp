@@ -18,9 +18,9 @@ bool LineReader::next(char (&line)[kLineSize]) {
     size_t length = 0;
     bool complete = false;
     while (!complete && length < kLineSize - 1) {
-        if (mPosition == mCount && (mFailed || !fill())) break;
+        if (mPosition >= mCount && (mCount < 0 || !fill())) break;
         const char* const begin = mAhead + mPosition;
-        const size_t available = std::min(mCount - mPosition, kLineSize - 1 - length);
+        const size_t available = std::min<size_t>(mCount - mPosition, kLineSize - 1 - length);
         const void* const feed = memchr(begin, '\n', available);
         complete = feed != nullptr;
         const size_t taken =
@@ -28,17 +28,15 @@ bool LineReader::next(char (&line)[kLineSize]) {
                          : available;
         memcpy(line + length, begin, taken);
         length += taken;
-        mPosition += taken;
+        mPosition += static_cast<ssize_t>(taken);
     }
     line[length] = '\0';
-    return length > 0 && !mFailed;
+    return length > 0 && mCount >= 0;
 }
 
 bool LineReader::fill() {
-    const ssize_t count = kernel::read(mDescriptor.get(), mAhead, sizeof(mAhead));
-    mFailed = count < 0;
+    mCount = kernel::read(mDescriptor.get(), mAhead, sizeof(mAhead));
     mPosition = 0;
-    mCount = count > 0 ? static_cast<size_t>(count) : 0;
     return mCount > 0;
 }
 

@@ -3,6 +3,8 @@
 // Reads a string file line by line into a fixed buffer, without allocating.
 #pragma once
 
+#include <sys/types.h>
+
 #include <cstddef>
 
 #include <android-base/unique_fd.h>
@@ -34,9 +36,8 @@ class LineReader {
 
     ::android::base::unique_fd mDescriptor;
     char mAhead[1024] = {};
-    size_t mPosition = 0;
-    size_t mCount = 0;
-    bool mFailed = false;
+    ssize_t mPosition = 0;
+    ssize_t mCount = 0;  // negative once a read has failed
 };
 
 }  // namespace aidl::android::hardware::vibrator

@@ -24,9 +24,7 @@ using core::HwApi;
 struct FeatureQuery {
     const char* name;
     core::qvx_features feature;
-    const std::string* node;         // without a list: whether this node exists,
-    bool always;                     // or on force feedback yes, whatever nodes there are,
-    bool (*other)(HwApi& hardware);  // or this
+    bool (*withoutList)(HwApi& hardware, const char* name);
 };
 
 struct LetterQuery {
@@ -37,26 +35,39 @@ struct LetterQuery {
 
 namespace {
 
-// The answer where the driver has no list.
-bool answerWithoutList(HwApi& hardware, const FeatureQuery& query) {
-    if (query.other != nullptr) return query.other(hardware);
-    if (!query.always || !core::useForceFeedback) return hardware.isNodeExist(*query.node);
-    LOG(INFO) << "V_4_0: [" << query.name << "]return true";
+// The answers where the driver has no list.
+
+template <const std::string& Node>
+bool hasNode(HwApi& hardware, const char* /*name*/) {
+    return hardware.isNodeExist(Node);
+}
+
+// On force feedback yes, whatever nodes there are.
+template <const std::string& Node>
+bool hasNodeOrForceFeedback(HwApi& hardware, const char* name) {
+    if (!core::useForceFeedback) return hardware.isNodeExist(Node);
+    LOG(INFO) << "V_4_0: [" << name << "]return true";
     return true;
 }
 
+bool hasEnhancedPattern(HwApi& hardware, const char* /*name*/) {
+    return hardware.supportsEnhancedQuorvanHapticPattern();
+}
+
+bool hasEnhancedHybridPattern(HwApi& hardware, const char* /*name*/) {
+    return hardware.getMotorIndex() == core::MOTOR_LINEAR_WATCH;
+}
+
 // clang-format off
-constexpr FeatureQuery kAmplitudeControl = {"supportsAmplitudeControl", core::INTENSITY, &core::THE_DEVICE_INTENSITY, true, nullptr};
-constexpr FeatureQuery kForceTouchAmplitudeControl = {"supportsForceTouchAmplitudeControl", core::FORCE_TOUCH_INTENSITY, &core::THE_DEVICE_FORCE_TOUCH_INTENSITY, false, nullptr};
-constexpr FeatureQuery kFrequencyControl = {"supportsFrequencyControl", core::MULTI_FREQUENCY, &core::THE_DEVICE_MULTI_FREQ, false, nullptr};
-constexpr FeatureQuery kHapticEngine = {"supportsHapticEngine", core::HAPTIC_ENGINE, &core::THE_DEVICE_HAPTIC_ENGINE, true, nullptr};
-constexpr FeatureQuery kPrebakedHapticPattern = {"supportsPrebakedHapticPattern", core::INDEX_HAPTIC_PATTERN, &core::THE_DEVICE_HAPTIC_ENGINE_INDEX, true, nullptr};
-constexpr FeatureQuery kFifoHapticEngine = {"supportsFifoHapticEngine", core::FIFO_HAPTIC_ENGINE, &core::THE_DEVICE_FIFO_HAPTIC_ENGINE, false, nullptr};
-constexpr FeatureQuery kHybridHapticEngine = {"supportsHybridHapticEngine", core::HYBRID_HAPTIC_ENGINE, &core::THE_DEVICE_HYBRID_HAPTIC_ENGINE, false, nullptr};
-constexpr FeatureQuery kEnhancedHapticPattern = {"supportsEnhancedQuorvanHapticPattern", core::ENHANCED_HAPTIC_ENGINE, nullptr, false,
-    [](HwApi& hardware) { return hardware.supportsEnhancedQuorvanHapticPattern(); }};
-constexpr FeatureQuery kEnhancedHybridHapticPattern = {"supportsEnhancedHybridHapticPattern", core::ENHANCED_HYBRID_HAPTIC_ENGINE, nullptr, false,
-    [](HwApi& hardware) { return hardware.getMotorIndex() == core::MOTOR_LINEAR_WATCH; }};
+constexpr FeatureQuery kAmplitudeControl = {"supportsAmplitudeControl", core::INTENSITY, hasNodeOrForceFeedback<core::THE_DEVICE_INTENSITY>};
+constexpr FeatureQuery kForceTouchAmplitudeControl = {"supportsForceTouchAmplitudeControl", core::FORCE_TOUCH_INTENSITY, hasNode<core::THE_DEVICE_FORCE_TOUCH_INTENSITY>};
+constexpr FeatureQuery kFrequencyControl = {"supportsFrequencyControl", core::MULTI_FREQUENCY, hasNode<core::THE_DEVICE_MULTI_FREQ>};
+constexpr FeatureQuery kHapticEngine = {"supportsHapticEngine", core::HAPTIC_ENGINE, hasNodeOrForceFeedback<core::THE_DEVICE_HAPTIC_ENGINE>};
+constexpr FeatureQuery kPrebakedHapticPattern = {"supportsPrebakedHapticPattern", core::INDEX_HAPTIC_PATTERN, hasNodeOrForceFeedback<core::THE_DEVICE_HAPTIC_ENGINE_INDEX>};
+constexpr FeatureQuery kFifoHapticEngine = {"supportsFifoHapticEngine", core::FIFO_HAPTIC_ENGINE, hasNode<core::THE_DEVICE_FIFO_HAPTIC_ENGINE>};
+constexpr FeatureQuery kHybridHapticEngine = {"supportsHybridHapticEngine", core::HYBRID_HAPTIC_ENGINE, hasNode<core::THE_DEVICE_HYBRID_HAPTIC_ENGINE>};
+constexpr FeatureQuery kEnhancedHapticPattern = {"supportsEnhancedQuorvanHapticPattern", core::ENHANCED_HAPTIC_ENGINE, hasEnhancedPattern};
+constexpr FeatureQuery kEnhancedHybridHapticPattern = {"supportsEnhancedHybridHapticPattern", core::ENHANCED_HYBRID_HAPTIC_ENGINE, hasEnhancedHybridPattern};
 // clang-format on
 
 // The letters are matched one by one: drivers report words of their own ("FOLDER", "ON", "TENT").
@@ -101,7 +112,7 @@ ndk::ScopedAStatus Vibrator::answer(const FeatureQuery& query, bool* result) con
     *result = false;
     if (isCallerAllowed()) {
         const int listed = mHwApi->hasFeature(query.feature);
-        *result = listed >= 0 ? listed == 1 : answerWithoutList(*mHwApi, query);
+        *result = listed >= 0 ? listed == 1 : query.withoutList(*mHwApi, query.name);
     }
     return core::ok();
 }

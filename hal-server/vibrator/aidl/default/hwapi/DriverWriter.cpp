@@ -37,31 +37,32 @@ std::optional<ssize_t> writeBytes(const LogSource& log, const char* operation,
     return written;
 }
 
-ssize_t readBytes(const NodeReader& reader, const std::string& node, char* buffer, size_t size) {
+std::optional<ssize_t> readBytes(const NodeReader& reader, const std::string& node, char* buffer,
+                                 size_t size) {
     const LogSource& log = reader.log;
     const ::android::base::unique_fd descriptor = kernel::open(node.c_str(), reader.flags);
     if (!descriptor.ok()) {
         const int error = errno;
         LOG(log.severity) << log.prefix << reader.subject << node << reader.openFailed << error;
-        return -1;
+        return std::nullopt;
     }
     const ssize_t count = kernel::read(descriptor.get(), buffer, size - 1);
     if (count >= reader.least) return count;
     const int error = errno;
     LOG(log.severity) << log.prefix << reader.subject << node << reader.readFailed << error;
-    return -1;
+    return std::nullopt;
 }
 
 std::optional<std::string_view> readLine(const NodeReader& reader, const std::string& node,
                                          char* buffer, size_t size) {
     const LogSource& log = reader.log;
-    const ssize_t count = readBytes(reader, node, buffer, size);
-    if (count < 0) return std::nullopt;
-    if (count >= static_cast<ssize_t>(size)) {
+    const std::optional<ssize_t> count = readBytes(reader, node, buffer, size);
+    if (!count) return std::nullopt;
+    if (*count >= static_cast<ssize_t>(size)) {
         ALOGE("Read MAX limit. Always end of string is null");
         buffer[size - 1] = '\0';
     } else {
-        buffer[count - 1] = '\0';
+        buffer[*count - 1] = '\0';
     }
     return buffer;
 }

@@ -81,8 +81,9 @@ struct NodeReader {
     ssize_t least;  // a read of fewer bytes has failed
 };
 
-// Reads at most `size` - 1 bytes into the zeroed `buffer`. The count, or -1 after the failure's line.
-ssize_t readBytes(const NodeReader& reader, const std::string& node, char* buffer, size_t size);
+// Reads at most `size` - 1 bytes into the zeroed `buffer`. The count; empty after the failure's line.
+std::optional<ssize_t> readBytes(const NodeReader& reader, const std::string& node, char* buffer,
+                                 size_t size);
 
 // The same, without the last byte, which is the driver's newline: a string written without one
 // loses its last character. Empty when it cannot be read; else a part of `buffer`, terminated.

@@ -8,7 +8,6 @@
 
 #include <algorithm>
 #include <cerrno>
-#include <charconv>
 #include <cstdio>
 #include <cstdlib>
 #include <optional>
@@ -28,7 +27,7 @@ namespace {
 
 constexpr char kWhiteSpace[] = " \t\n\v\f\r";
 
-// A number or short word with its newline and terminator.
+// A short word with its newline and terminator.
 constexpr size_t kNodeTextSize = 20;
 
 // clang-format off
@@ -62,10 +61,8 @@ bool canOpen(const std::string& node, int flags) {
 
 bool HwApi::writeNode(std::string node, int value) {
     LOG(INFO) << "HW_API: >> writeNode node:" << fromClass(node) << " val:" << value;
-    char text[kNodeTextSize];
-    char* end = std::to_chars(text, text + sizeof(text) - 1, value).ptr;
-    *end++ = '\n';
-    return writeText(node, O_RDWR, text, static_cast<size_t>(end - text));
+    const std::string text = std::to_string(value) + "\n";
+    return writeText(node, O_RDWR, text.data(), text.size());
 }
 
 bool HwApi::writeNodeByStringOnlyForWriting(std::string node, std::string value) {
@@ -84,7 +81,7 @@ bool HwApi::writeNodeByStringOnlyForWriting(std::string node, std::string value)
 int HwApi::readNode(std::string node) {
     LOG(INFO) << "HW_API: >> readNode node:" << fromClass(node);
     char text[8] = {};
-    if (readBytes(kNumberReader, node, text, sizeof(text)) < 0) return -1;
+    if (!readBytes(kNumberReader, node, text, sizeof(text))) return -1;
     const auto value = static_cast<int>(strtol(text, nullptr, 10));
     LOG(INFO) << "HW_API: << readNode done";
     return value;
@@ -93,7 +90,7 @@ int HwApi::readNode(std::string node) {
 std::string HwApi::readNodeAsString(std::string node) {
     LOG(INFO) << "HW_API: >> readNodeAsString node:" << fromClass(node);
     char buffer[512] = {};
-    if (readBytes(kStringReader, node, buffer, sizeof(buffer)) < 0) return "";
+    if (!readBytes(kStringReader, node, buffer, sizeof(buffer))) return "";
     std::string_view text(buffer);
     text.remove_suffix(text.size() - (text.find_last_not_of(kWhiteSpace) + 1));
     text.remove_prefix(std::min(text.find_first_not_of(kWhiteSpace), text.size()));

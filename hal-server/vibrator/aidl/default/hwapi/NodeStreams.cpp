@@ -6,8 +6,6 @@
 #define LOG_TAG "QvxVibrator-HAL-AIDL-CORE"
 
 #include <cerrno>
-#include <cinttypes>
-#include <cstdio>
 #include <cstring>
 #include <fstream>
 #include <string>
@@ -66,8 +64,8 @@ bool HwApi::set(uint32_t value, std::ofstream* stream) {
 }
 
 bool HwApi::writeNumber(uint32_t value, std::ostream* stream) {
-    char text[12];
-    stream->write(text, snprintf(text, sizeof(text), "%" PRIu32 "\n", value));
+    const std::string text = std::to_string(value) + "\n";
+    stream->write(text.data(), static_cast<std::streamsize>(text.size()));
     stream->flush();
     const bool succeeded = !stream->fail();
     if (!succeeded) {
