@@ -54,6 +54,7 @@ TEST_F(HybridRequest, ValueOfType0IsBareAndOfType1BehindANumberSign) {
     EXPECT_EQ(textOf({hybrid(5, 5000, kPlain, 3, 170)}, 10000), "4 5 5000 3 170\n");
     EXPECT_EQ(textOf({hybrid(1, 10000, kPlain, -2, 3), hybrid(4, 10000, kPrefixed, -5, 6)}, 2500),
               "8 1 2500 -2 3 4 2500 #-5 6\n");
+    EXPECT_THAT(log.lines(), Not(Contains(HasSubstr("abnormal"))));
 }
 
 TEST_F(HybridRequest, ValueOfAnotherTypeIsLeftOutAndLoggedWhileTheCountStays) {

@@ -5,8 +5,10 @@
 
 #include <algorithm>
 #include <chrono>
+#include <string_view>
 
 #include <android-base/logging.h>
+#include <gtest/gtest.h>
 
 #include "tests/sequence.h"
 
@@ -30,6 +32,11 @@ char letter(android::base::LogSeverity severity) {
 LogCapture::LogCapture() {
     android::base::SetLogger([this](android::base::LogId, android::base::LogSeverity severity,
                                     const char* tag, const char*, unsigned, const char* text) {
+        // One severity for all of a layer's lines; the standard service's prefix is borrowed.
+        const std::string_view line = text;
+        if (line.starts_with("HW_API: ") || line.starts_with("V_4_0: ")) {
+            EXPECT_EQ(severity, android::base::INFO) << line;
+        }
         const std::lock_guard lock(mMutex);
         mLines.push_back(std::string(1, letter(severity)) + ' ' + text);
         sequence::note(mLines.back());
