@@ -17,6 +17,11 @@ OPERATORS = {
     "&": ["|"], "|": ["&"], "^": ["&"], "<<": [">>"], ">>": ["<<"],
     "+=": ["-="], "-=": ["+="], "*=": ["/="], "/=": ["*="], "|=": ["&="], "&=": ["|="],
 }
+# Macros' counterparts: accesses to a file, severities of a log line.
+MACROS = {
+    "O_RDONLY": "O_RDWR", "O_WRONLY": "O_RDWR", "O_RDWR": "O_RDONLY",
+    "LOG(INFO)": "LOG(ERROR)", "LOG(ERROR)": "LOG(INFO)",
+}
 PREFIXES = {"!": "", "-": "", "~": "", "++": "--", "--": "++"}
 # Which children of a node are statements.
 STATEMENTS = {
@@ -27,6 +32,8 @@ STATEMENTS = {
 }
 WHOLE_NUMBERS = (TypeKind.INT, TypeKind.UINT, TypeKind.LONG, TypeKind.ULONG, TypeKind.SHORT,
                  TypeKind.USHORT, TypeKind.UCHAR)
+JUMPS = (CursorKind.RETURN_STMT, CursorKind.BREAK_STMT, CursorKind.CONTINUE_STMT)
+LAST_CHARACTER = re.compile(r'(\\.|[^\\"])"$')
 # Values that a "{}" in their place is the same as.
 DEFAULTS = re.compile(r'std::nullopt|(core::)?ok\(\)|""|\{\}')
 CHANGED_AS_SUCH = (CursorKind.BINARY_OPERATOR, CursorKind.UNARY_OPERATOR,
@@ -63,6 +70,8 @@ class Finder:
         own = [cursor for cursor in unit.cursor.get_children() if self._file(cursor)]
         for cursor in own:
             if cursor.kind == CursorKind.MACRO_INSTANTIATION:
+                if self._text(cursor) in MACROS:
+                    self._replace(cursor, cursor, MACROS[self._text(cursor)])
                 self._macros.setdefault(self._file(cursor), set()).update(
                     range(cursor.extent.start.offset, cursor.extent.end.offset))
         for cursor in own:
@@ -88,6 +97,20 @@ class Finder:
         extent = cursor.extent
         return self.source(self._file(cursor))[extent.start.offset:extent.end.offset].decode()
 
+    def _replace(self, first, last, replacement):
+        self.found.add(Mutant(self._file(first), first.extent.start.offset, last.extent.end.offset,
+                              replacement))
+
+    def _swap(self, first, second, between):
+        """Changes places with what follows, if only what `between` matches is between them."""
+        if not self._file(first) or not self._file(second):
+            return
+        end, begin = first.extent.end.offset, second.extent.start.offset
+        middle = self.source(self._file(first))[end:begin].decode()
+        if first.extent.start.offset < end <= begin and re.fullmatch(between, middle) and \
+                self._text(first) != self._text(second):
+            self._replace(first, second, self._text(second) + middle + self._text(first))
+
     def _add(self, cursor, *replacements, begin=None, end=None):
         """In place of the cursor, unless given otherwise; what a macro expands to stays as it is."""
         file = self._file(cursor)
@@ -109,10 +132,16 @@ class Finder:
             self._returned(children[0])
         elif cursor.kind in (CursorKind.IF_STMT, CursorKind.CONDITIONAL_OPERATOR):
             self._condition(children)
+        elif cursor.kind == CursorKind.DECL_REF_EXPR:
+            self._enumerator(cursor)
         elif cursor.kind.is_expression():
             self._literal(cursor)
-        for child in children[STATEMENTS.get(cursor.kind, slice(0))]:
-            self._statement(child)
+        if cursor.kind == CursorKind.CALL_EXPR and cursor.spelling not in ("min", "max"):
+            self._values(list(cursor.get_arguments()))
+        elif cursor.kind == CursorKind.INIT_LIST_EXPR:
+            self._values([child for child in children  # rows may mostly stand in any order
+                          if child.type.get_canonical().kind != TypeKind.RECORD])
+        self._statements(cursor, children[STATEMENTS.get(cursor.kind, slice(0))])
         for child in children:
             self._walk(child)
 
@@ -158,14 +187,41 @@ class Finder:
         elif cursor.kind == CursorKind.CXX_BOOL_LITERAL_EXPR:
             self._add(cursor, "false" if text == "true" else "true")
         elif cursor.kind == CursorKind.STRING_LITERAL and text.startswith('"'):
-            self._add(cursor, f'"~" {text}')
+            self._add(cursor, f'"~" {text}', LAST_CHARACTER.sub('"', text))
 
-    def _statement(self, cursor):
-        """A statement that is an expression is dropped, a macro's too: most are log lines."""
-        if cursor.kind.is_expression() and cursor.kind != CursorKind.LAMBDA_EXPR:
-            extent = cursor.extent
-            self.found.add(Mutant(self._file(cursor), extent.start.offset, extent.end.offset,
-                                  "(void)0"))
+    def _enumerator(self, cursor):
+        """The next one of its enumeration, the first one after the last."""
+        meant = cursor.referenced
+        if meant is not None and meant.kind == CursorKind.ENUM_CONSTANT_DECL:
+            names = [one.spelling for one in meant.semantic_parent.get_children()]
+            following = names[(names.index(meant.spelling) + 1) % len(names)]
+            self._add(cursor, self._text(cursor).removesuffix(meant.spelling) + following)
+
+    def _values(self, values):
+        """Neighbours of one type change places."""
+        for first, second in zip(values, values[1:]):
+            types = [value.type.get_canonical() for value in (first, second)]
+            if {one.kind for one in types} <= set(WHOLE_NUMBERS) or \
+                    len({one.spelling.replace("const ", "") for one in types}) == 1:
+                self._swap(first, second, r",\s*")
+
+    def _statements(self, parent, statements):
+        """Those that are expressions are dropped, a macro's too: most are log lines; and they change
+        places. Jumps are dropped, but not from the end of a function, which needs its value."""
+        for statement, following in zip(statements, [*statements[1:], None]):
+            plain = statement.kind.is_expression() and statement.kind != CursorKind.LAMBDA_EXPR
+            if plain or statement.kind in JUMPS and (
+                    following or parent.kind == CursorKind.IF_STMT):
+                self._replace(statement, statement, "(void)0")
+            if following and "" != self._what(statement) == self._what(following):
+                self._swap(statement, following, r";\s*(//.*\s*)?")
+
+    def _what(self, statement):
+        """Whether it logs or calls something: among themselves both have an order."""
+        if self._file(statement) and re.match(r"A?LOG", self._text(statement)):
+            return "log"
+        return "call" if statement.kind == CursorKind.CALL_EXPR and \
+            not re.match("operator|va_|__builtin_va", statement.spelling) else ""
 
 
 def spread(found, source):

@@ -11,7 +11,13 @@ except ImportError:  # of what ./check --all installs
     raise unittest.SkipTest("python3-clang is not installed") from None
 
 HEADER = """#define TWICE(x) ((x) + (x))
+#define O_RDONLY 0
+#define INFO 0
+#define LOG(severity) say(#severity)
+enum Answer { YES, NO };
+Answer answer(Answer);
 void say(const char*);
+void open(const char*, int, int);
 """
 
 
@@ -27,7 +33,7 @@ def changed(body):
     for file, begin, end, replacement in finder.found:
         assert file == "held.cpp"
         whole = text[:begin] + replacement + text[end:]
-        bodies.add(whole.partition("{ ")[2].rpartition(" }")[0])
+        bodies.add(whole.partition("bool c) { ")[2].rpartition(" }")[0])
     return bodies
 
 
@@ -49,14 +55,34 @@ class Changes(unittest.TestCase):
         self.assertEqual(changed("a = 'x';"), {"a = ('x' + 1);", "(void)0;"})
 
     def test_of_calls_and_strings(self):
-        self.assertEqual(changed('say("hello");'), {'(void)0;', 'say("~" "hello");'})
-        self.assertEqual(changed('say("a" "b");'), {'(void)0;', 'say("~" "a" "b");'})
+        self.assertEqual(changed('say("hello");'), {'(void)0;', 'say("~" "hello");', 'say("hell");'})
+        self.assertEqual(changed('say("a" "b");'), {'(void)0;', 'say("~" "a" "b");', 'say("a" "");'})
+
+        self.assertEqual(changed('say("a\\n");'), {'(void)0;', 'say("~" "a\\n");', 'say("a");'})
+
+    def test_of_the_order(self):
+        self.assertEqual(changed('open("", a, b);'), {"(void)0;", 'open("", b, a);',
+                                                      'open("~" "", a, b);'})
+        self.assertIn('say("y"); say("x");', changed('say("x"); say("y");'))
+        self.assertEqual(changed("int values[] = {a, b};"), {"int values[] = {b, a};"})
+
+    def test_of_names(self):
+        self.assertIn("answer(NO);", changed("answer(YES);"))
+        self.assertIn("answer(::YES);", changed("answer(::NO);"))
+        self.assertIn('open("", O_RDWR, a);', changed('open("", O_RDONLY, a);'))
+        self.assertEqual(changed("LOG(INFO);"), {"(void)0;", "LOG(ERROR);"})
+
+    def test_of_jumps_but_not_of_the_last(self):
+        self.assertEqual(changed("if (c) return c; return c;"),
+                         {"if (!(c)) return c; return c;", "if (c) (void)0; return c;",
+                          "if (c) return !(c); return c;", "if (c) return c; return !(c);"})
+        self.assertIn("for (;;) { (void)0; a = b; }", changed("for (;;) { break; a = b; }"))
 
     def test_of_branches_and_values(self):
         self.assertEqual(changed('if (c) say(""); else say("x");'),
                          {'if (!(c)) say(""); else say("x");', 'if (c) (void)0; else say("x");',
                           'if (c) say(""); else (void)0;', 'if (c) say("~" ""); else say("x");',
-                          'if (c) say(""); else say("~" "x");'})
+                          'if (c) say(""); else say("~" "x");', 'if (c) say(""); else say("");'})
         self.assertEqual(changed("return c ? c : c;"),
                          {"return !(c) ? c : c;", "return !(c ? c : c);"})
 
