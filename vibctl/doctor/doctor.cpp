@@ -53,12 +53,26 @@ fs::path findView(const fs::path& root, const ServiceProcess& service) {
     return root;
 }
 
+// What the service holds and cannot be told that it is gone: it opens the motor once.
+std::vector<Finding> checkHeldMotor(const ServiceProcess& service, const fs::path& proc) {
+    const std::string device = service.pid ? goneInputDevice(proc, *service.pid) : "";
+    if (device.empty()) return {};
+    return {bad(
+            "nodes",
+            fmt::format("process {} still holds the unplugged {}", *service.pid, shortName(device)),
+            "restart the service")};
+}
+
 // A driver that hangs must not take the doctor along.
-std::vector<Finding> examine(const fs::path& root, const User& user) {
+std::vector<Finding> examine(const fs::path& root, const ServiceProcess& service,
+                             const fs::path& proc) {
     constexpr std::chrono::seconds kTimeout{10};
-    const auto findings = within(kTimeout, [root, user] {
+    const auto findings = within(kTimeout, [root, service, proc] {
         const FileView view(root);
-        Driver driver = checkDriver(view, user);
+        Driver driver = checkDriver(view, service.user);
+        for (Finding& finding : checkHeldMotor(service, proc)) {
+            driver.findings.push_back(std::move(finding));
+        }
         for (Finding& finding : checkContents(view, driver)) {
             driver.findings.push_back(std::move(finding));
         }
@@ -84,7 +98,7 @@ std::vector<Finding> diagnose(const BinderFacts& facts, const fs::path& root) {
             checkRegistration(facts, service, proc),
             checkUser(service),
     };
-    for (Finding& finding : examine(view, service.user)) findings.push_back(std::move(finding));
+    for (Finding& finding : examine(view, service, proc)) findings.push_back(std::move(finding));
     findings.push_back(checkExtension(facts));
     return findings;
 }

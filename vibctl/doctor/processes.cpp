@@ -3,19 +3,30 @@
 // Processes as /proc shows them: see processes.h.
 #include "vibctl/doctor/processes.h"
 
+#include <linux/input.h>
+#include <sys/ioctl.h>
+#include <sys/syscall.h>
+#include <unistd.h>
+
 #include <algorithm>
+#include <cerrno>
 #include <set>
 #include <system_error>
 
 #include <android-base/file.h>
 #include <android-base/parseint.h>
 #include <android-base/strings.h>
+#include <android-base/unique_fd.h>
 
 namespace vibctl {
 
 namespace {
 
 namespace fs = std::filesystem;
+
+// What the kernel puts behind the path of an open file that has been removed.
+constexpr std::string_view kDeleted = " (deleted)";
+constexpr std::string_view kInputDirectory = "/dev/input/";
 
 // A file of a process; empty when it cannot be read.
 std::string readOf(const fs::path& proc, pid_t pid, const std::string& file) {
@@ -53,6 +64,16 @@ std::vector<std::string> statOf(const fs::path& proc, pid_t pid) {
     return android::base::Split(text.substr(end + 2), " ");
 }
 
+// Asks a process's own open device. A name that stands again, for a device that has come back, tells
+// nothing of it. False where the kernel (before 5.6) or a lack of rights does not let it be asked.
+bool hasLostItsDevice(pid_t pid, int descriptor) {
+    const android::base::unique_fd process(static_cast<int>(syscall(SYS_pidfd_open, pid, 0)));
+    const android::base::unique_fd copy(
+            static_cast<int>(syscall(SYS_pidfd_getfd, process.get(), descriptor, 0)));
+    int version = 0;
+    return copy.ok() && ioctl(copy.get(), EVIOCGVERSION, &version) != 0 && errno == ENODEV;
+}
+
 }  // namespace
 
 std::string executableOf(const fs::path& proc, pid_t pid) {
@@ -62,7 +83,6 @@ std::string executableOf(const fs::path& proc, pid_t pid) {
         if (!words.empty()) path = words.front();
     }
     // A program that was replaced while it runs.
-    constexpr std::string_view kDeleted = " (deleted)";
     if (path.ends_with(kDeleted)) path.resize(path.size() - kDeleted.size());
     return fs::path(path).filename().string();
 }
@@ -122,7 +142,17 @@ std::string nodeInUse(const fs::path& proc, pid_t pid) {
         int descriptor = 0;
         if (words.size() < 2 || !android::base::ParseInt(words[1], &descriptor, 0)) continue;
         std::string node = linkOf(proc, pid, "fd/" + std::to_string(descriptor));
-        if (node.starts_with("/sys/") || node.starts_with("/dev/input/")) return node;
+        if (node.starts_with("/sys/") || node.starts_with(kInputDirectory)) return node;
+    }
+    return "";
+}
+
+std::string goneInputDevice(const fs::path& proc, pid_t pid) {
+    for (const pid_t descriptor : numbersIn(proc / std::to_string(pid) / "fd")) {
+        std::string device = linkOf(proc, pid, "fd/" + std::to_string(descriptor));
+        if (!device.starts_with(kInputDirectory)) continue;
+        if (device.ends_with(kDeleted)) return device.substr(0, device.size() - kDeleted.size());
+        if (hasLostItsDevice(pid, descriptor)) return device;
     }
     return "";
 }

@@ -43,6 +43,11 @@ uint64_t startTimeOf(const std::filesystem::path& proc, pid_t pid);
 // empty when there is none, or for lack of the right to look.
 std::string nodeInUse(const std::filesystem::path& proc, pid_t pid);
 
+// The device below /dev/input that the process holds open and that is gone, so that all it asks of it
+// fails from now on, whatever stands under that name now; empty when there is none, or for lack of
+// the right to look.
+std::string goneInputDevice(const std::filesystem::path& proc, pid_t pid);
+
 // The processes whose files are not those of process 1, in order; one for each mount namespace.
 std::vector<pid_t> otherViews(const std::filesystem::path& proc);
 

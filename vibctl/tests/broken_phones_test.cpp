@@ -135,6 +135,15 @@ const Broken kServices[] = {
                                              phone.root.at("/proc/312/fd/5"));
          },
          "bad  registration: process 312 hangs in vibrator/duration; next: see the kernel log"},
+        {"ServiceHoldsAMotorThatIsGone",
+         [](Phone& phone) {
+             phone.becomeForceFeedback();
+             std::filesystem::create_directory(phone.root.at("/proc/312/fd"));
+             std::filesystem::create_symlink("/dev/input/event3 (deleted)",
+                                             phone.root.at("/proc/312/fd/9"));
+         },
+         "bad  nodes: process 312 still holds the unplugged input/event3; next: restart the "
+         "service"},
         {"AnotherService",
          [](Phone& phone) {
              phone.root.remove("/proc/312");

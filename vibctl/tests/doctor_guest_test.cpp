@@ -214,6 +214,40 @@ TEST(Doctor, SaysThatTheMotorIsUnplugged) {
                          "unplugged; next: plug it in"));
 }
 
+TEST(Doctor, SaysThatTheServiceStillHoldsAMotorThatHasComeBackSince) {
+    const Phone phone("ff");
+    ASSERT_EQ(runCommand({"vibctl", "std", "on", "50"}).status, 0);
+    ASSERT_EQ(runCommand({"phone", "unplug"}).status, 0);
+    ASSERT_EQ(runCommand({"phone", "plug"}).status, 0);
+    EXPECT_EQ(runCommand({"vibctl", "std", "on", "50"}).status, 1);
+    const Diagnosis diagnosis = diagnose(phone.servicePid());
+    EXPECT_EQ(diagnosis.status, 1);
+    EXPECT_THAT(diagnosis.lines,
+                Contains(testing::MatchesRegex("bad  nodes: process PID still holds the unplugged "
+                                               "input/event[0-9]+; next: restart the service")));
+    EXPECT_EQ(diagnosis.lines.back(), "one problem: nodes");
+    ASSERT_EQ(runCommand({"phone", "service", "restart"}).status, 0);
+    EXPECT_EQ(runCommand({"vibctl", "std", "on", "50"}).status, 0);
+    EXPECT_EQ(diagnose(phone.servicePid()).lines.back(), "all is well");
+}
+
+// These nodes are opened for each request, so nothing of an old driver stays behind.
+TEST(Doctor, IsContentOnceANodeOfTheOtherClassesIsBack) {
+    for (const auto& [profile, node] :
+         {std::pair("leds", "/sys/class/leds/vibrator/duration"),
+          std::pair("legacy", "/sys/class/timed_output/vibrator/enable")}) {
+        const Phone phone(profile);
+        ASSERT_EQ(runCommand({"vibctl", "std", "on", "50"}).status, 0);
+        ASSERT_EQ(runCommand({"phone", "unplug", node}).status, 0);
+        const std::vector<std::string> lines = diagnose(phone.servicePid()).lines;
+        EXPECT_THAT(lines, Contains(HasSubstr(" has no device: the motor is unplugged; next: see "
+                                              "the kernel log")));
+        ASSERT_EQ(runCommand({"phone", "plug", node}).status, 0);
+        EXPECT_EQ(runCommand({"vibctl", "std", "on", "50"}).status, 0);
+        EXPECT_EQ(diagnose(phone.servicePid()).lines.back(), "all is well");
+    }
+}
+
 TEST(Doctor, SaysThatTheMotorHasNoDevice) {
     const Phone phone("ff");
     phone.fault({{"node", "motor"}, {"op", "open"}, {"errno", "ENODEV"}});
