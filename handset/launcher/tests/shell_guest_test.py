@@ -103,6 +103,9 @@ class ShellWithPhone(ShellCase):
             self.assertIn(line, self.shell.greeting)
         self.say("ls /sys/class/leds/vibrator\r")
         self.expect("duration")
+        # The run's record of calls is kept of what is typed here, too.
+        self.say("vibctl std on 20; grep -c '\"std\",\"on\",\"20\"' $OUT/calls.jsonl\r")
+        self.expect("on: ok\r\n1\r\n")
         if ARCH == "amd64":
             self.say("phone jou\t | wc -c; vibctl doc\t --help | head -n 1\r")
             self.expect("phone journal ")
