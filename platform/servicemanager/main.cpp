@@ -9,6 +9,7 @@
 #include <algorithm>
 #include <cerrno>
 #include <chrono>
+#include <csignal>
 #include <cstdint>
 #include <cstdio>
 #include <cstdlib>
@@ -80,7 +81,8 @@ Options parseOptions(int argc, char** argv) {
             ->option_text("DIR (default /)")
             ->check(CLI::ExistingDirectory);
     app.add_option("--rules", options.rules,
-                   "Let users register services as this file says; without it only root may")
+                   "Let users register services, and start services on request, as this file says; "
+                   "without it only root may register")
             ->option_text("FILE");
     app.add_option("--ready-fd", options.readyFd,
                    "Write a newline to this descriptor and close it when requests are served")
@@ -138,6 +140,8 @@ void serveRequests(ServiceManager& manager) {
 [[noreturn]] void serve(const Options& options) {
     RegistrationRules rules = loadRules(options.rules);
     requireBinderDevice();
+    // Nobody waits for what is started on request.
+    signal(SIGCHLD, SIG_IGN);
     // One thread, this one: registrations and questions are answered one after the other.
     ABinderProcess_setThreadPoolMaxThreadCount(0);
     ServiceManager manager(options.root, std::move(rules));

@@ -29,12 +29,14 @@ std::optional<uid_t> findUser(const std::string& user) {
     return entry == nullptr ? std::nullopt : std::optional(entry->pw_uid);
 }
 
+}  // namespace
+
 // A line without its comment; nothing is wrong with an empty one.
-Result<void> readRule(const std::string& line, RegistrationRules& rules) {
+Result<void> RegistrationRules::readLine(const std::string& line) {
     std::vector<std::string> words = android::base::Split(line, " \t\r");
     std::erase(words, "");
     if (words.empty()) return {};
-    if (words.size() != 2) return Error() << "a rule is NAME USER, two words";
+    if (words.size() < 2) return Error() << "a rule is NAME USER [PROGRAM ARGUMENT...]";
     if (!isValidServiceName(words[0])) {
         return Error() << "\"" << words[0] << "\" is no service's name: " << kServiceNameForm;
     }
@@ -44,11 +46,17 @@ Result<void> readRule(const std::string& line, RegistrationRules& rules) {
         return Error() << "user " << *user << " is an app, which may not register: numbers below "
                        << kFirstApp;
     }
-    rules.allow(words[0], *user);
+    allow(words[0], *user);
+    if (words.size() == 2) return {};
+    if (words[2][0] != '/') {
+        return Error() << "\"" << words[2] << "\" is no program: a path from / on";
+    }
+    if (!mCommands.try_emplace(words[0], StartCommand{*user, {words.begin() + 2, words.end()}})
+                 .second) {
+        return Error() << "\"" << words[0] << "\" has a program already: one for each name";
+    }
     return {};
 }
-
-}  // namespace
 
 Result<RegistrationRules> RegistrationRules::load(const std::filesystem::path& file) {
     std::string content;
@@ -59,7 +67,7 @@ Result<RegistrationRules> RegistrationRules::load(const std::filesystem::path& f
     int number = 0;
     for (const std::string& line : android::base::Split(content, "\n")) {
         ++number;
-        if (const auto read = readRule(line.substr(0, line.find('#')), rules); !read.ok()) {
+        if (const auto read = rules.readLine(line.substr(0, line.find('#'))); !read.ok()) {
             return Error() << file.string() << ": line " << number << ": " << read.error();
         }
     }
@@ -72,6 +80,11 @@ void RegistrationRules::allow(std::string name, uid_t user) {
 
 bool RegistrationRules::mayRegister(uid_t user, const std::string& name) const {
     return user == 0 || mAllowed.count({name, user}) != 0;
+}
+
+const StartCommand* RegistrationRules::commandFor(const std::string& name) const {
+    const auto found = mCommands.find(name);
+    return found == mCommands.end() ? nullptr : &found->second;
 }
 
 }  // namespace servicemanager

@@ -150,11 +150,10 @@ binder_status_t replyVerdict(AParcel* out, const char* method, const std::string
 
 }  // namespace
 
-// By transaction code, from FIRST_CALL_TRANSACTION. Starting a service on request is init's work,
-// and there is no init here: getService and checkService are the same.
+// By transaction code, from FIRST_CALL_TRANSACTION.
 const ServiceManager::Serve ServiceManager::kMethods[12] = {
-        /*  1 getService                 */ &ServiceManager::find,
-        /*  2 checkService               */ &ServiceManager::find,
+        /*  1 getService                 */ &ServiceManager::getService,
+        /*  2 checkService               */ &ServiceManager::checkService,
         /*  3 addService                 */ &ServiceManager::addService,
         /*  4 listServices               */ &ServiceManager::listServices,
         /*  5 registerForNotifications   */ &ServiceManager::registerForNotifications,
@@ -249,7 +248,30 @@ void ServiceManager::onBinderDied(void* cookie) {
     }
 }
 
-binder_status_t ServiceManager::find(const AParcel* in, AParcel* out) {
+// On a phone init starts what its scripts name, here the starter what the rules name.
+void ServiceManager::startService(const Caller& caller, const std::string& name) {
+    const StartCommand* const command = mRules.commandFor(name);
+    if (command == nullptr || isIsolated(caller.uid)) return;
+    const auto started = mStarter.start(name, *command);
+    if (!started.ok()) {
+        log(fmt::format("{} cannot be started: {}", shown(name), started.error().message()));
+    } else if (*started) {
+        log(fmt::format("{} is started for pid {}, uid {}", shown(name), caller.pid, caller.uid));
+    }
+}
+
+// Does not wait for a service that it has started: the caller asks again, or is called back.
+binder_status_t ServiceManager::getService(const AParcel* in, AParcel* out) {
+    std::string name;
+    const binder_status_t status = readArguments(in, &name);
+    if (status != STATUS_OK) return status;
+    const Caller caller = callerOfThisTransaction();
+    const Object service = mRegistry.find(caller, name);
+    if (!service) startService(caller, name);
+    return reply(out, service);
+}
+
+binder_status_t ServiceManager::checkService(const AParcel* in, AParcel* out) {
     std::string name;
     const binder_status_t status = readArguments(in, &name);
     if (status != STATUS_OK) return status;

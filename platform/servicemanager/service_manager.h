@@ -17,6 +17,7 @@
 #include "platform/servicemanager/manifests.h"
 #include "platform/servicemanager/registration_rules.h"
 #include "platform/servicemanager/service_registry.h"
+#include "platform/servicemanager/service_starter.h"
 
 namespace servicemanager {
 
@@ -61,7 +62,8 @@ class ServiceManager final : public ObjectHost {
                                       AParcel* out);
     static void onBinderDied(void* cookie);
 
-    binder_status_t find(const AParcel* in, AParcel* out);
+    binder_status_t getService(const AParcel* in, AParcel* out);
+    binder_status_t checkService(const AParcel* in, AParcel* out);
     binder_status_t addService(const AParcel* in, AParcel* out);
     binder_status_t listServices(const AParcel* in, AParcel* out);
     binder_status_t registerForNotifications(const AParcel* in, AParcel* out);
@@ -73,11 +75,14 @@ class ServiceManager final : public ObjectHost {
     binder_status_t tryUnregisterService(const AParcel* in, AParcel* out);
     binder_status_t getServiceDebugInfo(const AParcel* in, AParcel* out);
 
+    void startService(const Caller& caller, const std::string& name);
+
     static const Serve kMethods[12];
 
     Manifests mManifests;
     RegistrationRules mRules;
     ServiceRegistry mRegistry;
+    ServiceStarter mStarter;
     ndk::ScopedAIBinder_DeathRecipient mDeathRecipient;
     std::unordered_map<const AIBinder*, Watch> mWatches;
     ndk::SpAIBinder mBinder;

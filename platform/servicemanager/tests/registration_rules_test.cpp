@@ -4,6 +4,7 @@
 #include "platform/servicemanager/registration_rules.h"
 
 #include <string>
+#include <vector>
 
 #include <android-base/file.h>
 #include <gtest/gtest.h>
@@ -58,8 +59,10 @@ TEST_F(RulesTest, CommentsSpacesAndSeveralUsersOfANameAreFine) {
 }
 
 TEST_F(RulesTest, AnErrorNamesTheLineAndWhatIsAccepted) {
-    EXPECT_EQ(errorOf("# x\nfoo\n"), ": line 2: a rule is NAME USER, two words");
-    EXPECT_EQ(errorOf("foo 1 2\n"), ": line 1: a rule is NAME USER, two words");
+    EXPECT_EQ(errorOf("# x\nfoo\n"), ": line 2: a rule is NAME USER [PROGRAM ARGUMENT...]");
+    EXPECT_EQ(errorOf("foo 1 2\n"), ": line 1: \"2\" is no program: a path from / on");
+    EXPECT_EQ(errorOf("foo 1 /bin/a\nfoo 2 /bin/b\n"),
+              ": line 2: \"foo\" has a program already: one for each name");
     EXPECT_EQ(errorOf("foo 1\nb@r 1\n"),
               ": line 2: \"b@r\" is no service's name: 1 to 127 of a-z A-Z 0-9 _ - . /");
     EXPECT_EQ(errorOf("foo no-such-user\n"),
@@ -67,6 +70,17 @@ TEST_F(RulesTest, AnErrorNamesTheLineAndWhatIsAccepted) {
     EXPECT_EQ(errorOf("foo -1\n"), ": line 1: no user \"-1\": a user's name or number");
     EXPECT_EQ(errorOf("foo 10000\n"),
               ": line 1: user 10000 is an app, which may not register: numbers below 10000");
+}
+
+TEST_F(RulesTest, AProgramIsForOneName) {
+    const auto rules = load("foo 1000 /bin/serve -x  y # what\nfoo 2000\nbar 1000\n");
+    ASSERT_TRUE(rules.ok());
+    EXPECT_TRUE(rules->mayRegister(1000, "foo"));
+    const StartCommand* const command = rules->commandFor("foo");
+    ASSERT_NE(command, nullptr);
+    EXPECT_EQ(command->user, 1000u);
+    EXPECT_EQ(command->words, (std::vector<std::string>{"/bin/serve", "-x", "y"}));
+    EXPECT_EQ(rules->commandFor("bar"), nullptr);
 }
 
 TEST_F(RulesTest, AFileThatCannotBeReadIsAnError) {

@@ -2,14 +2,19 @@
 //
 // What becomes of a service and who is told of it, over the kernel's binder: registrations, lazy
 // services, deaths.
+#include <sys/stat.h>
 #include <unistd.h>
 
+#include <cerrno>
+#include <csignal>
 #include <string>
 #include <vector>
 
 #include <android/binder_manager.h>
+#include <android/binder_process.h>
 #include <gmock/gmock.h>
 
+#include "handset/common/raw_binder.h"
 #include "platform/servicemanager/tests/service_manager_test.h"
 
 namespace {
@@ -140,29 +145,72 @@ TEST_F(LazyServices, MayNotLeaveWhileClientsMayBeThere) {
     });
 }
 
-// What a lazy service does: it leaves, name first, when its last client has gone.
-void serveLazily() {
-    static const ndk::SpAIBinder object = makeObject();
-    static const auto callback = ndk::SharedRefBase::make<ClientCallback>([](bool hasClients) {
-        if (!hasClients && ask(kLeave, "test.lazy", object) == EX_NONE) _exit(0);
-    });
-    EXPECT_EQ(add("test.lazy", object), EX_NONE);
-    EXPECT_EQ(ask(kWatchClients, "test.lazy", object, callback), EX_NONE);
+// The process that has registered a name; 0 when none has. Asking is no use of the service.
+pid_t registrantOf(const std::string& name) {
+    std::vector<ServiceDebugInfo> infos;
+    EXPECT_EQ(ask(&IServiceManager::getServiceDebugInfo, &infos), EX_NONE);
+    for (const ServiceDebugInfo& info : infos) {
+        if (info.name == name) return info.debugPid;
+    }
+    return 0;
 }
 
-TEST_F(LazyServices, StayForAClientLeaveAfterItAndComeAgain) {
+TEST_F(LazyServices, AreStartedForAClientLeaveAfterItAndComeAgain) {
     for (int round = 0; round < 2; ++round) {
         SCOPED_TRACE(round);
-        Process service = serve(kSystem, serveLazily);
         inProcess(kApp, [] {
-            const ndk::SpAIBinder found(AServiceManager_checkService("test.lazy"));
+            ABinderProcess_startThreadPool();  // to be told on
+            const ndk::SpAIBinder found(AServiceManager_waitForService("test.lazy"));
+            ASSERT_NE(found.get(), nullptr);
+            struct stat process {};
+            const std::string path = "/proc/" + std::to_string(registrantOf("test.lazy"));
+            EXPECT_EQ(stat(path.c_str(), &process), 0);
+            EXPECT_EQ(process.st_uid, kSystem);
             // Clients are counted every five seconds; the second count is the first that tells.
             sleep(11);
             EXPECT_EQ(AIBinder_ping(found.get()), STATUS_OK);
         });
-        EXPECT_TRUE(eventually([&service] { return service.hasEnded(); }));
-        inProcess(kApp, [] { EXPECT_EQ(AServiceManager_checkService("test.lazy"), nullptr); });
+        inProcess(kApp, [] {
+            const pid_t service = registrantOf("test.lazy");
+            EXPECT_NE(service, 0);
+            EXPECT_TRUE(eventually([] { return registrantOf("test.lazy") == 0; }));
+            EXPECT_TRUE(eventually([service] { return kill(service, 0) != 0 && errno == ESRCH; }));
+        });
     }
+}
+
+TEST_F(LazyServices, AreStartedByAskingForThemWithGetServiceAlone) {
+    const auto isStarted = [this](const char* name) {
+        return mManager.log().find(std::string("\"") + name + "\" is started for pid ") !=
+               std::string::npos;
+    };
+    ndk::SpAIBinder found;
+    inProcess(kApp, [&] {
+        EXPECT_EQ(ask(&IServiceManager::checkService, "test.never", &found), EX_NONE);
+        EXPECT_EQ(ask(&IServiceManager::getService, "test.own", &found), EX_NONE);
+    });
+    inProcess(kIsolated, [] {
+        // It may not find the manager's own object, but its handle.
+        const handset::RawReply reply = handset::RawBinder().transact(
+                0, IServiceManager::TRANSACTION_getService,
+                handset::RequestBytes().token("android.os.IServiceManager").string16("test.never"));
+        EXPECT_EQ(reply.words()[0], 0u) << "no exception";
+    });
+    EXPECT_FALSE(isStarted("test.never"));
+    EXPECT_FALSE(isStarted("test.own")) << "no rule has a program for it";
+    // However often: one process.
+    inProcess(kApp, [&] {
+        for (int i = 0; i < 100; ++i) {
+            EXPECT_EQ(ask(&IServiceManager::getService, "test.never", &found), EX_NONE);
+            EXPECT_EQ(found.get(), nullptr);
+        }
+    });
+    EXPECT_TRUE(isStarted("test.never"));
+    const std::string failure =
+            "cannot run /no/such/program as user 1000: No such file or directory";
+    EXPECT_TRUE(eventually([&] { return mManager.log().find(failure) != std::string::npos; }));
+    EXPECT_EQ(mManager.log().find(failure), mManager.log().rfind(failure));
+    EXPECT_TRUE(mManager.answers());
 }
 
 using DebugInfos = ServiceManagerTest;

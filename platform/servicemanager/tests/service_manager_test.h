@@ -26,7 +26,9 @@ inline constexpr const char* kRules =
         "test.service 101000\n"
         "test.own 1000\n"
         "test.other 1000\n"
-        "test.lazy 1000\n"
+        "test.lazy 1000 " LAZY_SERVICE_PROGRAM
+        "\n"
+        "test.never 1000 /no/such/program\n"
         "test.pack.IFoo/default 1000\n"
         "test.pack.IFoo/other 1000\n";
 
