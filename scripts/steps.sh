@@ -20,9 +20,10 @@ show_help() {
 }
 
 # wrong_usage TEXT: says in one line what was wrong and what is accepted, and ends with status 2.
-# $program is the command's name, where the file's says too little.
+# $program is the command's name, where the file's says too little. A word of the user's may hold
+# anything.
 wrong_usage() {
-    printf '%s: %s\n' "${program:-${0##*/}}" "$1" >&2
+    printf '%s: %s\n' "${program:-${0##*/}}" "${1//[[:cntrl:]]/?}" >&2
     exit 2
 }
 

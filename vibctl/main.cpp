@@ -4,7 +4,9 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <cerrno>
 #include <cstdio>
+#include <cstring>
 #include <exception>
 #include <iostream>
 #include <string>
@@ -92,19 +94,6 @@ Exit runSession(const CommandLine&) {
     return first;
 }
 
-// "help std on" and "std help" are other spellings of "std on --help" and "std --help".
-Exit runHelp(CommandLine line) {
-    if (line.command == "help") {
-        line.command = line.method;
-        line.method = line.arguments.empty() ? "" : line.arguments.front();
-    } else {
-        line.method.clear();
-    }
-    line.help = true;
-    if (line.command == "std" || line.command == "ext") return runMethod(line);
-    return print(programHelp());
-}
-
 Exit runList(const CommandLine& line) {
     const Problem problem = checkBinder(line.timeout);
     return reportText(line, "manager", problem ? noService(*problem) : listServices());
@@ -188,7 +177,8 @@ Exit runPlay(const CommandLine& line) {
         android::base::ReadFdToString(STDIN_FILENO, &text);
     } else if (!line.method.empty() && isdigit(static_cast<unsigned char>(line.method[0])) == 0 &&
                !android::base::ReadFileToString(line.method, &text)) {
-        return fail(line, "play: cannot read " + inQuotes(line.method));
+        return fail(line, fmt::format("play: cannot read {}: {}", inQuotes(line.method),
+                                      std::strerror(errno)));
     }
     // What is wrong is said before anybody is asked or anything is played.
     Plan plan;
@@ -246,15 +236,41 @@ constexpr Command kCommands[] = {
 };
 // clang-format on
 
+const Command* findCommand(const std::string& name) {
+    const auto* const found =
+            std::find_if(std::begin(kCommands), std::end(kCommands),
+                         [&name](const Command& one) { return name == one.name; });
+    return found == std::end(kCommands) ? nullptr : found;
+}
+
+// "help std on" and "std help" are other spellings of "std on --help" and "std --help".
+Exit runHelp(CommandLine line) {
+    size_t mostArguments = 0;
+    if (line.command == "help") {
+        mostArguments = 1;
+        line.command = line.method;
+        line.method = line.arguments.empty() ? "" : line.arguments.front();
+    } else {
+        line.method.clear();
+    }
+    if (line.arguments.size() > mostArguments) {
+        return fail(line, "help takes fewer words; usage: vibctl help [std|ext [METHOD]]");
+    }
+    line.help = true;
+    if (line.command == "std" || line.command == "ext") return runMethod(line);
+    if (!line.command.empty() && findCommand(line.command) == nullptr) {
+        return fail(line, unknownCommand(line.command));
+    }
+    return print(programHelp());
+}
+
 Exit run(const std::vector<std::string>& all) {
     CommandLine line;
     if (const Problem problem = parseCommandLine(all, line)) return fail(line, *problem);
     if (line.version) return print("vibctl " VIBCTL_STRING(VIBCTL_VERSION) "\n");
     if (line.command == "help" || line.method == "help") return runHelp(line);
-    const auto* const command =
-            std::find_if(std::begin(kCommands), std::end(kCommands),
-                         [&line](const Command& one) { return line.command == one.name; });
-    if (command == std::end(kCommands)) {
+    const Command* const command = findCommand(line.command);
+    if (command == nullptr) {
         return line.help ? print(programHelp()) : fail(line, unknownCommand(line.command));
     }
     if (line.help && command->run != runMethod) return print(programHelp());

@@ -193,7 +193,9 @@ Result<void> checkValue(const Json& value, const std::string& where, std::string
                            "{}: a whole number{}{} from {} to {} expected, not {}", place,
                            accepted.unit.empty() ? "" : " of ", accepted.unit, accepted.least,
                            accepted.most,
-                           value.is_number() ? value.dump() : std::string(kindOf(value)));
+                           value.is_number() || value.is_string()
+                                   ? value.dump(-1, ' ', false, Json::error_handler_t::replace)
+                                   : std::string(kindOf(value)));
         default:
             if (value.is_string()) return checkString(value.get<std::string>(), place, accepted);
             return Error() << fmt::format("{}: a string expected, not {}", place, kindOf(value));

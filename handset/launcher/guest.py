@@ -183,7 +183,7 @@ class Guest:
         self._machine.drain_console()
         tail = self._machine.last_words(_TAIL_LINES)
         said = "".join(f"\n  console: {line}" for line in tail) or " (its console is empty)"
-        return Failure(what + said)
+        return Failure(what, said)
 
 
 def _without_priority(line):

@@ -112,7 +112,8 @@ def _make(arch, headers, release, target):
             stdin=subprocess.DEVNULL, capture_output=True, text=True, errors="replace", check=False)
         if done.returncode != 0:
             complaints = [line for line in done.stderr.splitlines() if "error" in line.lower()]
-            raise Failure("\n  ".join(["the kernel module does not build:"] + complaints[:10]))
+            raise Failure("the kernel module does not build:",
+                          "".join(f"\n  {line}" for line in complaints[:10]))
         # What a debugger wants is most of the file, which the guest reads through an export.
         debian_packages.run([_PREFIXES[arch] + "strip", "--strip-debug", MODULE], source)
         shutil.move(os.path.join(source, MODULE), target)

@@ -36,8 +36,12 @@ def run_command(program, description, words):
     def work():
         chosen = options.parse(program, description, words, takes_command=True)
         streams = _Inherited(None if os.isatty(0) else 0)
-        with _drawn(chosen, shlex.join([program, *words])):
-            return session.run(chosen, chosen.command, streams)
+        with contextlib.ExitStack() as scratch:
+            if (chosen.picture or chosen.trace) and chosen.out is None:
+                chosen.out = scratch.enter_context(tempfile.TemporaryDirectory(prefix="handset-"))
+            status = session.run(chosen, chosen.command, streams)
+            drawn = _draw(chosen, shlex.join([program, *words]))
+            return status or drawn
     return _with_one_line(program, work)
 
 
@@ -73,18 +77,17 @@ def _shell(arch):
     return [*variables, f"ENV={start}", "sh", "-i"]
 
 
-@contextlib.contextmanager
-def _drawn(chosen, title):
-    """Draws what the session has left, where --picture or --trace asks for it."""
-    wanted = [("picture", chosen.picture, ["--title", title]), ("trace", chosen.trace, [])]
-    wanted = [drawing for drawing in wanted if drawing[1] is not None]
-    with contextlib.ExitStack() as scratch:
-        if wanted and chosen.out is None:
-            chosen.out = scratch.enter_context(tempfile.TemporaryDirectory(prefix="handset-"))
-        yield
-        for tool, file, more in wanted:
-            subprocess.run([os.path.join(PROJECT, "handset", tool), chosen.out, "--out", file,
-                            *more], stdout=subprocess.DEVNULL, check=False)
+def _draw(chosen, title):
+    """Draws what the session has left, where --picture or --trace asks for it; the exit status of
+    the one that could not, else 0."""
+    status = 0
+    for tool, file, more in (("picture", chosen.picture, ["--title", title]),
+                             ("trace", chosen.trace, [])):
+        if file is not None:
+            done = subprocess.run([os.path.join(PROJECT, "handset", tool), chosen.out, "--out",
+                                   file, *more], stdout=subprocess.DEVNULL, check=False)
+            status = status or done.returncode
+    return status
 
 
 def _with_one_line(program, work):

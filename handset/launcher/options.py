@@ -5,7 +5,7 @@ import argparse
 import os
 
 import kernel_module
-from failure import Failure
+from failure import Failure, Parser, path
 from guest_image import ARCHITECTURES, PROJECT
 from machine import find_emulator
 
@@ -16,14 +16,11 @@ _ELF_MACHINE_OFFSET = 18
 
 _MEMORY_MIB = 512
 _SANITIZED_MEMORY_MIB = 2048  # shadow memory
+_LEAST_MEMORY_MIB, _MOST_MEMORY_MIB = 128, 65536
+_MOST_PROCESSORS = 8  # of the interrupt controller that a machine for arm64 has
 
 # The guest has file systems of its own there, so a directory below is not seen as it is outside.
 _HIDDEN = ("/dev", "/proc", "/run", "/sys")
-
-
-class _Parser(argparse.ArgumentParser):
-    def error(self, message):
-        raise Failure(message)
 
 
 def _positive(kind, what):
@@ -38,6 +35,24 @@ def _positive(kind, what):
     return convert
 
 
+def whole(least, most):
+    """The type of an option that is a whole number."""
+    def convert(text):
+        if not text.isdecimal() or not least <= int(text[:9]) <= most:
+            raise argparse.ArgumentTypeError(
+                f"'{text}' is not a whole number from {least} to {most}")
+        return int(text)
+    return convert
+
+
+def built_in_profiles():
+    """Their names, in order."""
+    directory = os.path.join(PROJECT, "handset", "profiles")
+    files = os.listdir(directory) if os.path.isdir(directory) else []
+    return sorted(name[:-len(".json")] for name in files
+                  if name.endswith(".json") and not name.endswith(".schema.json"))
+
+
 def parse(program, description, words, takes_command):
     """The options in `words`, all checked, as an object with the fields that the parser below
     names (`profile` is None for "off") and with
@@ -48,35 +63,35 @@ def parse(program, description, words, takes_command):
         join       of a shell: the process id given with --join, 0 for none given, None without
     With --join nothing else is checked or there.
     """
-    parser = _Parser(prog=program, description=description, allow_abbrev=False)
+    parser = Parser(program, description)
     parser.add_argument("--arch", default="amd64", metavar="ARCH", help="amd64 (default) or arm64")
     parser.add_argument("--profile", default="leds", metavar="NAME|FILE",
                         help="what phone this is (default leds); 'off' starts no phone")
-    parser.add_argument("--out", metavar="DIR",
+    parser.add_argument("--out", metavar="DIR", type=path,
                         help="leave journal.jsonl, service.log, kernel.log and what is written "
                              "to $OUT there")
     parser.add_argument("--timeout", metavar="SECONDS", type=_positive(float, "a number"),
                         default=300 if takes_command else None,
                         help="end the guest this long after its boot, with status 124 (default "
                              f"{'300' if takes_command else 'never'})")
-    parser.add_argument("--build", metavar="DIR",
+    parser.add_argument("--build", metavar="DIR", type=path,
                         help="build directory with the programs (default build/release, for arm64 "
                              "build/arm64)")
-    parser.add_argument("--memory", metavar="MIB", type=_positive(int, "a whole number"),
+    parser.add_argument("--memory", metavar="MIB", type=whole(_LEAST_MEMORY_MIB, _MOST_MEMORY_MIB),
                         help="the guest's memory (default 512, for a sanitized build 2048)")
-    parser.add_argument("--smp", metavar="N", type=_positive(int, "a whole number"), default=1,
+    parser.add_argument("--smp", metavar="N", type=whole(1, _MOST_PROCESSORS), default=1,
                         help="processors (default 1)")
     parser.add_argument("--driver", metavar="WHICH", default="simulated",
                         help="simulated (default), or kernel: the nodes and the motor of the kernel "
                              "module, without faults and unplugging")
     parser.add_argument("--counted", action="store_true",
                         help="let the guest's clock count instructions: 1 ns is one instruction")
-    parser.add_argument("--timing", metavar="FILE",
+    parser.add_argument("--timing", metavar="FILE", type=path,
                         help="write the seconds each phase took, as JSON")
     if takes_command:
-        parser.add_argument("--picture", metavar="FILE",
+        parser.add_argument("--picture", metavar="FILE", type=path,
                             help="draw what happened into a .svg or .png, see handset/picture")
-        parser.add_argument("--trace", metavar="FILE",
+        parser.add_argument("--trace", metavar="FILE", type=path,
                             help="write what happened as a trace, see handset/trace")
     parser.add_argument("--verbose", action="store_true", help="tell of each phase")
     command = []
@@ -104,7 +119,7 @@ def parse(program, description, words, takes_command):
     _check_profile(options)
     _check_build(options)
     _check_directories(options)
-    _check_results(options, takes_command)
+    _check_results(options)
     if options.memory is None:
         options.memory = _SANITIZED_MEMORY_MIB if _is_sanitized(options.build) else _MEMORY_MIB
     return options
@@ -125,16 +140,16 @@ def _check_directories(options):
     paths = [options.directory, options.build, options.profile or "/"]
     if options.driver == "kernel":
         paths.append(kernel_module.module_path(options.arch))
-    paths += [os.path.realpath(path) for path in paths if path.startswith("/")]
-    for path in paths:
-        if _is_below(path, _HIDDEN):
-            raise Failure(f"the guest cannot see {path}: "
+    paths += [os.path.realpath(place) for place in paths if place.startswith("/")]
+    for place in paths:
+        if _is_below(place, _HIDDEN):
+            raise Failure(f"the guest cannot see {place}: "
                           f"it has its own {', '.join(_HIDDEN[:-1])} and {_HIDDEN[-1]}")
-    options.host_tmp = any(_is_below(path, ("/tmp",)) for path in paths)
+    options.host_tmp = any(_is_below(place, ("/tmp",)) for place in paths)
 
 
-def _is_below(path, directories):
-    return any(path == directory or path.startswith(directory + "/") for directory in directories)
+def _is_below(place, directories):
+    return any(place == directory or place.startswith(directory + "/") for directory in directories)
 
 
 def _check_build(options):
@@ -173,9 +188,7 @@ def _check_profile(options):
     if options.profile == "off":
         options.profile = None
         return
-    directory = os.path.join(PROJECT, "handset", "profiles")
-    built_in = sorted(name[:-len(".json")] for name in os.listdir(directory)
-                      if name.endswith(".json")) if os.path.isdir(directory) else []
+    built_in = built_in_profiles()
     if options.profile in built_in:
         return
     if not os.path.isfile(options.profile):
@@ -183,25 +196,28 @@ def _check_profile(options):
     options.profile = os.path.abspath(options.profile)
 
 
-def _check_results(options, takes_command):
-    if takes_command:
-        _check_drawings(options)
+def _check_results(options):
+    _check_files(options)
     if options.out is not None:
         options.out = os.path.abspath(options.out)
         try:
             os.makedirs(options.out, exist_ok=True)
         except OSError as error:
             raise Failure(f"--out {options.out}: {error.strerror}") from None
-    if options.timing is not None and not os.path.isdir(os.path.dirname(options.timing) or "."):
-        raise Failure(f"--timing {options.timing}: its directory does not exist")
 
 
-def _check_drawings(options):
-    for name, path in (("picture", options.picture), ("trace", options.trace)):
-        if path is not None and not os.path.isdir(os.path.dirname(path) or "."):
-            raise Failure(f"--{name} {path}: its directory does not exist")
-    if options.picture is not None and not options.picture.endswith((".svg", ".png")):
-        raise Failure(f"--picture {options.picture}: a picture's name ends in .svg or .png")
+def _check_files(options):
+    """The files to be written, some of them by handset/run alone."""
+    for name in ("timing", "picture", "trace"):
+        file = getattr(options, name, None)
+        if file is None:
+            continue
+        if not os.path.isdir(os.path.dirname(file) or "."):
+            raise Failure(f"--{name} {file}: its directory does not exist")
+        if os.path.isdir(file):
+            raise Failure(f"--{name} {file}: a directory is there; give a file")
+        if name == "picture" and not file.endswith((".svg", ".png")):
+            raise Failure(f"--picture {file}: a picture's name ends in .svg or .png")
 
 
 def _is_sanitized(build):

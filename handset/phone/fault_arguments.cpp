@@ -24,6 +24,7 @@ nlohmann::json valueOf(const std::string& text) {
     if (text == "true") return true;
     if (text == "false") return false;
     if (isNumber(text)) return std::stoull(text);
+    if (text.starts_with('-') && isNumber(text.substr(1))) return std::stoll(text);
     return text;
 }
 

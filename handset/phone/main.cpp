@@ -49,6 +49,38 @@ struct Arguments {
     std::vector<std::string> command;
 };
 
+// An empty word would be taken for 0.
+std::string refuseEmpty(const std::string& word) {
+    return word.empty() ? "a number expected, not \"\"" : "";
+}
+
+// The commands, or with one of them the options and arguments that it takes.
+std::string acceptedBy(const CLI::App& app) {
+    const std::vector<CLI::App*> chosen = app.get_subcommands();
+    std::vector<std::string> names;
+    if (chosen.empty()) {
+        for (const CLI::App* command : app.get_subcommands({})) {
+            names.push_back(command->get_name());
+        }
+    } else {
+        for (const CLI::Option* option : chosen.front()->get_options()) {
+            names.push_back(option->get_name());
+        }
+    }
+    return fmt::format("{}", fmt::join(names, ", "));
+}
+
+// What was wrong, and what is accepted there.
+std::string explain(const CLI::App& app, const CLI::ParseError& error, int argc, char** argv) {
+    const std::string accepted = acceptedBy(app);
+    if (app.get_subcommands().empty()) {
+        return argc < 2 ? fmt::format("no command given; there are {}", accepted)
+                        : fmt::format("unknown command \"{}\"; there are {}", argv[1], accepted);
+    }
+    return fmt::format("{}: {}; accepted: {}", app.get_subcommands().front()->get_name(),
+                       error.what(), accepted);
+}
+
 // Adds a command; what it does runs after the whole line has been understood.
 CLI::App* addCommand(CLI::App& app, std::function<int()>& chosen, const char* name,
                      const char* help, const std::function<int()>& action) {
@@ -98,6 +130,7 @@ void addPlug(CLI::App& app, std::function<int()>& chosen, Arguments& arguments, 
             [&arguments, plugIn] { return phonePlug(plugIn, arguments.node, arguments.after); });
     plug->add_option("NODE", arguments.node, "a node's path (default: motor)");
     plug->add_option("--after", arguments.after, "milliseconds from now")
+            ->check(refuseEmpty)
             ->check(CLI::Range(0, 3600000));
 }
 
@@ -136,7 +169,8 @@ void addNode(CLI::App& app, std::function<int()>& chosen, Arguments& arguments) 
 
 void addExec(CLI::App& app, std::function<int()>& chosen, Arguments& arguments) {
     CLI::App* exec = app.add_subcommand("exec", "run a command where the phone's nodes are seen");
-    CLI::Option* user = exec->add_option("--user", arguments.user, "user id to run it as");
+    CLI::Option* user =
+            exec->add_option("--user", arguments.user, "user id to run it as")->check(refuseEmpty);
     exec->add_option("COMMAND", arguments.command, "the command")->required();
     exec->positionals_at_end();
     exec->callback([&chosen, &arguments, user] {
@@ -176,7 +210,7 @@ int parseAndRun(int argc, char** argv) {
         std::cout << app.help();
         return 0;
     } catch (const CLI::ParseError& error) {
-        return failWith(kWrongUsage, fmt::format("{}; see phone --help", error.what()));
+        return failWith(kWrongUsage, explain(app, error, argc, argv));
     }
     return chosen();
 }

@@ -79,6 +79,7 @@ Result<PhonePlan> makePlan(const UpOptions& options) {
     const fs::path here = fs::read_symlink("/proc/self/exe", error).parent_path();
     PhonePlan plan;
     plan.profileName = options.profile;
+    if (options.out.empty()) return Error() << "--out: a directory expected, not \"\"";
     plan.out = fs::absolute(options.out).string();
     Result<std::string> profile = findProfile(options.profile);
     if (!profile) return profile.error();

@@ -1,27 +1,19 @@
 # SPDX-License-Identifier: Apache-2.0
 """handset/picture, handset/trace and handset/replay: from a run's directory to a file."""
 
-import argparse
 import os
 import sys
 
+from failure import Failure, Parser, one_line, path
 from run import Unreadable, read
-
-
-class _Refused(Exception):
-    """One line for the user."""
-
-
-class _Parser(argparse.ArgumentParser):
-    def error(self, message):
-        raise _Refused(message)
 
 
 def picture(program, description, words):
     """handset/picture; returns its exit status."""
     def work(parser):
-        parser.add_argument("directory", metavar="DIR", help="what handset/run left with --out")
-        parser.add_argument("--out", metavar="FILE", action="append",
+        parser.add_argument("directory", metavar="DIR", type=path,
+                            help="what handset/run left with --out")
+        parser.add_argument("--out", metavar="FILE", action="append", type=path,
                             help="a .svg or .png to draw to, may be given twice (default run.svg "
                                  "and run.png in DIR)")
         parser.add_argument("--title", metavar="STRING", help="default: the directory's name")
@@ -30,9 +22,9 @@ def picture(program, description, words):
         paths = options.out or [os.path.join(options.directory, name)
                                 for name in ("run.svg", "run.png")]
         run = read(options.directory)
-        for path in paths:
-            if wrong := drawing.check_path(path):
-                raise _Refused(wrong)
+        for file in paths:
+            if wrong := drawing.check_path(file):
+                raise Failure(wrong)
         name = os.path.basename(os.path.realpath(options.directory))
         drawing.draw(run, options.title or name, paths)
         print("\n".join(paths))
@@ -42,20 +34,21 @@ def picture(program, description, words):
 def trace(program, description, words):
     """handset/trace; returns its exit status."""
     def work(parser):
-        parser.add_argument("directory", metavar="DIR", help="what handset/run left with --out")
-        parser.add_argument("--out", metavar="FILE", help="default trace.json in DIR")
+        parser.add_argument("directory", metavar="DIR", type=path,
+                            help="what handset/run left with --out")
+        parser.add_argument("--out", metavar="FILE", type=path, help="default trace.json in DIR")
         options = parser.parse_args(words)
         import trace as tracing
-        path = options.out or os.path.join(options.directory, "trace.json")
-        tracing.write(read(options.directory), path)
-        print(path)
+        file = options.out or os.path.join(options.directory, "trace.json")
+        tracing.write(read(options.directory), file)
+        print(file)
     return _with_one_line(program, description, work)
 
 
 def replay(program, description, words):
     """handset/replay; returns its exit status."""
     def work(parser):
-        parser.add_argument("source", metavar="DIR|LOG",
+        parser.add_argument("source", metavar="DIR|LOG", type=path,
                             help="what handset/run left with --out, or a log as logcat prints it")
         source = parser.parse_args(words).source
         import sequence
@@ -68,10 +61,10 @@ def replay(program, description, words):
 
 def _with_one_line(program, description, work):
     try:
-        work(_Parser(prog=program, description=description, allow_abbrev=False))
+        work(Parser(program, description))
         return 0
-    except (_Refused, Unreadable) as failure:
-        print(f"{program}: {failure}", file=sys.stderr)
+    except (Failure, Unreadable) as failure:
+        print(f"{program}: {one_line(str(failure))}", file=sys.stderr)
     except OSError as error:
-        print(f"{program}: {error.filename}: {error.strerror}", file=sys.stderr)
+        print(f"{program}: {one_line(str(error.filename))}: {error.strerror}", file=sys.stderr)
     return 2

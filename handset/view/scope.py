@@ -7,7 +7,6 @@ vibctl, {"id": N, "phone": [words]} for the phone tool, {"id": N, "profile": nam
 change. Only who has the token gets in, and only from this machine.
 """
 
-import argparse
 import asyncio
 import collections
 import json
@@ -22,7 +21,9 @@ import tempfile
 
 from aiohttp import WSMsgType, web
 
+from failure import Failure, Parser, path
 from live import LiveRun
+from options import built_in_profiles, whole
 
 _VIEW = os.path.dirname(os.path.realpath(__file__))
 _HANDSET = os.path.dirname(_VIEW)
@@ -123,9 +124,8 @@ class Scope:
         self._pages, self._lines = set(), []
         self._calls = asyncio.Lock()
         self._cause = {"number": 0, "text": ""}
-        self._state = {"profile": options.profile, "phone": "starting", "profiles": sorted(
-            name[:-5] for name in os.listdir(os.path.join(_HANDSET, "profiles"))
-            if name.endswith(".json"))}
+        self._state = {"profile": options.profile, "phone": "starting",
+                       "profiles": built_in_profiles()}
         self._guest, self._run, self._sent = Guest(options), None, []
         self._client = False    # whether there is one to make calls
         self._recorded = False  # whether it has recorded the call under way
@@ -334,13 +334,20 @@ def _fields(output):
 
 def main(program, description, words):
     """handset/scope; returns its exit status."""
-    parser = argparse.ArgumentParser(prog=program, description=description, allow_abbrev=False)
-    parser.add_argument("--profile", default="leds", help="what phone comes up first (default leds)")
-    parser.add_argument("--port", type=int, default=0, help="default: one that is free")
-    parser.add_argument("--build", metavar="DIR", help="build directory (default build/release)")
-    options = parser.parse_args(words)
-    if not os.path.isfile(os.path.join(_HANDSET, "profiles", options.profile + ".json")):
-        parser.error(f"no profile '{options.profile}'")
+    parser = Parser(program, description)
+    parser.add_argument("--profile", metavar="NAME", default="leds",
+                        help="what phone comes up first (default leds)")
+    parser.add_argument("--port", metavar="PORT", type=whole(0, 65535), default=0,
+                        help="default: one that is free")
+    parser.add_argument("--build", metavar="DIR", type=path,
+                        help="build directory (default build/release)")
+    try:
+        options = parser.parse_args(words)
+        if options.profile not in built_in_profiles():
+            raise Failure(f"no profile '{options.profile}': use {', '.join(built_in_profiles())}")
+    except Failure as failure:
+        print(f"{program}: {failure}", file=sys.stderr)
+        return 2
     token = secrets.token_urlsafe(24)
     try:
         asyncio.run(_serve(Scope(options, token), options.port, token))

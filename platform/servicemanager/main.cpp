@@ -3,10 +3,12 @@
 // servicemanager [--root DIR] [--rules FILE] [--ready-fd N]: makes itself the context manager of the
 // binder device and serves until the driver is gone. Exit status 2 for wrong usage, 1 when it cannot
 // serve; each with one line that says why.
+#include <fcntl.h>
 #include <poll.h>
 #include <unistd.h>
 
 #include <algorithm>
+#include <cctype>
 #include <cerrno>
 #include <chrono>
 #include <csignal>
@@ -16,10 +18,12 @@
 #include <cstring>
 #include <exception>
 #include <filesystem>
+#include <optional>
 #include <string>
 #include <utility>
 
 #include <CLI/CLI.hpp>
+#include <android-base/parseint.h>
 #include <android/binder_process.h>
 #include <binder_context_manager.h>
 #include <fmt/format.h>
@@ -40,7 +44,10 @@ constexpr int kWrongUsage = 2;
 // How often clients are counted, as on a phone, and systemd hears that the one thread is alive.
 constexpr std::chrono::seconds kTick{5};
 
-[[noreturn]] void fail(const std::string& why, int status) {
+// Keeps to one line: a word of the user's may hold anything.
+[[noreturn]] void fail(std::string why, int status) {
+    std::replace_if(
+            why.begin(), why.end(), [](unsigned char c) { return std::iscntrl(c) != 0; }, '?');
     fmt::print(stderr, "servicemanager: {}\n", why);
     std::exit(status);
 }
@@ -70,9 +77,16 @@ std::string reasonOf(binder_status_t status) {
 
 struct Options {
     std::string root = "/";
-    std::string rules;  // empty: none
+    std::optional<std::string> rules;
     int readyFd = -1;
 };
+
+// What is wrong with a descriptor; empty when it is open. An empty word would be taken for 0.
+std::string requireDescriptor(const std::string& word) {
+    int fd = -1;
+    if (android::base::ParseInt(word, &fd) && fcntl(fd, F_GETFD) >= 0) return "";
+    return fmt::format("\"{}\" is no open descriptor", word);
+}
 
 Options parseOptions(int argc, char** argv) {
     Options options;
@@ -86,7 +100,8 @@ Options parseOptions(int argc, char** argv) {
             ->option_text("FILE");
     app.add_option("--ready-fd", options.readyFd,
                    "Write a newline to this descriptor and close it when requests are served")
-            ->option_text("N");
+            ->option_text("N")
+            ->check(requireDescriptor);
     try {
         app.parse(argc, argv);
     } catch (const CLI::CallForHelp& help) {
@@ -99,9 +114,9 @@ Options parseOptions(int argc, char** argv) {
     return options;
 }
 
-RegistrationRules loadRules(const std::string& file) {
-    if (file.empty()) return {};
-    auto rules = RegistrationRules::load(file);
+RegistrationRules loadRules(const std::optional<std::string>& file) {
+    if (!file) return {};
+    auto rules = RegistrationRules::load(*file);
     if (!rules.ok()) fail(rules.error().message(), kWrongUsage);
     return *std::move(rules);
 }

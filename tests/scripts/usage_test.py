@@ -39,9 +39,18 @@ class WrongUsage(unittest.TestCase):
                 (["check", "-j4"], "check: unknown argument '-j4'; "
                                    "it takes --all, -R, -E and -L with a REGEX, --help"),
                 (["check", "-R"], "check: -R needs a regular expression"),
+                (["check", "-E", ""], "check: -E needs a regular expression"),
+                (["check", "-R", "("], "check: -R '(': no regular expression"),
+                (["check", "-R", "*"], "check: -R '*': no regular expression"),
+                (["check", "a\nb\x1b"], "check: unknown argument 'a?b?'; "
+                                        "it takes --all, -R, -E and -L with a REGEX, --help"),
+                ([".ci/run", "now"], "check: unknown argument 'now'; "
+                                     "it takes --all, -R, -E and -L with a REGEX, --help"),
                 (["bench/run", "-x"], "bench/run: unknown argument '-x'; accepted: --write, --help"),
                 (["fuzz/run"], "fuzz/run: no fuzzer given; it takes a fuzzer (...) "
                                "and a number of executions, or --all MINUTES"),
+                (["fuzz/run", ""], "fuzz/run: no fuzzer ''; it takes a fuzzer (...) "
+                                   "and a number of executions, or --all MINUTES"),
                 (["fuzz/run", "--all", "0"], "fuzz/run: '0' is no number above 0; it takes a "
                                              "fuzzer (...) and a number of "
                                              "executions, or --all MINUTES"),
@@ -54,6 +63,9 @@ class WrongUsage(unittest.TestCase):
                  "--help"),
                 (["tests/soak/run"], "tests/soak/run: no minutes given; it takes MINUTES, --attack, "
                                      "--arch amd64 or arm64, --smp N and --service asan"),
+                (["tests/soak/run", "1", "2"],
+                 "tests/soak/run: minutes given twice, '1' and '2'; it takes MINUTES, --attack, "
+                 "--arch amd64 or arm64, --smp N and --service asan"),
                 (["tests/soak/run", "1", "--arch", "mips"],
                  "tests/soak/run: wrong argument '--arch'; it takes MINUTES, --attack, "
                  "--arch amd64 or arm64, --smp N and --service asan"),

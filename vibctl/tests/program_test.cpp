@@ -121,7 +121,8 @@ constexpr WrongUsage kWrongUsages[] = {
         {"NothingToPlay", "play", "vibctl: play needs steps or a file; see vibctl help\n"},
         {"StepOfPlay", "play 0 ten",
          "vibctl: play: step \"ten\" is not an integer from 0 to 600000\n"},
-        {"FileOfPlay", "play missing.ahap", "vibctl: play: cannot read \"missing.ahap\"\n"},
+        {"FileOfPlay", "play missing.ahap",
+         "vibctl: play: cannot read \"missing.ahap\": No such file or directory\n"},
         {"SequenceOfPlay", "play - </dev/null", "vibctl: -: no call in it\n"},
         {"RepeatOfPlay", "play 5 --repeat 0",
          "vibctl: --repeat \"0\" is not an integer from 1 to 1000\n"},
@@ -138,6 +139,11 @@ constexpr WrongUsage kWrongUsages[] = {
          "vibctl: --timeout \"soon\" is not a number of seconds from 0 to 86400\n"},
         {"OptionOfAnotherCommand", "list --callback",
          "vibctl: list takes no --callback, unlike std, ext\n"},
+        {"WordToExplain", "help preform",
+         "vibctl: unknown command \"preform\"; there are std, ext, info, dump, raw, play, session, "
+         "list, doctor and help\n"},
+        {"MoreToExplain", "help std on now",
+         "vibctl: help takes fewer words; usage: vibctl help [std|ext [METHOD]]\n"},
         {"MethodToExplain", "help std preform",
          "vibctl: std: unknown method \"preform\"; did you mean perform\n"},
 };

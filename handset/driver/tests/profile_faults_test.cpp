@@ -115,10 +115,9 @@ TEST(ProfileFaults, CountsAreWholeNumbers) {
     EXPECT_EQ(refusalOfFault(
                       R"({"node": "/sys/class/a/b", "op": "write", "errno": "EIO", "times": -1})"),
               "faults[0].times: a whole number of calls from 0 to 4294967295 expected, not -1");
-    EXPECT_EQ(
-            refusalOfFault(
-                    R"({"node": "/sys/class/a/b", "op": "write", "errno": "EIO", "after": "1"})"),
-            "faults[0].after: a whole number of calls from 0 to 4294967295 expected, not a string");
+    EXPECT_EQ(refusalOfFault(
+                      R"({"node": "/sys/class/a/b", "op": "write", "errno": "EIO", "after": "1"})"),
+              "faults[0].after: a whole number of calls from 0 to 4294967295 expected, not \"1\"");
 }
 
 TEST(ProfileFaults, UnknownKeysAreRefused) {

@@ -210,7 +210,7 @@ TEST(Profile, TheMotorsNumbersAreBounded) {
     EXPECT_EQ(refusal(R"({"motor": {"event": -1}})"),
               "motor.event: a whole number from 0 to 1023 expected, not -1");
     EXPECT_EQ(refusal(R"({"motor": {"event": "1"}})"),
-              "motor.event: a whole number from 0 to 1023 expected, not a string");
+              "motor.event: a whole number from 0 to 1023 expected, not \"1\"");
     EXPECT_EQ(refusal(R"({"motor": {"effects_max": 0}})"),
               "motor.effects_max: a whole number from 1 to 96 expected, not 0");
     EXPECT_EQ(refusal(R"({"motor": {"effects_max": 97}})"),

@@ -44,11 +44,22 @@ class Options(unittest.TestCase):
 
     def test_unknown_option(self):
         self.assertEqual(self.refused("--bogus", "--", "true"),
-                         "handset/run: unrecognized arguments: --bogus")
+                         "handset/run: unrecognized arguments: --bogus; accepted: --arch, --build, "
+                         "--counted, --driver, --help, --memory, --out, --picture, --profile, "
+                         "--smp, --timeout, --timing, --trace, --verbose")
 
     def test_abbreviated_option_is_unknown(self):
-        self.assertEqual(self.refused("--prof", "off", "--", "true"),
-                         "handset/run: unrecognized arguments: --prof off")
+        self.assertIn("handset/run: unrecognized arguments: --prof off; accepted: ",
+                      self.refused("--prof", "off", "--", "true"))
+
+    def test_word_that_is_no_text_is_told_in_one_line(self):
+        self.assertIn("handset/run: no profile 'a\\nb\\x1b': use ",
+                      self.refused("--profile", "a\nb\x1b", "--", "true"))
+
+    def test_empty_path(self):
+        for option in ("--out", "--build", "--timing", "--picture", "--trace"):
+            self.assertEqual(self.refused(option, "", "--", "true"),
+                             f"handset/run: argument {option}: '' is no path")
 
     def test_unknown_architecture(self):
         self.assertEqual(self.refused("--arch", "mips", "--", "true"),
@@ -66,6 +77,7 @@ class Options(unittest.TestCase):
         self.assertEqual(named, sorted(named))
         self.assertLessEqual({"ff", "leds", "leds-haptic-engine", "legacy", "legacy-none", "none"},
                              set(named))
+        self.assertNotIn("profile.schema", named)
 
     def test_profile_that_is_a_directory(self):
         self.assertIn("no profile '/etc':", self.refused("--profile", "/etc", "--", "true"))
@@ -105,12 +117,13 @@ class Options(unittest.TestCase):
                 if text != "-1" else
                 "handset/run: argument --timeout: '-1' is not a number above 0")
 
-    def test_memory_and_processors_must_be_whole_and_above_zero(self):
-        for option in ("--memory", "--smp"):
-            for text in ("0", "1.5", "many"):
+    def test_memory_and_processors_have_a_range(self):
+        for option, range_, texts in (("--memory", "128 to 65536", ("0", "127", "65537", "many")),
+                                      ("--smp", "1 to 8", ("0", "9", "1.5", "9" * 30, ""))):
+            for text in texts:
                 self.assertEqual(self.refused(option, text, "--", "true"),
                                  f"handset/run: argument {option}: '{text}' is not a whole number "
-                                 "above 0")
+                                 f"from {range_}")
 
     def test_option_without_its_value(self):
         self.assertEqual(self.refused("--out", "--", "true"),
@@ -127,6 +140,8 @@ class Options(unittest.TestCase):
         for words, said in (
                 (("--picture", "no/a.svg"), "--picture no/a.svg: its directory does not exist"),
                 (("--trace", "no/a.json"), "--trace no/a.json: its directory does not exist"),
+                (("--trace", "."), "--trace .: a directory is there; give a file"),
+                (("--timing", "."), "--timing .: a directory is there; give a file"),
                 (("--picture", "a.gif"),
                  "--picture a.gif: a picture's name ends in .svg or .png")):
             self.assertEqual(self.refused("--build", self.build, *words, "--", "true"),
@@ -161,10 +176,14 @@ class Options(unittest.TestCase):
 
     def test_shell_takes_no_command(self):
         self.assertEqual(self.refused("ls", program=SHELL),
-                         "handset/shell: unrecognized arguments: ls")
+                         "handset/shell: unrecognized arguments: ls; accepted: --arch, --build, "
+                         "--counted, --driver, --help, --join, --memory, --out, --profile, --smp, "
+                         "--timeout, --timing, --verbose")
 
-    def test_preparations_refuse_an_unknown_architecture(self):
+    def test_preparations_refuse_other_words_and_unknown_architectures(self):
         for program, name in ((PREPARE_GUEST, "prepare-guest"), (BUILD_MODULE, "build-module")):
+            self.assertEqual(self.refused("now", program=program),
+                             f"{name}: unrecognized arguments: now; accepted: --arch, --help")
             self.assertEqual(self.refused("--arch", "mips", program=program),
                              f"{name}: unknown architecture 'mips': use amd64 or arm64")
 

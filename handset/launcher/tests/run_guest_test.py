@@ -212,6 +212,12 @@ class Phone(unittest.TestCase):
     def test_shows_its_nodes_to_the_command(self):
         self.assertIn(b"\nduration\n", self.done.stdout)
 
+    def test_without_a_journal_cannot_be_drawn_and_says_so_with_its_status(self):
+        done = handset("--profile", "off", "--trace", "none.json", "--", "true",
+                       cwd=self.directory)
+        self.assertEqual(done.returncode, 2, done)
+        self.assertIn(b"no journal.jsonl there", done.stderr)
+
     def test_does_not_change_the_commands_status(self):
         self.assertEqual(self.done.returncode, 9, self.done)
 

@@ -25,6 +25,10 @@ TEST(FaultArguments, TruthValuesAreNoTexts) {
     EXPECT_EQ(*fault, R"({"node":"motor","op":"upload","unplug":true})");
 }
 
+TEST(FaultArguments, NegativeNumbersAreNumbers) {
+    EXPECT_EQ(*faultFromArguments({"short=-1", "errno=-"}), R"({"errno":"-","short":-1})");
+}
+
 TEST(FaultArguments, AnObjectIsPassedOn) {
     const Result<std::string> fault =
             faultFromArguments({"{\"node\": \"motor\",\n \"op\": \"open\"}"});

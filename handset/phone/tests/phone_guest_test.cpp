@@ -56,6 +56,33 @@ TEST_F(Phone, UpSaysThatTheServiceIsRegistered) {
     EXPECT_FALSE(runs(service));
 }
 
+TEST_F(Phone, WrongWordsAreNamedWithWhatIsAccepted) {
+    const std::pair<const char*, const char*> kUsages[] = {
+            {"phone",
+             "no command given; there are up, down, status, service, reset, fault, node, "
+             "unplug, plug, journal, log, exec"},
+            {"phone 'a\nb'",
+             "unknown command \"a?b\"; there are up, down, status, service, reset, "
+             "fault, node, unplug, plug, journal, log, exec"},
+            {"phone down --now",
+             "down: The following argument was not expected: --now; accepted: "
+             "--help"},
+            {"phone unplug --after ''",
+             "unplug: --after: a number expected, not \"\"; accepted: "
+             "--help, --after, NODE"},
+            {"phone exec --user '' -- true",
+             "exec: --user: a number expected, not \"\"; accepted: "
+             "--help, --user, COMMAND"},
+            {"phone up --out ''", "--out: a directory expected, not \"\""},
+    };
+    for (const auto& [command, line] : kUsages) {
+        const Ran ran = run(command);
+        EXPECT_EQ(ran.status, 2) << command;
+        EXPECT_EQ(ran.output, "") << command;
+        EXPECT_EQ(ran.errors, std::string("phone: ") + line + "\n");
+    }
+}
+
 TEST_F(Phone, EveryBuiltInProfileComesUp) {
     for (const std::string profile : {"legacy", "ff", "none"}) {
         const Ran up = run("phone up --profile " + profile);

@@ -72,10 +72,30 @@ class Picture(unittest.TestCase):
         for words, said in (((directory.path / "missing",), "no journal.jsonl there"),
                             ((directory.path, "--out", "a.gif"), "ends in .svg or .png"),
                             ((directory.path, "--out", "/missing/a.svg"), "does not exist"),
+                            (("a\nb",), "handset/picture: a\\nb: no journal.jsonl there"),
+                            (("",), "argument DIR: '' is no path"),
+                            ((directory.path, "b"),
+                             "unrecognized arguments: b; accepted: --help, --out, --title, DIR"),
                             ((), "required: DIR")):
             done = command("picture", *words)
             self.assertEqual((done.returncode, done.stdout, done.stderr.count("\n")), (2, "", 1))
             self.assertIn(said, done.stderr)
+
+
+class Scope(unittest.TestCase):
+    def test_is_refused_in_one_line(self):
+        for words, said in (
+                (("now",), "unrecognized arguments: now; accepted: --build, --help, --port, --profile"),
+                (("--port", "65536"),
+                 "argument --port: '65536' is not a whole number from 0 to 65535"),
+                (("--port", "-1"), "argument --port: '-1' is not a whole number from 0 to 65535"),
+                (("--build", ""), "argument --build: '' is no path"),
+                (("--profile", "a\nb"), "no profile 'a\\nb': use ff, leds, leds-amplitude, "
+                 "leds-haptic-engine, leds-none, leds-prebaked-index, legacy, legacy-amplitude, "
+                 "legacy-haptic-engine, legacy-none, legacy-prebaked-index, none")):
+            done = command("scope", *words)
+            self.assertEqual((done.returncode, done.stdout, done.stderr),
+                             (2, "", f"handset/scope: {said}\n"))
 
 
 class Trace(unittest.TestCase):

@@ -32,6 +32,13 @@ TEST(Program, WrongUsageGetsOneLineAndStatus2) {
     EXPECT_EQ(missing.out,
               "servicemanager: --root: Directory does not exist: /no/such/directory; usage: "
               "servicemanager [--root DIR] [--rules FILE] [--ready-fd N]\n");
+    for (const char* fd : {"-1", "999", "''", "x"}) {
+        const CommandResult result = run(std::string("--ready-fd ") + fd);
+        EXPECT_EQ(result.status, 2);
+        EXPECT_THAT(result.out, ::testing::HasSubstr(" is no open descriptor; usage: ")) << fd;
+    }
+    const CommandResult lines = run("'a\nb'");
+    EXPECT_THAT(lines.out, ::testing::HasSubstr("not expected: a?b; usage: "));
     const CommandResult word = run("now");
     EXPECT_EQ(word.status, 2);
     EXPECT_EQ(word.out,
@@ -43,6 +50,7 @@ TEST(Program, WrongRulesGetOneLineAndStatus2) {
     const CommandResult result = run("--rules /no/such/file");
     EXPECT_EQ(result.status, 2);
     EXPECT_EQ(result.out, "servicemanager: /no/such/file: No such file or directory\n");
+    EXPECT_EQ(run("--rules ''").status, 2);
 }
 
 TEST(Program, WithoutABinderDeviceSaysSoWithStatus1) {
