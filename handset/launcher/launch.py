@@ -36,11 +36,12 @@ def run_command(program, description, words):
     def work():
         chosen = options.parse(program, description, words, takes_command=True)
         streams = _Inherited(None if os.isatty(0) else 0)
+        profile = os.path.basename(chosen.profile or "off")
         with contextlib.ExitStack() as scratch:
             if (chosen.picture or chosen.trace) and chosen.out is None:
                 chosen.out = scratch.enter_context(tempfile.TemporaryDirectory(prefix="handset-"))
             status = session.run(chosen, chosen.command, streams)
-            drawn = _draw(chosen, shlex.join([program, *words]))
+            drawn = _draw(chosen, shlex.join([program, "--profile", profile, "--", *chosen.command]))
             return status or drawn
     return _with_one_line(program, work)
 

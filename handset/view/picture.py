@@ -23,6 +23,7 @@ _ROW = 22         # height of a row
 _DRIVE = 150      # height of the drive's lane
 _TEXT = 8         # points
 _CHARACTER = 6.0  # pixels of an average character at that size
+_TITLE_CHARACTER = 8.8
 _GAP = 34         # width of a stretch of time that was cut short
 _ROWS = 5         # of labels in a client's lane; what finds no room goes without
 
@@ -139,8 +140,9 @@ class _Sheet:
         axes.set_axis_off()
         axes.set_xlim(0, WIDTH)
         axes.set_ylim(height, 0)
-        axes.text(12, 18, title, size=11, weight="bold", color=_INK, va="center")
-        self._time(height)
+        room = self._time(height) - 24
+        axes.text(12, 18, _shortened(title, room, _TITLE_CHARACTER), size=11, weight="bold",
+                  color=_INK, va="center")
         for shape in self._shapes:
             shape(axes)
 
@@ -275,19 +277,35 @@ class _Sheet:
     def _drive_words(self, axes, bottom, stretches):
         """Names above the blocks, where there is room for them; a loop's are said once."""
         said, free = None, {}  # up to where each height of a line has words
-        for stretch, following in zip(stretches, stretches[1:] + stretches[:1]):
+        for at, stretch in enumerate(stretches):
+            following = stretches[(at + 1) % len(stretches)]
+            loops = stretch.kind in ("queue", "composite")
             name = stretch.label if stretch.known else f"{stretch.label}, ? ms"
             name = f"{name} {stretch.level:.0%}" if stretch.level < 1 else name
-            if (following.kind, following.label) == (stretch.kind, stretch.label) != said and \
-                    stretch.kind in ("queue", "composite"):
+            if loops and (following.kind, following.label) == (stretch.kind, stretch.label) != said:
                 name += ", repeated"
             x, y = self._x(stretch.start), bottom - _DRIVE * stretch.level - 4
             row = round(y / 12)
-            if (stretch.kind, stretch.label) != said and \
+            if (not loops or (stretch.kind, stretch.label) != said) and \
                     all(x >= free.get(near, 0) for near in (row - 1, row, row + 1)):
+                name = self._beside_taller(stretches, at, name)
+                if not name:
+                    continue
                 axes.text(x, y, name, va="bottom", color=_INK, clip_on=True)
                 free[row] = x + _CHARACTER * len(name)
                 said = stretch.kind, stretch.label
+
+    def _beside_taller(self, stretches, at, name):
+        """As much of a name as fits before a later block that reaches as high as the words; "" where
+        that is too little to tell blocks apart."""
+        x = self._x(stretches[at].start)
+        for number in range(at + 1, len(stretches)):
+            room = self._x(stretches[number].start) - x
+            if room >= _CHARACTER * len(name):
+                break
+            if stretches[number].level > stretches[at].level:
+                return _shortened(name, room) if room > 10 * _CHARACTER else ""
+        return name
 
     # --- time ---------------------------------------------------------------------------------------
 
@@ -310,6 +328,7 @@ class _Sheet:
                 left = self._key(left, *_KINDS[kind])
         if any(not stretch.known for stretch in self._run.stretches):
             left = self._key(left, "white", "", "dotted end: length not known", ":")
+        return left
 
     def _key(self, right, colour, hatch, name, line="-"):
         left = right - _CHARACTER * len(name) - 24
@@ -322,9 +341,9 @@ class _Sheet:
         return _LEFT + self._axis(us)
 
 
-def _shortened(text, room):
+def _shortened(text, room, character=_CHARACTER):
     """As much of a text as fits, "" where that would say nothing."""
-    fitting = int(room / _CHARACTER)
+    fitting = int(room / character)
     return text if len(text) <= fitting else text[:fitting - 1] + "…" if fitting > 3 else ""
 
 

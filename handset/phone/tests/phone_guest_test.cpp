@@ -69,7 +69,7 @@ TEST_F(Phone, WrongWordsAreNamedWithWhatIsAccepted) {
              "--help"},
             {"phone unplug --after ''",
              "unplug: --after: a number expected, not \"\"; accepted: "
-             "--help, --after, NODE"},
+             "--help, NODE, --after"},
             {"phone exec --user '' -- true",
              "exec: --user: a number expected, not \"\"; accepted: "
              "--help, --user, COMMAND"},

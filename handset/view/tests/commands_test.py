@@ -64,6 +64,29 @@ class Picture(unittest.TestCase):
         drawn = (directory.path / "run.svg").read_text("utf-8")
         self.assertLess(drawn.count("<text"), 250)
 
+    def test_has_no_title_where_the_legend_stands(self):
+        directory = small_run(self)
+        command("picture", directory.path, "--title", "much " * 50)
+        self.assertRegex((directory.path / "run.svg").read_text("utf-8"), ">(much ){10,24}m?u?c?h?…<")
+
+    def test_names_each_block_and_puts_no_name_on_a_taller_one(self):
+        directory = Directory(self)
+        for start, packets in ((0, "8 30 10000 2050 0 60 3000 1700 1"), (100, "4 60 10000 2050 0")):
+            directory.write(start, "haptic_engine", packets + "\n")
+            directory.write(start + 1, "duration", "1\n")
+            directory.write(start + 2, "activate", "1\n")
+        self.assertEqual(command("picture", directory.path).returncode, 0)
+        drawn = (directory.path / "run.svg").read_text("utf-8")
+        self.assertEqual(drawn.count(">packet 2050<"), 2)
+        self.assertIn(">packet 1700 overdrive 30%<", drawn)
+        for number in range(2, 12):
+            directory.write(100 * number, "haptic_engine", "4 60 10000 2050 0\n")
+            directory.write(100 * number + 2, "activate", "1\n")
+        self.assertEqual(command("picture", directory.path).returncode, 0)
+        drawn = (directory.path / "run.svg").read_text("utf-8")
+        self.assertNotIn(">packet 1700 overdrive 30%<", drawn)
+        self.assertGreater(drawn.count(">packet 2050<"), 5)
+
     def test_of_an_empty_run_is_drawn(self):
         self.assertEqual(command("picture", Directory(self).path).returncode, 0)
 
