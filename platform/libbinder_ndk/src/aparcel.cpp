@@ -5,7 +5,7 @@
 #include <unistd.h>
 
 #include <algorithm>
-#include <memory>
+#include <utility>
 
 #include <android/binder_parcel.h>
 #include <android/binder_parcel_platform.h>
@@ -196,8 +196,9 @@ binder_status_t AParcel_writeStatusHeader(AParcel* parcel, const AStatus* status
 }
 
 binder_status_t AParcel_readStatusHeader(const AParcel* parcel, AStatus** status) {
-    auto read = std::make_unique<AStatus>();
-    const binder_status_t result = knownStatus(readStatusHeader(**parcel, read.get()));
-    if (result == STATUS_OK) *status = read.release();
-    return result;
+    AStatus read;
+    const binder_status_t result = knownStatus(readStatusHeader(**parcel, &read));
+    if (result != STATUS_OK) return result;
+    *status = read.exception == EX_NONE ? AStatus_newOk() : new AStatus(std::move(read));
+    return STATUS_OK;
 }

@@ -43,6 +43,22 @@ bool isLowSurrogate(char32_t unit) {
     return (unit & 0xfffffc00) == 0xdc00;
 }
 
+// How much of the beginning is ASCII, which is nearly every string as a whole: a word at a time, where
+// decoding goes character by character. At most a word less than all of it.
+template <typename Unit>
+size_t asciiLength(std::basic_string_view<Unit> text) {
+    static_assert(sizeof(Unit) <= 2);
+    constexpr uint64_t kOther = sizeof(Unit) == 1 ? 0x8080808080808080 : 0xff80ff80ff80ff80;
+    constexpr size_t kUnits = sizeof(uint64_t) / sizeof(Unit);
+    size_t length = 0;
+    for (; text.size() - length >= kUnits; length += kUnits) {
+        uint64_t word = 0;
+        std::memcpy(&word, text.data() + length, sizeof word);
+        if ((word & kOther) != 0) break;
+    }
+    return length;
+}
+
 // Calls `visit` with each code point; surrogates without a partner are left out.
 template <typename Visitor>
 void forEachCodePoint(std::u16string_view utf16, Visitor visit) {
@@ -64,8 +80,10 @@ size_t encodedLength(char32_t code) {
 }  // namespace
 
 ptrdiff_t utf16Length(std::string_view utf8) {
+    const size_t ascii = asciiLength(utf8);
+    utf8.remove_prefix(ascii);
     if (wholeLength(utf8) != utf8.size()) return -1;
-    ptrdiff_t units = 0;
+    auto units = static_cast<ptrdiff_t>(ascii);
     for (size_t at = 0; at < utf8.size();) {
         const size_t length = sequenceLength(utf8[at]);
         units += decode(utf8.substr(at, length)) < kFirstSupplementary ? 1 : 2;
@@ -80,6 +98,9 @@ void utf8ToUtf16(std::string_view utf8, uint8_t* to) {
         std::memcpy(to, &narrow, sizeof narrow);
         to += sizeof narrow;
     };
+    const size_t ascii = asciiLength(utf8);
+    for (size_t at = 0; at < ascii; ++at) put(static_cast<uint8_t>(utf8[at]));
+    utf8.remove_prefix(ascii);
     for (size_t at = 0; at < utf8.size();) {
         const size_t length = sequenceLength(utf8[at]);
         const char32_t code = decode(utf8.substr(at, length));
@@ -101,12 +122,16 @@ std::u16string utf8ToUtf16Lossy(std::string_view utf8) {
 }
 
 size_t utf8Length(std::u16string_view utf16) {
-    size_t bytes = 0;
+    size_t bytes = asciiLength(utf16);
+    utf16.remove_prefix(bytes);
     forEachCodePoint(utf16, [&](char32_t code) { bytes += encodedLength(code); });
     return bytes;
 }
 
 void utf16ToUtf8(std::u16string_view utf16, char* to) {
+    const size_t ascii = asciiLength(utf16);
+    for (size_t at = 0; at < ascii; ++at) *to++ = static_cast<char>(utf16[at]);
+    utf16.remove_prefix(ascii);
     static constexpr char32_t kLeadMarks[] = {0, 0, 0xc0, 0xe0, 0xf0};
     forEachCodePoint(utf16, [&to](char32_t code) {
         const size_t length = encodedLength(code);

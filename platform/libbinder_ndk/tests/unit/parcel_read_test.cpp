@@ -106,6 +106,16 @@ TEST_F(ParcelRead, StringsComeBack) {
     EXPECT_EQ(std::nullopt, maybe);
 }
 
+TEST_F(ParcelRead, OtherCharactersMayComeBehindAnyNumberOfAscii) {
+    const AParcel* const parcel = received({6, 0x00620061, 0x00640063, 0x00e40065, 0,  // "abcdeä"
+                                            5, 0x00620061, 0x00640063, 0x00000080});
+    std::string text;
+    EXPECT_EQ(STATUS_OK, ndk::AParcel_readString(parcel, &text));
+    EXPECT_EQ("abcde\xc3\xa4", text);
+    EXPECT_EQ(STATUS_OK, ndk::AParcel_readString(parcel, &text));
+    EXPECT_EQ("abcd\xc2\x80", text);
+}
+
 TEST_F(ParcelRead, SurrogatePairsAreJoinedAndLoneOnesDropped) {
     const AParcel* const parcel = received({5, 0xde00d83d, 0x0061d83d, 0x0000dc00, 1, 0x0000d800});
     std::string text;
