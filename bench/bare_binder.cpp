@@ -4,8 +4,10 @@
 #include <fcntl.h>
 #include <sys/ioctl.h>
 #include <sys/mman.h>
+#include <unistd.h>
 
 #include <array>
+#include <cerrno>
 #include <cstddef>
 #include <cstring>
 #include <utility>
@@ -41,12 +43,15 @@ bool exchange(int fd, void* bytes, size_t size, const Take& take) {
 
 }  // namespace
 
-BareClient::BareClient(int fd, uint32_t handle, uint32_t code, std::vector<uint8_t> data)
-    : mFd(fd), mData(std::move(data)) {
+BareClient::BareClient(int fd, uint32_t handle, uint32_t code, std::vector<uint8_t> data,
+                       std::vector<binder_size_t> offsets)
+    : mFd(fd), mData(std::move(data)), mOffsets(std::move(offsets)) {
     mOut.transaction.target.handle = handle;
     mOut.transaction.code = code;
     mOut.transaction.data_size = mData.size();
     mOut.transaction.data.ptr.buffer = reinterpret_cast<binder_uintptr_t>(mData.data());
+    mOut.transaction.offsets_size = mOffsets.size() * sizeof(binder_size_t);
+    mOut.transaction.data.ptr.offsets = reinterpret_cast<binder_uintptr_t>(mOffsets.data());
 }
 
 bool BareClient::call() {
@@ -83,7 +88,11 @@ void serveBare(int fd, const std::function<size_t(uint32_t code)>& work) {
     static uint8_t zeros[4096];
     out.reply.data.ptr.buffer = reinterpret_cast<binder_uintptr_t>(zeros);
     int32_t unused = 0;
-    if (ioctl(fd, BINDER_SET_CONTEXT_MGR, &unused) != 0) return;
+    // The last one may not be forgotten yet.
+    while (ioctl(fd, BINDER_SET_CONTEXT_MGR, &unused) != 0) {
+        if (errno != EBUSY) return;
+        usleep(1000);
+    }
     const auto take = [&](uint32_t command, const uint8_t* payload) {
         if (command != BR_TRANSACTION) return false;
         binder_transaction_data request;

@@ -15,8 +15,10 @@ namespace bench {
 // A client's calls: one ioctl each, the last reply's buffer freed with the next request.
 class BareClient {
   public:
-    // Takes the open driver `fd`, which stays the caller's, and a handle known there.
-    BareClient(int fd, uint32_t handle, uint32_t code, std::vector<uint8_t> data);
+    // Takes the open driver `fd`, which stays the caller's, a handle known there, and a request: its
+    // bytes and where in them objects stand.
+    BareClient(int fd, uint32_t handle, uint32_t code, std::vector<uint8_t> data,
+               std::vector<binder_size_t> offsets = {});
 
     // False when the call failed.
     bool call();
@@ -31,6 +33,7 @@ class BareClient {
 
     int mFd;
     std::vector<uint8_t> mData;
+    std::vector<binder_size_t> mOffsets;
     Out mOut;
 };
 

@@ -9,6 +9,7 @@
 #include <linux/input.h>
 #include <spawn.h>
 #include <sys/ioctl.h>
+#include <sys/mman.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -114,6 +115,9 @@ class Player {
     int mMotor = -1;
 };
 
+// How often memory was taken from the heap since this was last set to 0.
+size_t heapUses = 0;
+
 // Log lines are written, as on a phone, but nobody has to read them.
 void discardLog() {
     const int nowhere = open("/dev/null", O_WRONLY);
@@ -126,6 +130,24 @@ struct EffectCalls {
     CallCounts shipped;
     CallCounts quiet;
     CallCounts bare;
+    size_t quietHeap;  // takings of memory
+};
+
+// A number that a process and its forks share.
+class SharedCount {
+  public:
+    SharedCount()
+        : mCount(static_cast<size_t*>(mmap(nullptr, sizeof(size_t), PROT_READ | PROT_WRITE,
+                                           MAP_SHARED | MAP_ANONYMOUS, -1, 0))) {
+        if (mCount == MAP_FAILED) abort();
+    }
+    ~SharedCount() { munmap(mCount, sizeof(size_t)); }
+    SharedCount(const SharedCount&) = delete;
+    SharedCount& operator=(const SharedCount&) = delete;
+    size_t& operator*() const { return *mCount; }
+
+  private:
+    size_t* const mCount;
 };
 
 std::optional<EffectCalls> countEffect(const Phone& phone, size_t effect,
@@ -142,19 +164,26 @@ std::optional<EffectCalls> countEffect(const Phone& phone, size_t effect,
     };
     const auto perform = [&] { player->perform(effect); };
     const auto performBare = [&] { player->performBare(effect); };
+    const SharedCount heap;
+    const auto performCounted = [&] {
+        heapUses = 0;
+        perform();
+        *heap = heapUses;
+    };
     const auto shipped = countCalls(prepare, perform, bench::joinThreads);
-    const auto quiet = countCalls(prepareQuiet, perform, bench::joinThreads);
+    const auto quiet = countCalls(prepareQuiet, performCounted, bench::joinThreads);
     const auto bare = countCalls(prepare, performBare, bench::joinThreads);
     if (!shipped || !quiet || !bare) return std::nullopt;
-    return EffectCalls{*shipped, *quiet, *bare};
+    return EffectCalls{*shipped, *quiet, *bare, *heap};
 }
 
 bool printCalls(const std::string& directory) {
     fmt::print(
             "System calls of one perform(): those on the driver's nodes beside a bare loop that "
-            "makes the same,\nwhat else it takes with the log off, and what the log adds\n\n"
-            "{:<22}{:<14}{:>7}{:>7}{:>7}{:>7}{:>7}\n",
-            "phone", "effect", "nodes", "bare", "ratio", "else", "log");
+            "makes the same,\nwhat else it takes with the log off, what the log adds,\n"
+            "and how often it takes memory from the heap with the log off\n\n"
+            "{:<22}{:<14}{:>7}{:>7}{:>7}{:>7}{:>7}{:>7}\n",
+            "phone", "effect", "nodes", "bare", "ratio", "else", "log", "heap");
     std::map<std::string, int> others;
     for (const Phone& phone : effectPhones()) {
         for (size_t effect = 0; effect < std::size(kEffects); ++effect) {
@@ -166,10 +195,10 @@ bool printCalls(const std::string& directory) {
                            phone.files.name, kEffectNames[effect]);
                 return false;
             }
-            fmt::print("{:<22}{:<14}{:>7}{:>7}{:>7.2f}{:>7}{:>7}\n", phone.files.name,
+            fmt::print("{:<22}{:<14}{:>7}{:>7}{:>7.2f}{:>7}{:>7}{:>7}\n", phone.files.name,
                        kEffectNames[effect], calls->quiet.node, calls->bare.node,
                        1.0 * calls->quiet.node / calls->bare.node, calls->quiet.otherTotal(),
-                       calls->shipped.total() - calls->quiet.total());
+                       calls->shipped.total() - calls->quiet.total(), calls->quietHeap);
             if (!calls->quiet.other.empty()) others = calls->quiet.other;
         }
     }
@@ -273,6 +302,20 @@ bool printInstructions(const std::string& directory) {
 }
 
 }  // namespace
+
+// In place of the C++ library's, for everything in this program.
+void* operator new(size_t size) {
+    ++heapUses;
+    void* const memory = malloc(size);
+    if (memory == nullptr) abort();
+    return memory;
+}
+void operator delete(void* memory) noexcept {
+    free(memory);
+}
+void operator delete(void* memory, size_t /*size*/) noexcept {
+    free(memory);
+}
 
 int main(int argc, char** argv) {
     if (argc == 3 && std::string(argv[1]) == "--play") return playAll(argv[2]);

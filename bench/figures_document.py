@@ -8,14 +8,20 @@ PROJECT = pathlib.Path(__file__).resolve().parent.parent
 DOCUMENT = PROJECT / "docs" / "figures.md"
 
 
-def with_table(document, name, table):
-    """The document with `table` as the one of that name."""
+def table(name):
+    """The table of that name as it stands in the document."""
+    return re.search(rf"(?s)<!-- written: {re.escape(name)} -->\n```text\n(.*?)```",
+                     DOCUMENT.read_text("utf-8"))[1]
+
+
+def with_table(document, name, text):
+    """The document with `text` as the table of that name."""
     replaced, count = re.subn(rf"(?s)(<!-- written: {re.escape(name)} -->\n```text\n).*?```",
-                              lambda match: f"{match[1]}{table}```", document)
+                              lambda match: f"{match[1]}{text}```", document)
     if count != 1:
         raise ValueError(f"{DOCUMENT}: no table '{name}'")
     return replaced
 
 
-def write(name, table):
-    DOCUMENT.write_text(with_table(DOCUMENT.read_text("utf-8"), name, table), "utf-8")
+def write(name, text):
+    DOCUMENT.write_text(with_table(DOCUMENT.read_text("utf-8"), name, text), "utf-8")

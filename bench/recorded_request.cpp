@@ -35,7 +35,8 @@ using SystemCall = __ptrace_syscall_info;
 constexpr int kSystemCallStop = SIGTRAP | 0x80;  // PTRACE_O_TRACESYSGOOD
 
 bool isDriversFile(const std::string& path) {
-    return path.starts_with("/sys/") || path.starts_with("/dev/input/");
+    return path.starts_with("/sys/") || path.starts_with("/dev/input/") ||
+           path.starts_with("/proc/bus/input/") || path.starts_with("/efs/");
 }
 
 // Reads the service's system calls out of its stops.
