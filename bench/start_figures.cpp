@@ -80,6 +80,7 @@ class Waiting {
             if (!handset::becomeWhatLaunchAsks(launch) || ::read(go.get(), &byte, 1) != 1) return;
             dup2(output.get(), STDOUT_FILENO);
             std::vector<char*> arguments;
+            arguments.reserve(words.size() + 1);
             for (const std::string& word : words)
                 arguments.push_back(const_cast<char*>(word.c_str()));
             arguments.push_back(nullptr);
