@@ -82,6 +82,12 @@ TEST_F(Dump, NamesEveryPerformMethod) {
     EXPECT_THAT(dump(*makeVibrator(), 0).second, HasSubstr("\nperform method: prebaked index\n"));
 }
 
+TEST_F(Dump, TakesNoListedFeatureForAnother) {
+    kernel.addNode(kInfo + "functions", "INTENSITY\n", fake::Access::kReadOnly);
+    EXPECT_THAT(dump(*makeVibrator(), 0).second,
+                HasSubstr("\ncapabilities:\nfeatures: INTENSITY\n"));
+}
+
 TEST_F(Dump, LogsAndWritesNothing) {
     const auto vibrator = makeVibrator();
     dump(*vibrator, 0);
