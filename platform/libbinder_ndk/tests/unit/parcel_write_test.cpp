@@ -69,8 +69,8 @@ TEST_F(ParcelWrite, OtherCharactersMayComeBehindAnyNumberOfAscii) {
     EXPECT_EQ(STATUS_OK, AParcel_writeString(parcel(), "abcdefg\xc3\xa4x", 10));
     EXPECT_EQ(STATUS_BAD_VALUE, AParcel_writeString(parcel(), "abcdefgh\xc3", 9));
     EXPECT_THAT(written(),
-                ElementsAre(9U, 0x00620061U, 0x00640063U, 0x00660065U, 0x00680067U, 0x000000e4U,
-                            9U, 0x00620061U, 0x00640063U, 0x00660065U, 0x00e40067U, 0x00000078U));
+                ElementsAre(9U, 0x00620061U, 0x00640063U, 0x00660065U, 0x00680067U, 0x000000e4U, 9U,
+                            0x00620061U, 0x00640063U, 0x00660065U, 0x00e40067U, 0x00000078U));
 }
 
 TEST_F(ParcelWrite, SupplementaryCharactersBecomeSurrogatePairs) {
