@@ -18,8 +18,8 @@
 #include <fmt/format.h>
 #include <nlohmann/json.hpp>
 
+#include "handset/common/control_client.h"
 #include "handset/driver/printable.h"
-#include "handset/phone/control_client.h"
 #include "handset/phone/fault_arguments.h"
 #include "handset/phone/phone_state.h"
 #include "handset/phone/phone_up.h"

@@ -10,8 +10,8 @@
 #include <android-base/file.h>
 #include <fmt/format.h>
 
+#include "handset/common/control_client.h"
 #include "handset/phone/commands.h"
-#include "handset/phone/control_client.h"
 #include "handset/phone/listing.h"
 #include "handset/phone/phone_state.h"
 #include "handset/phone/phone_up.h"

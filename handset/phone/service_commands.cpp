@@ -8,8 +8,8 @@
 #include <fmt/format.h>
 #include <nlohmann/json.hpp>
 
+#include "handset/common/control_client.h"
 #include "handset/phone/commands.h"
-#include "handset/phone/control_client.h"
 #include "handset/phone/phone_state.h"
 #include "handset/phone/phone_up.h"
 #include "handset/phone/process.h"

@@ -2,17 +2,20 @@
 #include "tests/soak/journal_check.h"
 
 #include <algorithm>
+#include <cinttypes>
+#include <cstdio>
 #include <deque>
-#include <sstream>
+#include <fstream>
+#include <string_view>
+#include <unordered_map>
 
 #include <fmt/format.h>
+#include <nlohmann/json.hpp>
 
 #include "tests/support/journal_words.h"
 
 namespace qvx::test {
 namespace {
-
-using nlohmann::json;
 
 constexpr int32_t kIllegalState = -5;
 
@@ -20,7 +23,7 @@ constexpr int32_t kIllegalState = -5;
 struct Line {
     int64_t us;
     int pid;
-    std::string words;
+    std::string_view words;
     bool failed;
 };
 
@@ -33,25 +36,30 @@ struct Awaited {
     bool isAnswered() const { return asked->end > 0 && asked->answer.status == 0; }
 };
 
-std::vector<Line> linesOf(const std::string& journal) {
+// What a line says from "op" on. The same comes again and again, and parsing costs much in the guest.
+const std::string& wordsOf(const std::string& line) {
+    static std::unordered_map<std::string, std::string> known;
+    const auto [entry, isNew] = known.try_emplace(line.substr(line.find("\"op\"")));
+    if (isNew) entry->second = inWords(nlohmann::json::parse("{" + entry->first, nullptr, false));
+    return entry->second;
+}
+
+std::vector<Line> linesOf(const std::string& path) {
     std::vector<Line> lines;
-    std::istringstream stream(journal);
-    for (std::string text; std::getline(stream, text);) {
-        // Most lines are of these, and parsing costs much in the guest.
+    std::ifstream journal(path);
+    for (std::string text; std::getline(journal, text);) {
         const bool looks = text.find("\"op\":\"open\"") != std::string::npos ||
                            text.find("\"op\":\"read\"") != std::string::npos;
         if (text.find("\"op\":\"close\"") != std::string::npos ||
             (looks && text.find("\":\"E") == std::string::npos)) {
             continue;
         }
-        const json line = json::parse(text, nullptr, false);
-        const std::string op = line.value("op", "");
-        std::string words = inWords(line);
+        const std::string& words = wordsOf(text);
         // An effect is erased before the next one, if there is one. What is interrupted comes again.
-        if (op == "erase" || words.ends_with(" = EINTR")) continue;
-        const bool failed = words.find(" = ") != std::string::npos;
-        lines.push_back(
-                {line.value("us", int64_t{0}), line.value("pid", 0), std::move(words), failed});
+        if (words.starts_with("erase ") || words.ends_with(" = EINTR")) continue;
+        Line line{0, 0, words, words.find(" = ") != std::string::npos};
+        std::sscanf(text.c_str(), R"({"n":%*d,"us":%)" SCNd64 R"(,"pid":%d)", &line.us, &line.pid);
+        lines.push_back(line);
     }
     return lines;
 }
@@ -107,9 +115,8 @@ class Matcher {
         for (const std::string& expected : awaited.lines) {
             const Line* line = mAt + count < mLines.size() ? &mLines[mAt + count] : nullptr;
             if (line == nullptr || line->pid != mLines[mAt].pid) return isAnswered ? 0 : count;
-            if (isAnswered && (line->us < awaited.asked->begin || line->us > awaited.asked->end)) {
-                return 0;
-            }
+            const bool isLate = isAnswered && line->us > awaited.asked->end;
+            if (isLate || line->us < awaited.asked->begin) return 0;
             ++count;
             if (isFailureOf(*line, expected)) {
                 const bool isDecisive = count <= awaited.request->decisive;

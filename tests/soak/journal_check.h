@@ -11,14 +11,12 @@
 #include <string>
 #include <vector>
 
-#include <nlohmann/json.hpp>
-
 #include "tests/soak/user.h"
 
 namespace qvx::test {
 
 // What is wrong: answers that are not the ones of the table, lines nobody asked for, and answers that
-// the driver never saw the cause of. `journal` is what "phone journal" prints.
+// the driver never saw the cause of. `journal` is its file.
 std::vector<std::string> disagreements(const std::vector<const User*>& users,
                                        std::span<const Request> table, const std::string& journal);
 

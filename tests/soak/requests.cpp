@@ -65,14 +65,14 @@ class Counter : public BnVibratorCallback {
     {"alwaysOn", [](Client& c, int n) { return answerOf(c.standard().alwaysOnEnable(n, Effect::CLICK, EffectStrength::LIGHT)); }, {0, -7}, ""}, \
     {"extension amplitude 0", [](Client& c, int) { return answerOf(c.extension().setAmplitude(0)); }, {0, -3}, "", true}, \
     {"340 packets", [](Client& c, int) { return answerOf(c.extension().performHapticEngine(std::vector<ZelHapticEnginePacket>(340), 1)); }, {0, -3}, "", true}, \
-    {"no token", [](Client&, int) { return Client::sendRaw(3, RequestBytes()); }, {-2147483647}, ""}, \
-    {"noise", [](Client&, int n) { return Client::sendRaw(4, RequestBytes().bytes(static_cast<size_t>(n), 0xa5)); }, {-2147483647}, ""}, \
-    {"unknown code", [](Client&, int n) { return Client::sendRaw(1000U + static_cast<uint32_t>(n), token()); }, {-74}, ""}, \
-    {"null array", [](Client&, int) { return Client::sendRaw(12, token().int32(-1).nullBinder()); }, {-12}, ""}, \
-    {"array beyond memory", [](Client&, int) { return Client::sendRaw(12, token().int32(0x7fffffff)); }, {-61}, ""}, \
-    {"missing integer", [](Client&, int) { return Client::sendRaw(3, token()); }, {-61}, ""}, \
-    {"silent callback", [](Client&, int n) { return Client::sendRaw(3, token().int32(n).binder(1, 0x3f000001)); }, {0, -7}, ""}, \
-    {"long tail", [](Client&, int) { return Client::sendRaw(7, token().int32(1).bytes(200000, 0xa5)); }, {}, ""}
+    {"no token", [](Client& c, int) { return c.sendRaw(3, RequestBytes()); }, {-2147483647}, ""}, \
+    {"noise", [](Client& c, int n) { return c.sendRaw(4, RequestBytes().bytes(static_cast<size_t>(n), 0xa5)); }, {-2147483647}, ""}, \
+    {"unknown code", [](Client& c, int n) { return c.sendRaw(1000U + static_cast<uint32_t>(n), token()); }, {-74}, ""}, \
+    {"null array", [](Client& c, int) { return c.sendRaw(12, token().int32(-1).nullBinder()); }, {-12}, ""}, \
+    {"array beyond memory", [](Client& c, int) { return c.sendRaw(12, token().int32(0x7fffffff)); }, {-61}, ""}, \
+    {"missing integer", [](Client& c, int) { return c.sendRaw(3, token()); }, {-61}, ""}, \
+    {"silent callback", [](Client& c, int n) { return c.sendRaw(3, token().int32(n).binder(1, 0x3f000001)); }, {0, -7}, ""}, \
+    {"long tail", [](Client& c, int) { return c.sendRaw(7, token().int32(1).bytes(200000, 0xa5)); }, {}, ""}
 
 #define ANSWERED_EVERYWHERE \
     {"getCapabilities", [](Client& c, int) { return get<&IVibrator::getCapabilities, IVibrator, int32_t>(c.standard()); }, {0, 0, 60}, ""}, \
@@ -131,15 +131,14 @@ bool Client::connect() {
     }
     mStandard = IVibrator::fromBinder(binder);
     mExtension = IZelVibrator::fromBinder(extension);
-    return mStandard != nullptr && mExtension != nullptr;
+    mRaw = std::make_unique<RawBinder>();
+    mRawService = mRaw->checkService(kService);
+    return mStandard != nullptr && mExtension != nullptr && mRawService;
 }
 
-// A connection for each request: what a request leaves behind in the driver goes with it.
 Answer Client::sendRaw(uint32_t code, const RequestBytes& request) {
-    RawBinder binder;
-    const auto service = binder.checkService(kService);
-    if (!service) return {kDead};
-    const RawReply reply = binder.transact(*service, code, request);
+    if (!mRawService) return {kDead};
+    const RawReply reply = mRaw->transact(*mRawService, code, request);
     switch (reply.kind) {
         case RawReply::Kind::kData:
             return {0, reply.word(0)};

@@ -5,6 +5,7 @@
 
 #include <cstdint>
 #include <memory>
+#include <optional>
 #include <span>
 #include <string>
 #include <string_view>
@@ -33,14 +34,15 @@ constexpr int32_t kDead = -32;  // the transport's status when the service has d
 // A user's way to the service: a client's, and one past the binder library.
 class Client {
   public:
-    // Finds the service; false while it cannot be found or does not answer.
+    // Finds the service; false while it cannot be found or does not answer. What earlier requests
+    // left behind in the binder driver goes with the connection that they were made by.
     bool connect();
 
     aidl::android::hardware::vibrator::IVibrator& standard() { return *mStandard; }
     aidl::vendor::quorvan::hardware::vibrator::IZelVibrator& extension() { return *mExtension; }
 
     // Sends bytes of a request's own making to the standard service.
-    static Answer sendRaw(uint32_t code, const handset::RequestBytes& request);
+    Answer sendRaw(uint32_t code, const handset::RequestBytes& request);
 
     // A callback that counts. It is told of each composition that is answered with ok.
     std::shared_ptr<aidl::android::hardware::vibrator::IVibratorCallback> callback();
@@ -50,6 +52,8 @@ class Client {
     std::shared_ptr<aidl::android::hardware::vibrator::IVibrator> mStandard;
     std::shared_ptr<aidl::vendor::quorvan::hardware::vibrator::IZelVibrator> mExtension;
     std::shared_ptr<aidl::android::hardware::vibrator::IVibratorCallback> mCallback;
+    std::unique_ptr<handset::RawBinder> mRaw;
+    std::optional<uint32_t> mRawService;
 };
 
 // A kind of request. Each takes a number from 1 to 999, which tells one from another.

@@ -11,6 +11,9 @@
 #include <chrono>
 #include <cstdio>
 #include <filesystem>
+#include <fstream>
+#include <functional>
+#include <map>
 #include <memory>
 #include <random>
 #include <thread>
@@ -18,6 +21,9 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include "handset/common/control_client.h"
+#include "handset/common/raw_binder.h"
+#include "handset/phone/phone_state.h"
 #include "tests/soak/footprint.h"
 #include "tests/soak/journal_check.h"
 #include "tests/soak/user.h"
@@ -37,9 +43,15 @@ using std::chrono::milliseconds;
 using std::chrono::seconds;
 
 constexpr uid_t kUsers[] = {kRoot, kSystem, kShell, kApp};
-constexpr seconds kLongestRound{120};
-constexpr int kRoundsPerManager = 3;
+constexpr const char* kService = "android.hardware.vibrator.IVibrator/default";
+constexpr const char* kSanitizerReports = "/run/soak";
+constexpr size_t kRequestsPerRound = std::size(kUsers) * User::kPerRound;
+constexpr int kFaultsPerRound = 20;
+constexpr int kDeathsPerRound = 2;
+constexpr int kRoundsPerManager = 4;
 constexpr int kFewestRounds = 3;
+constexpr seconds kLongestRound{120};
+constexpr seconds kReportPeriod{30};
 
 long environmentOr(const char* name, long otherwise) {
     const char* const text = getenv(name);
@@ -70,8 +82,32 @@ std::vector<json> faultsOf(const std::string& profile) {
             {{"node", node("intensity")}, {"op", "write"}, {"errno", "EIO"}, {"times", 2}}};
 }
 
+// Of the driver or of the phone's supervisor, past the phone tool: to start a program costs the guest
+// more than what it does.
+void demand(const char* socket, const std::string& request) {
+    const auto answer = handset::askDriver(socket, request);
+    EXPECT_TRUE(answer.ok()) << request << ": " << answer.error();
+}
+
+json phoneState() {
+    std::ifstream file(handset::kStateFile);
+    return json::parse(file, nullptr, false);
+}
+
 class Soak : public testing::TestWithParam<const char*> {
   protected:
+    void SetUp() override {
+        std::filesystem::create_directory(kSanitizerReports);
+        std::filesystem::permissions(kSanitizerReports, std::filesystem::perms::all);
+    }
+
+    // Whom a sanitizer has something to say of, that one ends with it.
+    void TearDown() override {
+        for (const auto& report : std::filesystem::directory_iterator(kSanitizerReports)) {
+            ADD_FAILURE() << std::ifstream(report.path()).rdbuf();
+        }
+    }
+
     // A service manager in the place of the one that was killed; init's work, and there is none here.
     void replaceManager() {
         kill(mManagerPid, SIGKILL);
@@ -84,13 +120,13 @@ class Soak : public testing::TestWithParam<const char*> {
         ++mManagerDeaths;
     }
 
-    // The service, and with it the service manager if asked for; both are there again.
+    // The service, and with it the service manager if asked for; both are started again at once.
     void killService(bool withManager) {
-        runCommand({"phone", "fault", "--clear"});
+        demand(handset::kControlSocket, "clear");
         if (withManager) replaceManager();
-        runCommand({"phone", "service", "kill"});
-        const CommandResult start = runCommand({"phone", "service", "restart"});
-        EXPECT_EQ(start.status, 0) << start.out << start.err;
+        demand(handset::kSupervisorSocket, "service kill");
+        // Refused where the supervisor has been quicker, or the service's end was the manager's.
+        (void)handset::askDriver(handset::kSupervisorSocket, "service start");
         ++mServiceDeaths;
         if (!withManager) return;
         // A client's way to a manager that has died is lost for good, as on a phone.
@@ -99,37 +135,34 @@ class Soak : public testing::TestWithParam<const char*> {
 
     // One round: everybody asks, and in the meantime one thing after another goes wrong, each after
     // so many requests.
-    void playRound(const Phone& phone, int round) {
-        constexpr size_t kAll = std::size(kUsers) * User::kPerRound;
-        constexpr size_t kBetweenFaults = kAll / 8;
-        const size_t deathOfAUser = mChance() % kAll;
-        const size_t deathOfTheService = mChance() % kAll;
-        const std::vector<json> faults = faultsOf(GetParam());
-        size_t nextFault = 0;
-        bool userIsDue = true;
-        bool serviceIsDue = true;
+    void playRound(int round) {
+        std::multimap<size_t, std::function<void()>> due;
+        for (int i = 0; i < kFaultsPerRound; ++i) {
+            due.emplace(mChance() % kRequestsPerRound, [this] {
+                const std::vector<json> faults = faultsOf(GetParam());
+                demand(handset::kControlSocket,
+                       "fault " + faults[mChance() % faults.size()].dump());
+                ++mFaults;
+            });
+        }
+        for (int i = 0; i < kDeathsPerRound; ++i) {
+            due.emplace(mChance() % kRequestsPerRound, [this] {
+                mUsers[mChance() % mUsers.size()]->replace();
+                ++mUserDeaths;
+            });
+            const bool withManager = i == 0 && round % kRoundsPerManager == 0;
+            due.emplace(mChance() % kRequestsPerRound, [=, this] { killService(withManager); });
+        }
         const auto end = Clock::now() + kLongestRound;
         for (const auto& user : mUsers) user->begin();
-        while (!areDone() || userIsDue || serviceIsDue) {
+        while (!areDone() || !due.empty()) {
             ASSERT_LT(Clock::now(), end) << "a user is not answered";
-            const size_t asked = countAsked();
-            if (asked >= nextFault) {
-                phone.fault(faults[mChance() % faults.size()]);
-                nextFault += kBetweenFaults;
-                ++mFaults;
-            }
-            if (userIsDue && asked >= deathOfAUser) {
-                mUsers[mChance() % mUsers.size()]->replace();
-                userIsDue = false;
-                ++mUserDeaths;
-            }
-            if (serviceIsDue && asked >= deathOfTheService) {
-                killService(round % kRoundsPerManager == 0);
-                serviceIsDue = false;
+            while (!due.empty() && due.begin()->first <= countAsked()) {
+                due.extract(due.begin()).mapped()();
             }
             std::this_thread::sleep_for(milliseconds(5));
         }
-        runCommand({"phone", "fault", "--clear"});
+        demand(handset::kControlSocket, "clear");
     }
 
     size_t countAsked() const {
@@ -144,19 +177,30 @@ class Soak : public testing::TestWithParam<const char*> {
     }
 
     void checkRound(const Phone& phone, std::span<const Request> table) {
+        eventually([] { return handset::RawBinder().checkService(kService).has_value(); });
+        const json state = phoneState();
+        const int service = state["service"];
+        const std::string out = state["out"];
+        EXPECT_EQ(state["starts"], 1 + mServiceDeaths) << "it died by itself: " << phone.log();
         std::vector<const User*> users;
         for (const auto& user : mUsers) {
             users.push_back(user.get());
             EXPECT_EQ(user->untold(), 0) << "compositions of user " << user->uid();
             mRequests += User::kPerRound;
         }
-        EXPECT_THAT(disagreements(users, table, runCommand({"phone", "journal"}).out), IsEmpty());
+        EXPECT_THAT(disagreements(users, table, out + "/journal.jsonl"), IsEmpty());
         EXPECT_THAT(mKernel.next(), IsEmpty());
-        phone.reset();
-        eventually([&] { return entriesOf(phone.servicePid(), "task").size() == 1; });
-        mSamples.push_back(footprintOf({{"service", phone.servicePid()},
-                                        {"manager", mManagerPid},
-                                        {"driver", mDriverPid}}));
+        demand(handset::kControlSocket, "reset");
+        EXPECT_EQ(truncate((out + "/service.log").c_str(), 0), 0);
+        eventually([&] { return entriesOf(service, "task").size() == 1; });
+        mSamples.push_back(footprintOf(
+                {{"service", service}, {"manager", mManagerPid}, {"driver", state["driver"]}}));
+    }
+
+    void report() const {
+        std::printf("%s: %zu requests; killed: service %d, manager %d, users %d; faults %d\n",
+                    GetParam(), mRequests, mServiceDeaths, mManagerDeaths, mUserDeaths, mFaults);
+        std::fflush(stdout);
     }
 
     std::vector<std::unique_ptr<User>> mUsers;
@@ -165,7 +209,6 @@ class Soak : public testing::TestWithParam<const char*> {
     std::minstd_rand mChance{static_cast<unsigned>(environmentOr("SOAK_SEED", 1))};
     std::unique_ptr<Process> mManager;
     pid_t mManagerPid = 0;
-    pid_t mDriverPid = 0;
     size_t mRequests = 0;
     int mUserDeaths = 0;
     int mServiceDeaths = 0;
@@ -177,24 +220,23 @@ TEST_P(Soak, EveryAnswerAgreesWithTheJournalAndNothingGrows) {
     const ExpectBinderComplaints provoked;  // mKernel looks at each of them
     const Phone phone(GetParam());
     ASSERT_EQ(phone.up().status, 0) << phone.up().out << phone.up().err;
-    const json status = json::parse(runCommand({"phone", "status", "--json"}).out);
-    mManagerPid = status["manager"];
-    mDriverPid = status["driver"];
+    mManagerPid = phoneState()["manager"];
     phone.reset();
 
     const std::span<const Request> table = requestsOf(GetParam());
     for (const uid_t uid : kUsers) mUsers.push_back(std::make_unique<User>(uid, table));
     const auto end = Clock::now() + seconds(environmentOr("SOAK_SECONDS", 20));
+    auto nextReport = Clock::now();
     for (int round = 1; (round <= kFewestRounds || Clock::now() < end) && !HasFailure(); ++round) {
-        playRound(phone, round);
+        playRound(round);
         if (!HasFatalFailure()) checkRound(phone, table);
+        if (Clock::now() < nextReport) continue;
+        report();
+        nextReport = Clock::now() + kReportPeriod;
     }
     mUsers.clear();
     EXPECT_THAT(growthOver(mSamples), IsEmpty());
-    std::printf(
-            "%s: %zu requests by %zu users; killed: service %d, manager %d, users %d; faults %d\n",
-            GetParam(), mRequests, std::size(kUsers), mServiceDeaths, mManagerDeaths, mUserDeaths,
-            mFaults);
+    report();
 }
 
 INSTANTIATE_TEST_SUITE_P(Phones, Soak, testing::Values("leds", "ff"),

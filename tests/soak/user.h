@@ -34,7 +34,7 @@ int64_t monotonicUs();
 
 class User {
   public:
-    static constexpr size_t kPerRound = 60;
+    static constexpr size_t kPerRound = 500;
 
     // Starts at once, and then waits for a round. The table outlives the user.
     User(uid_t uid, std::span<const Request> table);

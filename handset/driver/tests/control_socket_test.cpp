@@ -16,8 +16,8 @@
 
 #include <gtest/gtest.h>
 
+#include "handset/common/control_client.h"
 #include "handset/driver/tests/test_files.h"
-#include "handset/phone/control_client.h"
 
 namespace handset {
 namespace {

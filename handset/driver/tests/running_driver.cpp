@@ -8,7 +8,7 @@
 #include <regex>
 #include <sstream>
 
-#include "handset/phone/control_client.h"
+#include "handset/common/control_client.h"
 
 namespace handset {
 namespace {

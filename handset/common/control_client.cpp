@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 //
 // Asking the running driver for something.
-#include "handset/phone/control_client.h"
+#include "handset/common/control_client.h"
 
 #include <sys/socket.h>
 #include <sys/time.h>
