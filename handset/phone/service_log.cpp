@@ -61,10 +61,10 @@ Result<ServiceLog> ServiceLog::create(const std::string& path) {
 }
 
 void ServiceLog::drain() {
-    std::string part(kLongestWrite, '\0');
+    mPart.resize(kLongestWrite);
     while (true) {
         alignas(cmsghdr) std::array<char, CMSG_SPACE(sizeof(timespec))> control;
-        iovec where{part.data(), part.size()};
+        iovec where{mPart.data(), mPart.size()};
         msghdr message{};
         message.msg_iov = &where;
         message.msg_iovlen = 1;
@@ -72,7 +72,7 @@ void ServiceLog::drain() {
         message.msg_controllen = control.size();
         const ssize_t size = recvmsg(mReader.get(), &message, MSG_DONTWAIT);
         if (size < 0) return;
-        take({part.data(), static_cast<size_t>(size)}, timeOf(message));
+        take({mPart.data(), static_cast<size_t>(size)}, timeOf(message));
     }
 }
 

@@ -38,6 +38,7 @@ class ServiceLog {
     android::base::unique_fd mReader;
     android::base::unique_fd mWriter;
     android::base::unique_fd mFile;
+    std::string mPart;      // what is read at once
     std::string mLine;      // a line without its end yet
     int64_t mLineTime = 0;  // of its beginning
 };

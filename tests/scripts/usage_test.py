@@ -61,14 +61,15 @@ class WrongUsage(unittest.TestCase):
                  "tests/mutation/run: argument FILE: 'README.md' is no source of the service; it "
                  "takes files below hal-server/vibrator/aidl/default and --mutants N, --jobs N, "
                  "--help"),
-                (["tests/soak/run"], "tests/soak/run: no minutes given; it takes MINUTES, --attack, "
-                                     "--arch amd64 or arm64, --smp N and --service asan"),
+                (["tests/soak/run"],
+                 "tests/soak/run: no minutes given; it takes MINUTES, --attack, "
+                 "--arch amd64 or arm64, --smp N and --service asan or tsan"),
                 (["tests/soak/run", "1", "2"],
                  "tests/soak/run: minutes given twice, '1' and '2'; it takes MINUTES, --attack, "
-                 "--arch amd64 or arm64, --smp N and --service asan"),
+                 "--arch amd64 or arm64, --smp N and --service asan or tsan"),
                 (["tests/soak/run", "1", "--arch", "mips"],
                  "tests/soak/run: wrong argument '--arch'; it takes MINUTES, --attack, "
-                 "--arch amd64 or arm64, --smp N and --service asan"),
+                 "--arch amd64 or arm64, --smp N and --service asan or tsan"),
                 (["scripts/install-packages", "-y"],
                  "install-packages: wrong arguments '-y'; it takes none or --all")):
             with self.subTest(words=words):

@@ -16,7 +16,7 @@
 namespace qvx::test {
 namespace {
 
-// What the address sanitizer keeps of what is freed.
+// What the sanitizers keep of what is freed.
 constexpr long kKibNoise = 256;
 constexpr long kSanitizedKibNoise = 65536;
 constexpr long kCountNoise = 4;
@@ -53,7 +53,7 @@ long noiseOf(const std::string& name) {
     if (!name.ends_with("KiB")) return kCountNoise;
     const char* const service = getenv("PHONE_SERVICE");
     const bool isSanitized =
-            service != nullptr && std::string(service).find("/asan/") != std::string::npos;
+            service != nullptr && std::string(service).find("san/") != std::string::npos;
     return isSanitized ? kSanitizedKibNoise : kKibNoise;
 }
 

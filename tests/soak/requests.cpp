@@ -56,33 +56,34 @@ class Counter : public BnVibratorCallback {
     std::atomic<int> calls = 0;
 };
 
-// What is refused whatever the phone, by a client of good manners and by others.
+// What is the same whatever the phone, by a client of good manners and by others; the first kQuiet
+// of them cost no look at the driver and little else.
 // clang-format off
-#define REFUSED_EVERYWHERE \
+#define QUIET_EVERYWHERE \
     {"compose of eleven", [](Client& c, int) { return answerOf(c.standard().compose(clicks(11, 0), nullptr)); }, {0, -3}, ""}, \
     {"composePwle", [](Client& c, int) { return answerOf(c.standard().composePwle({}, nullptr)); }, {0, -3}, ""}, \
-    {"amplitude 7", [](Client& c, int) { return answerOf(c.standard().setAmplitude(7.0F)); }, {0, -3}, ""}, \
     {"alwaysOn", [](Client& c, int n) { return answerOf(c.standard().alwaysOnEnable(n, Effect::CLICK, EffectStrength::LIGHT)); }, {0, -7}, ""}, \
     {"extension amplitude 0", [](Client& c, int) { return answerOf(c.extension().setAmplitude(0)); }, {0, -3}, "", true}, \
-    {"340 packets", [](Client& c, int) { return answerOf(c.extension().performHapticEngine(std::vector<ZelHapticEnginePacket>(340), 1)); }, {0, -3}, "", true}, \
+    {"getCompositionDelayMax", [](Client& c, int) { return get<&IVibrator::getCompositionDelayMax, IVibrator, int32_t>(c.standard()); }, {0, 0, 1000}, ""}, \
     {"no token", [](Client& c, int) { return c.sendRaw(3, RequestBytes()); }, {-2147483647}, ""}, \
     {"noise", [](Client& c, int n) { return c.sendRaw(4, RequestBytes().bytes(static_cast<size_t>(n), 0xa5)); }, {-2147483647}, ""}, \
     {"unknown code", [](Client& c, int n) { return c.sendRaw(1000U + static_cast<uint32_t>(n), token()); }, {-74}, ""}, \
     {"null array", [](Client& c, int) { return c.sendRaw(12, token().int32(-1).nullBinder()); }, {-12}, ""}, \
     {"array beyond memory", [](Client& c, int) { return c.sendRaw(12, token().int32(0x7fffffff)); }, {-61}, ""}, \
     {"missing integer", [](Client& c, int) { return c.sendRaw(3, token()); }, {-61}, ""}, \
-    {"silent callback", [](Client& c, int n) { return c.sendRaw(3, token().int32(n).binder(1, 0x3f000001)); }, {0, -7}, ""}, \
-    {"long tail", [](Client& c, int) { return c.sendRaw(7, token().int32(1).bytes(200000, 0xa5)); }, {}, ""}
+    {"silent callback", [](Client& c, int n) { return c.sendRaw(3, token().int32(n).binder(1, 0x3f000001)); }, {0, -7}, ""}
 
-#define ANSWERED_EVERYWHERE \
+#define THE_SAME_EVERYWHERE \
+    {"340 packets", [](Client& c, int) { return answerOf(c.extension().performHapticEngine(std::vector<ZelHapticEnginePacket>(340), 1)); }, {0, -3}, "", true}, \
+    {"amplitude 7", [](Client& c, int) { return answerOf(c.standard().setAmplitude(7.0F)); }, {0, -3}, ""}, \
+    {"long tail", [](Client& c, int) { return c.sendRaw(7, token().int32(1).bytes(200000, 0xa5)); }, {}, ""}, \
     {"getCapabilities", [](Client& c, int) { return get<&IVibrator::getCapabilities, IVibrator, int32_t>(c.standard()); }, {0, 0, 60}, ""}, \
-    {"getCompositionDelayMax", [](Client& c, int) { return get<&IVibrator::getCompositionDelayMax, IVibrator, int32_t>(c.standard()); }, {0, 0, 1000}, ""}, \
     {"supportsAmplitudeControl", [](Client& c, int) { return get<&IZelVibrator::supportsAmplitudeControl, IZelVibrator, bool>(c.extension()); }, {0, 0, 1}, "", true}, \
     {"posture", [](Client& c, int) { return answerOf(c.extension().setFolderStatus(ZelFolderStatus::CLOSED)); }, {}, "write event_cmd FOLDER_CLOSE\n", true}
 
 constexpr Request kLeds[] = {
-    REFUSED_EVERYWHERE,
-    ANSWERED_EVERYWHERE,
+    QUIET_EVERYWHERE,
+    THE_SAME_EVERYWHERE,
     {"on", [](Client& c, int n) { return answerOf(c.standard().on(n, nullptr)); }, {},
      "write state 1\n|write duration {}\n|write activate 1\n"},
     {"off", [](Client& c, int) { return answerOf(c.standard().off()); }, {}, "write activate 0\n"},
@@ -106,8 +107,8 @@ constexpr Request kLeds[] = {
 
 // Each plays a stored effect: whether a plain vibration is uploaded depends on what was before.
 constexpr Request kForceFeedback[] = {
-    REFUSED_EVERYWHERE,
-    ANSWERED_EVERYWHERE,
+    QUIET_EVERYWHERE,
+    THE_SAME_EVERYWHERE,
     {"perform", [](Client& c, int) { int32_t ms = 0; const auto s = c.standard().perform(Effect::CLICK, EffectStrength::STRONG, nullptr, &ms); return answerOf(s, ms); }, {0, 0, 60},
      "event 96 10000|upload 0 00000a00|event 0 1"},
     {"setAmplitude", [](Client& c, int) { return answerOf(c.standard().setAmplitude(0.5F)); }, {}, "event 96 5000"},

@@ -70,6 +70,9 @@ struct Request {
 // The lines of the journal that the request makes.
 std::vector<std::string> journalOf(const Request& request, int number);
 
+// So many of a table's requests, its first, leave the driver alone.
+constexpr size_t kQuiet = 12;
+
 // Of a phone with the built-in profile "leds", and of one with "ff".
 std::span<const Request> requestsOf(const std::string& profile);
 

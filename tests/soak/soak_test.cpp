@@ -35,6 +35,7 @@
 namespace qvx::test {
 namespace {
 
+using handset::RawBinder;
 using nlohmann::json;
 using testing::IsEmpty;
 
@@ -50,6 +51,7 @@ constexpr int kFaultsPerRound = 20;
 constexpr int kDeathsPerRound = 2;
 constexpr int kRoundsPerManager = 4;
 constexpr int kFewestRounds = 3;
+constexpr milliseconds kPause{20};
 constexpr seconds kLongestRound{120};
 constexpr seconds kReportPeriod{30};
 
@@ -120,7 +122,7 @@ class Soak : public testing::TestWithParam<const char*> {
         ++mManagerDeaths;
     }
 
-    // The service, and with it the service manager if asked for; both are started again at once.
+    // The service, and with it the service manager if asked for; both are there again.
     void killService(bool withManager) {
         demand(handset::kControlSocket, "clear");
         if (withManager) replaceManager();
@@ -128,6 +130,8 @@ class Soak : public testing::TestWithParam<const char*> {
         // Refused where the supervisor has been quicker, or the service's end was the manager's.
         (void)handset::askDriver(handset::kSupervisorSocket, "service start");
         ++mServiceDeaths;
+        // What it looks at when it starts does not fail.
+        EXPECT_TRUE(eventually([] { return RawBinder().checkService(kService).has_value(); }));
         if (!withManager) return;
         // A client's way to a manager that has died is lost for good, as on a phone.
         for (const auto& user : mUsers) user->replace();
@@ -160,7 +164,7 @@ class Soak : public testing::TestWithParam<const char*> {
             while (!due.empty() && due.begin()->first <= countAsked()) {
                 due.extract(due.begin()).mapped()();
             }
-            std::this_thread::sleep_for(milliseconds(5));
+            std::this_thread::sleep_for(kPause);
         }
         demand(handset::kControlSocket, "clear");
     }
@@ -177,7 +181,6 @@ class Soak : public testing::TestWithParam<const char*> {
     }
 
     void checkRound(const Phone& phone, std::span<const Request> table) {
-        eventually([] { return handset::RawBinder().checkService(kService).has_value(); });
         const json state = phoneState();
         const int service = state["service"];
         const std::string out = state["out"];
