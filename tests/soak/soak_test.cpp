@@ -112,10 +112,10 @@ class Soak : public testing::TestWithParam<const char*> {
 
     // A service manager in the place of the one that was killed; init's work, and there is none here.
     void replaceManager() {
+        const auto manager =
+                std::filesystem::read_symlink("/proc/" + std::to_string(mManagerPid) + "/exe");
         kill(mManagerPid, SIGKILL);
         mManager.reset();
-        const auto manager =
-                std::filesystem::read_symlink("/proc/self/exe").parent_path() / "servicemanager";
         const Program program{{manager, "--rules", QVX_SERVICE_RULES}, "/dev/null", true};
         mManager = std::make_unique<Process>(kRoot, program);
         mManagerPid = mManager->pid();
