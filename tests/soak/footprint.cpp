@@ -7,6 +7,7 @@
 
 #include <algorithm>
 #include <fstream>
+#include <optional>
 #include <regex>
 
 #include <fmt/format.h>
@@ -35,15 +36,16 @@ void addBinderTotals(Footprint* footprint) {
     }
 }
 
-long medianOf(const std::string& name, std::vector<Footprint>::const_iterator from,
-              std::vector<Footprint>::const_iterator to) {
+// Nothing where no sample has it.
+std::optional<long> medianOf(const std::string& name, std::vector<Footprint>::const_iterator from,
+                             std::vector<Footprint>::const_iterator to) {
     std::vector<long> values;
     for (; from != to; ++from) {
         if (const auto found = from->find(name); found != from->end()) {
             values.push_back(found->second);
         }
     }
-    if (values.empty()) return 0;
+    if (values.empty()) return std::nullopt;
     const auto middle = values.begin() + static_cast<ptrdiff_t>(values.size() / 2);
     std::nth_element(values.begin(), middle, values.end());
     return *middle;
@@ -75,10 +77,10 @@ std::vector<std::string> growthOver(const std::vector<Footprint>& samples) {
     if (samples.size() < 3) return {"too few samples to compare"};
     const auto tenth = static_cast<ptrdiff_t>(std::max<size_t>(1, samples.size() / 10));
     for (const auto& [name, ignored] : samples.back()) {
-        const long first = medianOf(name, samples.begin() + 1, samples.begin() + 1 + tenth);
-        const long last = medianOf(name, samples.end() - tenth, samples.end());
-        if (last <= first + noiseOf(name)) continue;
-        grown.push_back(fmt::format("{}: {}, then {}", name, first, last));
+        const auto first = medianOf(name, samples.begin() + 1, samples.begin() + 1 + tenth);
+        const auto last = medianOf(name, samples.end() - tenth, samples.end());
+        if (!first || !last || *last <= *first + noiseOf(name)) continue;
+        grown.push_back(fmt::format("{}: {}, then {}", name, *first, *last));
     }
     return grown;
 }

@@ -17,7 +17,8 @@ using Footprint = std::map<std::string, long>;
 Footprint footprintOf(const std::map<std::string, pid_t>& processes);
 
 // What has grown from the first tenth to the last by more than what is noise, in words. The first
-// sample is left out: until then memory is had for the first time.
+// sample is left out: until then memory is had for the first time. What either tenth lacks is not
+// compared.
 std::vector<std::string> growthOver(const std::vector<Footprint>& samples);
 
 // The kernel's records since the last call, or since the object was made: those that no death of a
