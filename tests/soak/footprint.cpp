@@ -99,7 +99,8 @@ std::vector<std::string> KernelComplaints::next() const {
     static const std::regex kDeath(
             "callbacks suppressed|binder_linux: (undelivered |release .* still active|send failed "
             "reply for transaction|"
-            ".*(reply target not found|cannot find target node|no vma|vma cleared|failed "
+            ".*(dead process or thread|reply target not found|cannot find target node|no vma|vma "
+            "cleared|failed "
             ".*/29189/|failed "
             ".*/29201/-28))");
     static const std::regex kTrouble("binder|BUG|WARNING|Oops|Call Trace|hung|Out of memory");
