@@ -30,9 +30,7 @@ namespace {
 using handset::RawBinder;
 using handset::RequestBytes;
 using std::chrono::milliseconds;
-using std::chrono::seconds;
 
-constexpr const char* kService = "android.hardware.vibrator.IVibrator/default";
 constexpr const char* kManager = "android.os.IServiceManager";
 constexpr uint32_t kExtension = 0x5f455854;  // '_EXT'
 constexpr uint32_t kVintf = 0x3f000001;
@@ -144,7 +142,6 @@ void pingForEver(Pings* pings) {
 }
 
 TEST(Attack, OfEveryKindAtOnceLeavesAnotherClientItsAnswers) {
-    const char* const given = getenv("SOAK_SECONDS");
     const ExpectBinderComplaints provoked;  // KernelComplaints looks at each of them
     const KernelComplaints kernel;
     const Phone phone("ff");
@@ -159,7 +156,7 @@ TEST(Attack, OfEveryKindAtOnceLeavesAnotherClientItsAnswers) {
                     std::make_unique<Process>(attack.uid, [&] { attackForEver(attack); }));
         }
         const Process honest(2000, [&] { pingForEver(pings); });
-        std::this_thread::sleep_for(seconds(given == nullptr ? 10 : atol(given)));
+        std::this_thread::sleep_for(soakTime(10));
     }
     const size_t count = pings->count;
     ASSERT_GT(count, 10U);

@@ -18,7 +18,6 @@ using handset::RawBinder;
 using handset::RawReply;
 using handset::RequestBytes;
 
-constexpr const char* kService = "android.hardware.vibrator.IVibrator/default";
 constexpr int32_t kFailedTransaction = -2147483646;
 
 Answer answerOf(const ndk::ScopedAStatus& status, int64_t value = 0) {

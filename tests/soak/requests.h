@@ -29,6 +29,7 @@ struct Answer {
     bool operator==(const Answer&) const = default;
 };
 
+constexpr const char* kService = "android.hardware.vibrator.IVibrator/default";
 constexpr int32_t kDead = -32;  // the transport's status when the service has died
 
 // A user's way to the service: a client's, and one past the binder library.

@@ -4,7 +4,7 @@
 // is killed, the driver fails now and then, and the service and the service manager are killed: every
 // answer agrees with what the driver saw, and nothing grows.
 //
-// SOAK_SECONDS says for how long (for each kind of phone), SOAK_SEED repeats the order of events.
+// SOAK_SECONDS says for how long (for each kind of phone).
 #include <signal.h>
 #include <unistd.h>
 
@@ -44,7 +44,6 @@ using std::chrono::milliseconds;
 using std::chrono::seconds;
 
 constexpr uid_t kUsers[] = {kRoot, kSystem, kShell, kApp};
-constexpr const char* kService = "android.hardware.vibrator.IVibrator/default";
 constexpr const char* kSanitizerReports = "/run/soak";
 constexpr size_t kRequestsPerRound = std::size(kUsers) * User::kPerRound;
 constexpr int kFaultsPerRound = 20;
@@ -56,33 +55,25 @@ constexpr milliseconds kPause{20};
 constexpr seconds kLongestRound{120};
 constexpr seconds kReportPeriod{30};
 
-long environmentOr(const char* name, long otherwise) {
-    const char* const text = getenv(name);
-    return text == nullptr ? otherwise : atol(text);
-}
-
 // Faults that a profile's driver shows for a few calls. None is on what probing looks at, so that the
 // service finds the same driver whenever it starts.
-std::vector<json> faultsOf(const std::string& profile) {
-    if (profile == "ff") {
-        return {{{"node", "motor"}, {"op", "upload"}, {"errno", "EIO"}, {"times", 2}},
-                {{"node", "motor"}, {"op", "upload"}, {"errno", "ENOSPC"}, {"times", 1}},
-                {{"node", "motor"}, {"op", "upload"}, {"delay", 20}, {"times", 3}},
-                {{"node", "motor"}, {"op", "write"}, {"errno", "EIO"}, {"times", 1}}};
-    }
-    const auto node = [](const char* name) {
-        return std::string("/sys/class/leds/vibrator/") + name;
-    };
-    return {{{"node", node("duration")}, {"op", "write"}, {"errno", "EIO"}, {"times", 2}},
-            {{"node", node("duration")}, {"op", "write"}, {"delay", 20}, {"times", 3}},
-            {{"node", node("activate")}, {"op", "write"}, {"short", 1}, {"times", 1}},
-            {{"node", node("state")}, {"op", "open"}, {"errno", "EACCES"}, {"times", 1}},
-            {{"node", node("cp_trigger_queue")}, {"op", "write"}, {"errno", "EINTR"}, {"times", 3}},
-            {{"node", node("cp_trigger_index")},
-             {"op", "write"},
-             {"errno", "ENODEV"},
-             {"times", 2}},
-            {{"node", node("intensity")}, {"op", "write"}, {"errno", "EIO"}, {"times", 2}}};
+std::span<const char* const> faultsOf(const std::string& profile) {
+    static constexpr const char* kForceFeedback[] = {
+            R"({"node":"motor","op":"upload","errno":"EIO","times":2})",
+            R"({"node":"motor","op":"upload","errno":"ENOSPC","times":1})",
+            R"({"node":"motor","op":"upload","delay":20,"times":3})",
+            R"({"node":"motor","op":"write","errno":"EIO","times":1})"};
+#define NODE R"({"node":"/sys/class/leds/vibrator/)"
+    static constexpr const char* kLeds[] = {
+            NODE R"(duration","op":"write","errno":"EIO","times":2})",
+            NODE R"(duration","op":"write","delay":20,"times":3})",
+            NODE R"(activate","op":"write","short":1,"times":1})",
+            NODE R"(state","op":"open","errno":"EACCES","times":1})",
+            NODE R"(cp_trigger_queue","op":"write","errno":"EINTR","times":3})",
+            NODE R"(cp_trigger_index","op":"write","errno":"ENODEV","times":2})",
+            NODE R"(intensity","op":"write","errno":"EIO","times":2})"};
+    if (profile == "ff") return kForceFeedback;
+    return kLeds;
 }
 
 // Of the driver or of the phone's supervisor, past the phone tool: to start a program costs the guest
@@ -111,7 +102,7 @@ class Soak : public testing::TestWithParam<const char*> {
         }
     }
 
-    // A service manager in the place of the one that was killed; init's work, and there is none here.
+    // The manager's death, and another one in its place; that is init's work, and there is none here.
     void replaceManager() {
         const auto manager =
                 std::filesystem::read_symlink("/proc/" + std::to_string(mManagerPid) + "/exe");
@@ -146,8 +137,9 @@ class Soak : public testing::TestWithParam<const char*> {
             for (int i = 0; i < times; ++i) due.emplace(mChance() % kRequestsPerRound, event);
         };
         plan(kFaultsPerRound, [this] {
-            const std::vector<json> faults = faultsOf(GetParam());
-            demand(handset::kControlSocket, "fault " + faults[mChance() % faults.size()].dump());
+            const auto faults = faultsOf(GetParam());
+            demand(handset::kControlSocket,
+                   std::string("fault ") + faults[mChance() % faults.size()]);
             ++mFaults;
         });
         plan(kUserDeathsPerRound, [this] {
@@ -218,7 +210,7 @@ class Soak : public testing::TestWithParam<const char*> {
     std::vector<std::unique_ptr<User>> mUsers;
     std::vector<Footprint> mSamples;
     const KernelComplaints mKernel;
-    std::minstd_rand mChance{static_cast<unsigned>(environmentOr("SOAK_SEED", 1))};
+    std::minstd_rand mChance{static_cast<unsigned>(getpid())};
     std::unique_ptr<Process> mManager;
     pid_t mManagerPid = 0;
     size_t mRequests = 0;
@@ -237,7 +229,7 @@ TEST_P(Soak, EveryAnswerAgreesWithTheJournalAndNothingGrows) {
 
     const std::span<const Request> table = requestsOf(GetParam());
     for (const uid_t uid : kUsers) mUsers.push_back(std::make_unique<User>(uid, table));
-    const auto end = Clock::now() + seconds(environmentOr("SOAK_SECONDS", 20));
+    const auto end = Clock::now() + soakTime(20);
     auto nextReport = Clock::now();
     for (int round = 0; (round < kFewestRounds || Clock::now() < end) && !HasFailure(); ++round) {
         playRound(round);

@@ -7,6 +7,7 @@
 #include <unistd.h>
 
 #include <chrono>
+#include <cstdlib>
 #include <new>
 #include <random>
 #include <thread>
@@ -26,6 +27,11 @@ int64_t monotonicUs() {
     timespec now{};
     clock_gettime(CLOCK_MONOTONIC, &now);
     return int64_t{now.tv_sec} * 1000000 + now.tv_nsec / 1000;
+}
+
+std::chrono::seconds soakTime(long otherwise) {
+    const char* const given = getenv("SOAK_SECONDS");
+    return std::chrono::seconds(given == nullptr ? otherwise : atol(given));
 }
 
 void User::Unmap::operator()(Log* log) const {

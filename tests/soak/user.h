@@ -9,6 +9,7 @@
 
 #include <array>
 #include <atomic>
+#include <chrono>
 #include <cstdint>
 #include <memory>
 #include <optional>
@@ -31,6 +32,9 @@ struct Asked {
 };
 
 int64_t monotonicUs();
+
+// How long a test is to go on: what SOAK_SECONDS says.
+std::chrono::seconds soakTime(long otherwise);
 
 class User {
   public:
