@@ -187,7 +187,7 @@ class Client(BuildFiles):
                     if quote == '"':
                         self.assertTrue(header.startswith("vibctl/"))
                     elif "/" in header or header == "tinyxml2.h":
-                        self.assertRegex(header, rf"^(sys/|{libraries})")
+                        self.assertRegex(header, rf"^(sys/|linux/|{libraries})")
 
     def test_interfaces_that_it_includes_come_from_its_libraries(self):
         packages = {"android.hardware.vibrator-V2-ndk_platform": "android/hardware/vibrator",
