@@ -44,12 +44,15 @@ ExpectBinderComplaints::~ExpectBinderComplaints() {
 std::vector<std::string> binderComplaints() {
     std::vector<std::string> complaints;
     bool expected = false;
+    bool isFirst = true;
     for (const std::string& line : android::base::Split(readKernelLog(), "\n")) {
-        if (line.find("complaints expected from here") != std::string::npos) expected = true;
-        if (line.find("complaints expected up to here") != std::string::npos) {
-            // The log has room for so much: the first marker may be gone.
-            if (!expected) complaints.clear();
-            expected = false;
+        const bool begins = line.find("complaints expected from here") != std::string::npos;
+        const bool ends = line.find("complaints expected up to here") != std::string::npos;
+        // The log has room for so much: of the first pair of markers the one in front may be gone.
+        if (ends && isFirst) complaints.clear();
+        if (begins || ends) {
+            expected = begins;
+            isFirst = false;
         }
         if (!expected && line.find("binder") != std::string::npos) complaints.push_back(line);
     }
