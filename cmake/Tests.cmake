@@ -63,12 +63,6 @@ if(NOT TARGET test_headers)
         <functional> <map> <optional> <string> <vector>)
 endif()
 
-# A program's sources are compiled six at a time, in half the time: most of it goes into what they
-# share, so their unnamed namespaces must not declare the same name.
-function(qvx_compile_together name)
-    set_target_properties(${name} PROPERTIES UNITY_BUILD ON UNITY_BUILD_BATCH_SIZE 6)
-endfunction()
-
 function(qvx_add_unit_test name)
     cmake_parse_arguments(PARSE_ARGV 1 arg "" "" "SOURCES;LIBRARIES;HEADERS")
     add_executable(${name} ${arg_SOURCES})

@@ -47,10 +47,8 @@ struct Argument<ZelPlaybackPacket> {
 
 namespace {
 
-constexpr Traits kMilliseconds{.show = Show::kMilliseconds};
-
 // clang-format off
-constexpr Method kMethods[] = {
+constexpr Method kExtensionMethods[] = {
         row<&IZelVibrator::supportsAmplitudeControl>("supportsAmplitudeControl"),
         row<&IZelVibrator::supportsForceTouchAmplitudeControl>("supportsForceTouchAmplitudeControl"),
         row<&IZelVibrator::supportsFrequencyControl>("supportsFrequencyControl"),
@@ -85,7 +83,7 @@ constexpr Method kMethods[] = {
 }  // namespace
 
 std::span<const Method> extensionMethods() {
-    return kMethods;
+    return kExtensionMethods;
 }
 
 }  // namespace vibctl

@@ -37,6 +37,8 @@ struct Traits {
     bool awaitsCompletion = false;  // a callback given with the call will hear onComplete()
 };
 
+inline constexpr Traits kMilliseconds{.show = Show::kMilliseconds};
+
 // A method. Parameters stand on the command line in the order of declaration, but for a list of
 // packets, which always comes last and takes all remaining words.
 struct Method {

@@ -59,7 +59,7 @@ constexpr NamedNumber kStatuses[] = {
         {STATUS_UNEXPECTED_NULL, "STATUS_UNEXPECTED_NULL"},
 };
 
-constexpr NamedNumber kCapabilities[] = {
+constexpr NamedNumber kCapabilityNames[] = {
         {IVibrator::CAP_ON_CALLBACK, "ON_CALLBACK"},
         {IVibrator::CAP_PERFORM_CALLBACK, "PERFORM_CALLBACK"},
         {IVibrator::CAP_AMPLITUDE_CONTROL, "AMPLITUDE_CONTROL"},
@@ -84,7 +84,7 @@ std::string nameIn(const NamedNumber (&table)[count], int32_t number) {
 std::string capabilitiesText(int32_t capabilities) {
     std::string names;
     auto rest = static_cast<uint32_t>(capabilities);
-    for (const auto& [bit, name] : kCapabilities) {
+    for (const auto& [bit, name] : kCapabilityNames) {
         if ((rest & static_cast<uint32_t>(bit)) == 0) continue;
         rest &= ~static_cast<uint32_t>(bit);
         names += fmt::format("{}{}", names.empty() ? "" : " ", name);

@@ -56,13 +56,12 @@ struct Argument<PrimitivePwle> {
 
 namespace {
 
-constexpr Traits kMilliseconds{.show = Show::kMilliseconds};
 constexpr Traits kHertz{.show = Show::kHertz};
 constexpr Traits kCapabilities{.show = Show::kCapabilities};
 constexpr Traits kComposition{.awaitsCompletion = true};
 
 // clang-format off
-constexpr Method kMethods[] = {
+constexpr Method kStandardMethods[] = {
         row<&IVibrator::getCapabilities>("getCapabilities", "", kCapabilities),
         row<&IVibrator::off>("off"),
         row<&IVibrator::on>("on", "TIMEOUT_MS"),
@@ -95,7 +94,7 @@ constexpr Method kMethods[] = {
 }  // namespace
 
 std::span<const Method> standardMethods() {
-    return kMethods;
+    return kStandardMethods;
 }
 
 }  // namespace vibctl

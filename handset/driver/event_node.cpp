@@ -14,6 +14,8 @@
 
 #include <fmt/format.h>
 
+#include "handset/driver/permission.h"
+
 namespace handset {
 namespace {
 
@@ -22,13 +24,7 @@ using android::base::Error;
 using android::base::Result;
 
 constexpr unsigned kEventLimit = 1024;
-constexpr uid_t kSystemUser = 1000;
 constexpr gid_t kInputGroup = 1004;
-
-bool exists(const std::string& path) {
-    struct stat attributes {};
-    return lstat(path.c_str(), &attributes) == 0;
-}
 
 // Makes the node by the number sysfs gives for the device: not every /dev is the kernel's own.
 Result<void> makeNode(unsigned event, const std::string& path) {
@@ -54,12 +50,12 @@ std::string eventNodePath(unsigned event) {
 
 Result<unsigned> chooseEvent(const MotorProfile& motor) {
     if (motor.event) {
-        if (!exists(eventNodePath(*motor.event))) return *motor.event;
+        if (access(eventNodePath(*motor.event).c_str(), F_OK) != 0) return *motor.event;
         return Error() << fmt::format("motor.event: {} exists already",
                                       eventNodePath(*motor.event));
     }
     for (unsigned event = 1; event < kEventLimit; ++event) {
-        if (!exists(eventNodePath(event))) return event;
+        if (access(eventNodePath(event).c_str(), F_OK) != 0) return event;
     }
     return Error() << "no free number below /dev/input";
 }
@@ -70,7 +66,7 @@ EventNode::~EventNode() {
 
 Result<void> EventNode::handOver(unsigned event) {
     const std::string path = eventNodePath(event);
-    if (!exists(path)) {
+    if (access(path.c_str(), F_OK) != 0) {
         if (auto done = makeNode(event, path); !done) return done;
         mMade = path;
     }

@@ -18,8 +18,6 @@ namespace {
 using android::base::ErrnoError;
 using android::base::Result;
 
-constexpr const char* kInputDevices = "/proc/bus/input/devices";
-
 constexpr std::string_view kKeyboard =
         "I: Bus=0011 Vendor=0001 Product=0001 Version=ab41\n"
         "N: Name=\"AT Translated Set 2 keyboard\"\n"

@@ -14,6 +14,8 @@
 
 namespace handset {
 
+inline constexpr const char* kInputDevices = "/proc/bus/input/devices";
+
 // The list's text: a keyboard, then the motor where the profile has one and it is `plugged` in, each
 // in the kernel's own layout; or the profile's own text with "{event}" filled in. `event` is the
 // number of the motor's /dev/input/eventN.

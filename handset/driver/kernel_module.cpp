@@ -21,6 +21,8 @@
 
 #include "handset/driver/event_node.h"
 #include "handset/driver/field_table.h"
+#include "handset/driver/input_devices.h"
+#include "handset/driver/permission.h"
 #include "handset/driver/printable.h"
 
 namespace handset {
@@ -32,9 +34,7 @@ using android::base::Result;
 
 constexpr const char* kModule = "qvx_vibrator";
 constexpr const char* kReport = "/dev/qvx_vibrator_report";
-constexpr const char* kInputDevices = "/proc/bus/input/devices";
 constexpr std::string_view kRoot = "/sys/class/";
-constexpr uid_t kSystemUser = 1000;
 constexpr size_t kLongestText = 4095;  // sysfs shows a page less a byte
 
 // Whether the string may stand in the module's parameters as it is.

@@ -46,15 +46,15 @@ constexpr uint32_t kMostCustomValues = 32768;
 
 constexpr std::chrono::seconds kInitTimeout{10};
 
-// A file that is open, and how often the motor had been unplugged when it was opened.
-struct OpenMotor {
-    Opener opener;
-    uint64_t unplugs;
-};
-
 }  // namespace
 
 struct MotorDevice::State {
+    // A file that is open, and how often the motor had been unplugged when it was opened.
+    struct OpenMotor {
+        Opener opener;
+        uint64_t unplugs;
+    };
+
     const MotorProfile& motor;
     FaultInjector& faults;
     Journal& journal;
@@ -67,24 +67,24 @@ struct MotorDevice::State {
 
 namespace {
 
-using State = MotorDevice::State;
+using MotorState = MotorDevice::State;
 
-State& stateOf(fuse_req_t request) {
-    return *static_cast<State*>(fuse_req_userdata(request));
+MotorState& motorStateOf(fuse_req_t request) {
+    return *static_cast<MotorState*>(fuse_req_userdata(request));
 }
 
 // True where the motor is gone, or is another one than the file's.
-bool isGone(State& state, const fuse_file_info* info) {
+bool isGone(MotorState& state, const fuse_file_info* info) {
     return state.faults.isUnplugged(kMotorNode) ||
            state.faults.unplugsOf(kMotorNode) != state.files.get(info->fh).unplugs;
 }
 
 void onInitDone(void* data) {
-    static_cast<State*>(data)->ready.release();
+    static_cast<MotorState*>(data)->ready.release();
 }
 
 void onOpen(fuse_req_t request, fuse_file_info* info) {
-    State& state = stateOf(request);
+    MotorState& state = motorStateOf(request);
     const Opener opener(request);
     const auto arrival = std::chrono::steady_clock::now();
     const uint64_t unplugs = state.faults.unplugsOf(kMotorNode);
@@ -96,13 +96,14 @@ void onOpen(fuse_req_t request, fuse_file_info* info) {
         fuse_reply_err(request, error);
         return;
     }
-    info->fh = state.files.add(std::make_unique<const OpenMotor>(OpenMotor{opener, unplugs}));
+    info->fh = state.files.add(
+            std::make_unique<const MotorState::OpenMotor>(MotorState::OpenMotor{opener, unplugs}));
     if (fuse_reply_open(request, info) == -ENOENT) state.files.remove(info->fh);
 }
 
 void onRelease(fuse_req_t request, fuse_file_info* info) {
-    State& state = stateOf(request);
-    if (const std::unique_ptr<const OpenMotor> file = state.files.remove(info->fh)) {
+    MotorState& state = motorStateOf(request);
+    if (const std::unique_ptr<const MotorState::OpenMotor> file = state.files.remove(info->fh)) {
         const Caller& caller = file->opener.caller();
         const std::lock_guard lock(state.slotsMutex);
         for (const int id : state.slots.eraseAllOf(info->fh)) {
@@ -116,7 +117,7 @@ void onRelease(fuse_req_t request, fuse_file_info* info) {
 
 // The motor sends no events: a reader waits until it is interrupted or the device is gone.
 void onRead(fuse_req_t request, size_t size, off_t, fuse_file_info* info) {
-    State& state = stateOf(request);
+    MotorState& state = motorStateOf(request);
     if (size < sizeof(input_event)) {
         fuse_reply_err(request, EINVAL);
     } else if (isGone(state, info)) {
@@ -130,13 +131,13 @@ void onRead(fuse_req_t request, size_t size, off_t, fuse_file_info* info) {
 }
 
 void onPoll(fuse_req_t request, fuse_file_info* info, fuse_pollhandle* handle) {
-    const bool gone = isGone(stateOf(request), info);
+    const bool gone = isGone(motorStateOf(request), info);
     fuse_reply_poll(request, gone ? POLLERR | POLLHUP : POLLOUT | POLLWRNORM);
     if (handle != nullptr) fuse_pollhandle_destroy(handle);
 }
 
 // Records the events of one write, each with how many of its bytes were taken.
-void recordEvents(State& state, const Caller& caller, std::string_view events, size_t taken,
+void recordEvents(MotorState& state, const Caller& caller, std::string_view events, size_t taken,
                   int error, const Strike& strike) {
     for (size_t at = 0; at < events.size(); at += sizeof(input_event)) {
         input_event event;
@@ -155,8 +156,8 @@ void recordEvents(State& state, const Caller& caller, std::string_view events, s
 }
 
 void onWrite(fuse_req_t request, const char* data, size_t size, off_t, fuse_file_info* info) {
-    State& state = stateOf(request);
-    const OpenMotor& file = state.files.get(info->fh);
+    MotorState& state = motorStateOf(request);
+    const MotorState::OpenMotor& file = state.files.get(info->fh);
     const Caller caller = file.opener.callerOf(request);
     if (size < sizeof(input_event)) {
         JournalFields line{{"op", "write"}, {"node", kMotorNode}};
@@ -201,7 +202,7 @@ void fetchUpload(fuse_req_t request, char* record, const ff_effect* known) {
 }
 
 // Whether the slots would take an upload: 0, or why not (negative).
-int checkUpload(State& state, uint64_t file, const ff_effect& effect) {
+int checkUpload(MotorState& state, uint64_t file, const ff_effect& effect) {
     const std::lock_guard lock(state.slotsMutex);
     return std::min(state.slots.check(file, effect), 0);
 }
@@ -209,7 +210,7 @@ int checkUpload(State& state, uint64_t file, const ff_effect& effect) {
 // Takes an upload unless it has failed already (`result` negative), notes it and answers.
 void finishUpload(fuse_req_t request, uint64_t file, const ff_effect& effect,
                   std::string_view custom, int result, const Strike& strike) {
-    State& state = stateOf(request);
+    MotorState& state = motorStateOf(request);
     {
         const std::lock_guard lock(state.slotsMutex);
         if (result == 0) result = state.slots.upload(file, effect);
@@ -228,7 +229,7 @@ void finishUpload(fuse_req_t request, uint64_t file, const ff_effect& effect,
 // are asked for only when the input core would have the driver fetch them.
 void onUpload(fuse_req_t request, char* record, const fuse_file_info* info, const void* buffer,
               size_t size) {
-    State& state = stateOf(request);
+    MotorState& state = motorStateOf(request);
     if (size < sizeof(ff_effect)) {
         fetchUpload(request, record, nullptr);
         return;
@@ -254,13 +255,13 @@ void onUpload(fuse_req_t request, char* record, const fuse_file_info* info, cons
 }
 
 void onErase(fuse_req_t request, int id, const fuse_file_info* info) {
-    State& state = stateOf(request);
+    MotorState& state = motorStateOf(request);
     int result = 0;
     {
         const std::lock_guard lock(state.slotsMutex);
         result = state.slots.checkErase(info->fh, id);
     }
-    const OpenMotor& file = state.files.get(info->fh);
+    const MotorState::OpenMotor& file = state.files.get(info->fh);
     const auto arrival = std::chrono::steady_clock::now();
     FaultAction fault;
     if (result == 0) {
@@ -283,7 +284,7 @@ void onErase(fuse_req_t request, int id, const fuse_file_info* info) {
 }
 
 void onQuery(fuse_req_t request, unsigned command, void* memory, size_t room) {
-    const std::optional<QueryAnswer> answer = answerQuery(stateOf(request).motor, command);
+    const std::optional<QueryAnswer> answer = answerQuery(motorStateOf(request).motor, command);
     if (!answer || answer->result < 0) {
         fuse_reply_err(request, answer ? -answer->result : EINVAL);
     } else if (room < answer->data.size()) {
@@ -304,7 +305,7 @@ bool isUploadOfAnotherSize(unsigned command) {
 void onIoctl(fuse_req_t request, int number, void* argument, fuse_file_info* info, unsigned flags,
              const void* input, size_t inputSize, size_t outputSize) {
     const auto command = static_cast<unsigned>(number);
-    if (isGone(stateOf(request), info)) {
+    if (isGone(motorStateOf(request), info)) {
         fuse_reply_err(request, ENODEV);
     } else if ((flags & FUSE_IOCTL_COMPAT) != 0) {
         fuse_reply_err(request, EINVAL);  // 32-bit clients have another layout
@@ -343,8 +344,8 @@ Result<std::unique_ptr<MotorDevice>> MotorDevice::start(const MotorProfile& moto
                                       strerror(errno));
     }
     std::unique_ptr<MotorDevice> started(new MotorDevice);
-    started->mState = std::unique_ptr<State>(new State{motor, faults, journal});
-    State& state = *started->mState;
+    started->mState = std::unique_ptr<MotorState>(new MotorState{motor, faults, journal});
+    MotorState& state = *started->mState;
 
     char name[] = "handset-driver";
     char* arguments[] = {name, nullptr};

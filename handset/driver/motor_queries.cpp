@@ -32,17 +32,17 @@ constexpr std::array kEventTypes = {
         EventType{EV_LED, LED_MAX}, EventType{EV_SND, SND_MAX}, EventType{EV_FF, FF_MAX},
 };
 
-struct State {
+struct StateQuery {
     unsigned number;
     unsigned largestCode;
 };
 
 // What is pressed, lit, heard or switched now: nothing, for every code there could be.
-constexpr std::array kStates = {
-        State{_IOC_NR(EVIOCGKEY(0)), KEY_MAX},
-        State{_IOC_NR(EVIOCGLED(0)), LED_MAX},
-        State{_IOC_NR(EVIOCGSND(0)), SND_MAX},
-        State{_IOC_NR(EVIOCGSW(0)), SW_MAX},
+constexpr std::array kStateQueries = {
+        StateQuery{_IOC_NR(EVIOCGKEY(0)), KEY_MAX},
+        StateQuery{_IOC_NR(EVIOCGLED(0)), LED_MAX},
+        StateQuery{_IOC_NR(EVIOCGSND(0)), SND_MAX},
+        StateQuery{_IOC_NR(EVIOCGSW(0)), SW_MAX},
 };
 
 // A bit map of whole longs for codes up to `largest`.
@@ -66,9 +66,10 @@ std::optional<std::string> eventBits(unsigned type) {
 }
 
 std::optional<std::string> presentState(unsigned number) {
-    const auto* known = std::find_if(kStates.begin(), kStates.end(),
-                                     [number](const State& one) { return one.number == number; });
-    if (known == kStates.end()) return std::nullopt;
+    const auto* known =
+            std::find_if(kStateQueries.begin(), kStateQueries.end(),
+                         [number](const StateQuery& one) { return one.number == number; });
+    if (known == kStateQueries.end()) return std::nullopt;
     return bitMap(known->largestCode, {});
 }
 

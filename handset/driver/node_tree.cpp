@@ -11,7 +11,6 @@ namespace {
 constexpr uint64_t kRootInode = 1;
 
 // The platform's system user owns the vibrator's nodes on a phone; init sees to that at boot.
-constexpr uid_t kSystemUser = 1000;
 
 mode_t modeOf(Access access) {
     switch (access) {

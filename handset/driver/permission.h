@@ -24,6 +24,9 @@ struct Credentials {
     std::vector<gid_t> groups;  // supplementary
 };
 
+// Whom the phone's nodes and files belong to: the user (and the group) "system".
+inline constexpr uid_t kSystemUser = 1000;
+
 // Permission bits, as access(2) has them.
 inline constexpr unsigned kMayRead = 4;
 inline constexpr unsigned kMayWrite = 2;

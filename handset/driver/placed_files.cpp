@@ -15,13 +15,14 @@
 #include <android-base/unique_fd.h>
 #include <fmt/format.h>
 
+#include "handset/driver/permission.h"
+
 namespace handset {
 namespace {
 
 using android::base::ErrnoError;
 using android::base::Result;
 
-constexpr uid_t kSystemUser = 1000;
 constexpr mode_t kFileMode = 0664;
 constexpr mode_t kDirectoryMode = 0775;
 

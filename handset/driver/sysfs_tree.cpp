@@ -23,7 +23,7 @@ constexpr double kForever = 86400.0;
 // What sysfs reports for every attribute, whatever its text.
 constexpr off_t kNodeSize = 4096;
 
-constexpr mode_t kDirectoryMode = 0755;
+constexpr mode_t kSysfsDirectoryMode = 0755;
 
 Credentials credentialsOf(fuse_req_t request) {
     const fuse_ctx* context = fuse_req_ctx(request);
@@ -39,7 +39,7 @@ struct stat statOf(const State& state, const TreeEntry& entry) {
     attributes.st_ino = entry.inode;
     attributes.st_atime = attributes.st_mtime = attributes.st_ctime = state.started;
     if (!entry.node) {
-        attributes.st_mode = S_IFDIR | kDirectoryMode;
+        attributes.st_mode = S_IFDIR | kSysfsDirectoryMode;
         attributes.st_nlink = 2;
         return attributes;
     }

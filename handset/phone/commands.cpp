@@ -33,9 +33,6 @@ namespace {
 using android::base::Result;
 using android::base::unique_fd;
 
-constexpr int kNotWell = 1;
-constexpr int kRefused = 2;
-
 // Sends a request to the driver of the phone that is up and prints its answer, if it has one.
 int request(const std::string& line) {
     if (!phoneThatIsUp()) return failWith(kRefused, kDownText);

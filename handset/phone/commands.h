@@ -12,6 +12,10 @@
 
 namespace handset {
 
+// The exit statuses of failures.
+inline constexpr int kNotWell = 1;  // the phone or its service is not as it was asked to be
+inline constexpr int kRefused = 2;  // nothing was changed
+
 inline constexpr const char* kDownText = "no phone is up; \"phone up\" starts one";
 
 // The phone that is up, or nothing.

@@ -15,22 +15,22 @@
 namespace handset {
 namespace {
 
-using Json = nlohmann::ordered_json;
+using OrderedJson = nlohmann::ordered_json;
 
 constexpr std::string_view kNodeRoot = "/sys/class/";
 constexpr int kFullGain = 10000;     // of this driver
 constexpr size_t kMostSamples = 16;  // of an upload that are shown
 
-std::string shown(const Json& value) {
-    return value.dump(-1, ' ', false, Json::error_handler_t::replace);
+std::string shown(const OrderedJson& value) {
+    return value.dump(-1, ' ', false, OrderedJson::error_handler_t::replace);
 }
 
 // A key's value as it stands in JSON; nothing where the key is absent.
-std::string shown(const Json& line, const char* key) {
+std::string shown(const OrderedJson& line, const char* key) {
     return line.contains(key) ? shown(line[key]) : "";
 }
 
-std::string nameOf(const Json& line) {
+std::string nameOf(const OrderedJson& line) {
     const std::string node = line.value("node", "");
     return node.starts_with(kNodeRoot) ? node.substr(kNodeRoot.size()) : node;
 }
@@ -48,7 +48,7 @@ std::string samplesOf(const std::string& hex) {
     return samples;
 }
 
-std::string effectOf(const Json& line) {
+std::string effectOf(const OrderedJson& line) {
     const int type = line.value("type", 0);
     const int waveform = line.value("waveform", 0);
     std::string kind = type == FF_PERIODIC && waveform == FF_CUSTOM ? "custom effect"
@@ -61,7 +61,7 @@ std::string effectOf(const Json& line) {
     return kind;
 }
 
-std::string eventOf(const Json& line) {
+std::string eventOf(const OrderedJson& line) {
     const int type = line.value("type", 0);
     const int code = line.value("code", 0);
     const int value = line.value("value", 0);
@@ -72,7 +72,7 @@ std::string eventOf(const Json& line) {
                       : fmt::format("play effect {}, value {}", code, value);
 }
 
-std::string detailsOf(const Json& line) {
+std::string detailsOf(const OrderedJson& line) {
     const std::string op = line.value("op", "");
     if (op == "open") return fmt::format("{} {}", nameOf(line), line.value("flags", ""));
     if (op == "read") return fmt::format("{} {}", nameOf(line), shown(line, "result"));
@@ -91,7 +91,7 @@ std::string detailsOf(const Json& line) {
 }
 
 // An error, or a count that is short of what was given.
-std::string failureOf(const Json& line) {
+std::string failureOf(const OrderedJson& line) {
     for (const char* key : {"result", "error"}) {
         if (line.contains(key) && line[key].is_string()) return " = " + line.value(key, "");
     }
@@ -101,7 +101,7 @@ std::string failureOf(const Json& line) {
 }
 
 // "[fault errno=EIO delay=5000 ms, took 5000.5 ms]"
-std::string faultOf(const Json& line) {
+std::string faultOf(const OrderedJson& line) {
     if (!line.contains("fault")) return "";
     std::string words;
     for (const auto& [key, value] : line["fault"].items()) {
@@ -117,7 +117,7 @@ ListingLine listed(int64_t us, std::string_view kind, std::string_view text) {
     return {us, fmt::format("{:<7} {}", kind, text)};
 }
 
-std::string answerOf(const Json& answer) {
+std::string answerOf(const OrderedJson& answer) {
     if (std::string text = answer.value("text", ""); !text.empty()) return text;
     if (answer.value("exception", 0) != 0) {
         return fmt::format("exception {} {}", answer.value("exception", 0),
@@ -131,7 +131,7 @@ std::string answerOf(const Json& answer) {
 }  // namespace
 
 std::vector<ListingLine> fromJournal(std::string_view line) {
-    const Json json = Json::parse(line, nullptr, false);
+    const OrderedJson json = OrderedJson::parse(line, nullptr, false);
     if (!json.is_object()) return {};
     try {
         return {listed(json.value("us", int64_t{0}), json.value("op", ""),
@@ -149,12 +149,12 @@ std::vector<ListingLine> fromLog(std::string_view line) {
 }
 
 std::vector<ListingLine> fromCalls(std::string_view line) {
-    const Json json = Json::parse(line, nullptr, false);
+    const OrderedJson json = OrderedJson::parse(line, nullptr, false);
     if (!json.is_object()) return {};
     try {
         const int64_t start = json.at("us");
         const auto words = json.at("call").get<std::vector<std::string>>();
-        const Json& answer = json.at("answer");
+        const OrderedJson& answer = json.at("answer");
         const int64_t took = answer.value("us", int64_t{0});
         const std::string name = fmt::format("{}", fmt::join(words, " "));
         return {listed(start, "call", name),

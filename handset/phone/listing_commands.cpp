@@ -19,8 +19,6 @@
 namespace handset {
 namespace {
 
-constexpr int kRefused = 2;
-
 // The files of the phone that is up or, with `out`, of one that was.
 PhoneState filesOf(const std::string& out) {
     PhoneState state = loadState().value_or(PhoneState());

@@ -19,8 +19,6 @@ namespace {
 using android::base::Result;
 using android::base::unique_fd;
 
-using Json = nlohmann::json;
-
 bool isSameFile(int fd, const char* path) {
     struct stat held {};
     struct stat there {};
@@ -31,21 +29,21 @@ bool isSameFile(int fd, const char* path) {
 }  // namespace
 
 Result<void> saveState(const PhoneState& state) {
-    Json json{{"profile", state.profile},       {"out", state.out},
-              {"supervisor", state.supervisor}, {"driver", state.driver},
-              {"manager", state.manager},       {"service", state.service},
-              {"registered", state.registered}, {"made", state.made},
-              {"stopped", state.stopped},       {"starts", state.starts},
-              {"restart_at", state.restartAt}};
+    nlohmann::json json{{"profile", state.profile},       {"out", state.out},
+                        {"supervisor", state.supervisor}, {"driver", state.driver},
+                        {"manager", state.manager},       {"service", state.service},
+                        {"registered", state.registered}, {"made", state.made},
+                        {"stopped", state.stopped},       {"starts", state.starts},
+                        {"restart_at", state.restartAt}};
     if (state.serviceStatus) json["service_status"] = *state.serviceStatus;
-    return replaceTextFile(kStateFile,
-                           json.dump(2, ' ', false, Json::error_handler_t::replace) + "\n");
+    return replaceTextFile(
+            kStateFile, json.dump(2, ' ', false, nlohmann::json::error_handler_t::replace) + "\n");
 }
 
 std::optional<PhoneState> loadState() {
     std::string text;
     if (!android::base::ReadFileToString(kStateFile, &text)) return std::nullopt;
-    const Json json = Json::parse(text, nullptr, false);
+    const nlohmann::json json = nlohmann::json::parse(text, nullptr, false);
     if (!json.is_object()) return std::nullopt;
     PhoneState state;
     try {
@@ -61,7 +59,7 @@ std::optional<PhoneState> loadState() {
         state.restartAt = json.value("restart_at", int64_t{0});
         if (json.contains("service_status")) state.serviceStatus = json["service_status"];
         state.made = json.value("made", std::vector<std::string>());
-    } catch (const Json::exception&) {
+    } catch (const nlohmann::json::exception&) {
         return std::nullopt;  // not written by this tool
     }
     return state;

@@ -23,6 +23,7 @@
 #include <fmt/format.h>
 
 #include "handset/driver/printable.h"
+#include "handset/phone/commands.h"
 #include "handset/phone/phone_state.h"
 #include "handset/phone/supervisor.h"
 #include "handset/phone/text_file.h"
@@ -36,7 +37,6 @@ using android::base::unique_fd;
 
 namespace fs = std::filesystem;
 
-constexpr int kRefused = 2;
 constexpr const char* kProfiles = QVX_PROFILE_DIRECTORY;
 constexpr const char* kBinder = "/dev/binder";
 constexpr const char* kServiceFile = "android.hardware.vibrator-service.quorvan";

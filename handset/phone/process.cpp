@@ -20,6 +20,8 @@
 
 #include <fmt/format.h>
 
+#include "handset/driver/permission.h"
+
 namespace handset {
 namespace {
 
@@ -28,7 +30,6 @@ using android::base::Error;
 using android::base::Result;
 using android::base::unique_fd;
 
-constexpr uid_t kSystemUser = 1000;
 constexpr std::array<gid_t, 3> kSystemGroups = {1000 /* system */, 1004 /* input */,
                                                 1007 /* log */};
 

@@ -19,8 +19,6 @@
 namespace handset {
 namespace {
 
-constexpr int kNotWell = 1;
-constexpr int kRefused = 2;
 constexpr int kSlice = 50;        // milliseconds between two looks at the service
 constexpr int kSlices = 20 * 60;  // a minute: emulation takes its time
 

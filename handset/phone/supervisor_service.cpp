@@ -13,6 +13,7 @@
 #include <android-base/strings.h>
 #include <fmt/format.h>
 
+#include "handset/driver/permission.h"
 #include "handset/phone/registration.h"
 #include "handset/phone/supervisor.h"
 #include "handset/phone/text_file.h"
@@ -22,8 +23,6 @@ namespace {
 
 using android::base::Result;
 using android::base::unique_fd;
-
-constexpr uid_t kSystemUser = 1000;
 
 // Emulation under the address sanitizer takes its time.
 constexpr std::chrono::seconds kServiceTimeout{60};

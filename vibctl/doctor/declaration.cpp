@@ -22,7 +22,7 @@ using tinyxml2::XMLElement;
 
 constexpr const char* kPackage = "android.hardware.vibrator";
 constexpr const char* kInstance = "IVibrator/default";
-constexpr const char* kVersion = "2";
+constexpr const char* kDeclaredVersion = "2";
 constexpr const char* kDirectory = "vendor/etc/vintf/manifest";
 
 // How near a file, or one entry of it, comes to the declaration, and what is wrong with it. The
@@ -91,11 +91,11 @@ Attempt judgeHal(const XMLElement& hal) {
                                   : fmt::format("names {}", fmt::join(instances, ", ")),
                 fmt::format("name {}", kInstance)};
     }
-    if (version != kVersion) {
+    if (version != kDeclaredVersion) {
         return {Attempt::kOtherVersion, "",
                 fmt::format("has version {}, the service {}", version.empty() ? "1" : version,
-                            kVersion),
-                fmt::format("write <version>{}</version>", kVersion)};
+                            kDeclaredVersion),
+                fmt::format("write <version>{}</version>", kDeclaredVersion)};
     }
     return {Attempt::kDeclares, "", "", ""};
 }
@@ -143,7 +143,7 @@ std::vector<fs::path> manifestsBelow(const fs::path& root) {
 }
 
 // A name that fits in a line: without what every file of the service has in common.
-std::string shortName(const std::string& file) {
+std::string fileName(const std::string& file) {
     return file == "android.hardware.vibrator-service.quorvan.xml" ? "its .xml" : file;
 }
 
@@ -161,18 +161,18 @@ Finding checkDeclaration(const fs::path& root, std::optional<bool> declared) {
         return good(kCheck, fmt::format("the service manager knows {}", kInstance));
     }
     if (best.nearness == Attempt::kDeclares && declared.value_or(true)) {
-        return good(kCheck, fmt::format("{} names {} version {}", shortName(best.file), kInstance,
-                                        kVersion));
+        return good(kCheck, fmt::format("{} names {} version {}", fileName(best.file), kInstance,
+                                        kDeclaredVersion));
     }
     if (best.nearness == Attempt::kDeclares) {
-        return bad(kCheck, "the service manager does not see " + shortName(best.file),
+        return bad(kCheck, "the service manager does not see " + fileName(best.file),
                    "start it where that is");
     }
     if (best.nearness == Attempt::kOtherService) {
         return bad(kCheck, fmt::format("no manifest names {}", kInstance),
                    fmt::format("install its .xml in {}", (root / kDirectory).string()));
     }
-    return bad(kCheck, fmt::format("{} {}", shortName(best.file), best.fault), best.next);
+    return bad(kCheck, fmt::format("{} {}", fileName(best.file), best.fault), best.next);
 }
 
 fs::path manifestRoot(const fs::path& proc) {

@@ -20,7 +20,7 @@ namespace fs = std::filesystem;
 
 constexpr const char* kManager = "servicemanager";
 constexpr const char* kExecutable = "android.hardware.vibrator-service.quorvan";
-constexpr int32_t kVersion = 2;
+constexpr int32_t kServedVersion = 2;
 constexpr int32_t kExtensionVersion = 4;
 
 // The user and the groups (system, input, log) of the service's init script.
@@ -117,12 +117,13 @@ Finding checkRegistration(const BinderFacts& facts, const ServiceProcess& servic
         return bad(kCheck, fmt::format("process {}, {}, has registered it", pid, name),
                    "remove that other service");
     }
-    if (facts.version != kVersion) {
+    if (facts.version != kServedVersion) {
         return bad(kCheck,
-                   fmt::format("process {} has version {}, not {}", pid, facts.version, kVersion),
+                   fmt::format("process {} has version {}, not {}", pid, facts.version,
+                               kServedVersion),
                    "install this service's own program");
     }
-    return good(kCheck, fmt::format("process {}, version {}", pid, kVersion));
+    return good(kCheck, fmt::format("process {}, version {}", pid, kServedVersion));
 }
 
 Finding checkUser(const ServiceProcess& service) {

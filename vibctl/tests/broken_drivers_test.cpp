@@ -10,43 +10,43 @@ const Broken kDrivers[] = {
         // the device class
         {"NoNodeAtAll",
          [](Phone& phone) {
-             phone.root.remove(kLeds);
+             phone.root.remove(kLedsDirectory);
              phone.root.put(kList, "N: Name=\"keys\"\nH: Handlers=kbd event0 \n\n");
          },
          "bad  device class: no timed_output or leds node, no motor in the input list; next: load "
          "the driver"},
-        {"NoInputDevices", [](Phone& phone) { phone.root.remove(kLeds); },
+        {"NoInputDevices", [](Phone& phone) { phone.root.remove(kLedsDirectory); },
          "bad  device class: no node, and no /proc/bus/input/devices; next: enable CONFIG_INPUT"},
-        {"NoState", [](Phone& phone) { phone.root.remove(kLeds + "state"); },
+        {"NoState", [](Phone& phone) { phone.root.remove(kLedsDirectory + "state"); },
          "bad  device class: two of three LED nodes are there; the driver lacks state; next: add "
          "it"},
-        {"NoActivate", [](Phone& phone) { phone.root.remove(kLeds + "activate"); },
+        {"NoActivate", [](Phone& phone) { phone.root.remove(kLedsDirectory + "activate"); },
          "bad  device class: two of three LED nodes are there; the driver lacks activate; next: "
          "add "
          "it"},
-        {"NoDuration", [](Phone& phone) { phone.root.remove(kLeds + "duration"); },
+        {"NoDuration", [](Phone& phone) { phone.root.remove(kLedsDirectory + "duration"); },
          "bad  device class: two of three LED nodes are there; the driver lacks duration; next: "
          "add "
          "it"},
         {"ActivateAlone",
          [](Phone& phone) {
-             phone.root.remove(kLeds + "state");
-             phone.root.remove(kLeds + "duration");
+             phone.root.remove(kLedsDirectory + "state");
+             phone.root.remove(kLedsDirectory + "duration");
          },
          "bad  device class: one of three LED nodes is there; the driver lacks duration, state; "
          "next: add it"},
         {"NoneOfTheThree",
          [](Phone& phone) {
              for (const char* name : {"activate", "duration", "state"}) {
-                 phone.root.remove(kLeds + name);
+                 phone.root.remove(kLedsDirectory + name);
              }
              phone.root.put(kList, "");
          },
          "bad  device class: for LEDs the driver lacks activate, duration, state; next: add it"},
         {"NoEnable",
          [](Phone& phone) {
-             phone.root.remove(kLeds);
-             phone.root.putNodes(kLegacy, {"intensity", "motor_type"});
+             phone.root.remove(kLedsDirectory);
+             phone.root.putNodes(kLegacyDirectory, {"intensity", "motor_type"});
              phone.root.put(kList, "");
          },
          "bad  device class: timed_output nodes are there; the driver lacks enable; next: add it"},
@@ -57,13 +57,13 @@ const Broken kDrivers[] = {
          },
          "bad  device class: control nodes, but no motor in the input list: it is unplugged; next: "
          "plug it in"},
-        {"DurationDenied", [](Phone& phone) { phone.deny(kLeds + "duration"); },
+        {"DurationDenied", [](Phone& phone) { phone.deny(kLedsDirectory + "duration"); },
          "bad  device class: user 4242 cannot open vibrator/duration (OWNER 0600); next: chown it "
          "to 4242"},
         {"EnableDenied",
          [](Phone& phone) {
-             phone.root.put(kLegacy + "enable");
-             phone.deny(kLegacy + "enable");
+             phone.root.put(kLegacyDirectory + "enable");
+             phone.deny(kLegacyDirectory + "enable");
          },
          "bad  device class: user 4242 cannot open vibrator/enable (OWNER 0600); next: chown it to "
          "4242"},
@@ -83,10 +83,11 @@ const Broken kDrivers[] = {
          "EV_FF only"},
 
         // the nodes
-        {"IntensityDenied", [](Phone& phone) { phone.deny(kLeds + "intensity"); },
+        {"IntensityDenied", [](Phone& phone) { phone.deny(kLedsDirectory + "intensity"); },
          "bad  nodes: user 4242 cannot open vibrator/intensity (OWNER 0600); next: chown it to "
          "4242"},
-        {"EngineReadOnly", [](Phone& phone) { phone.root.chmod(kLeds + "haptic_engine", 0444); },
+        {"EngineReadOnly",
+         [](Phone& phone) { phone.root.chmod(kLedsDirectory + "haptic_engine", 0444); },
          "bad  nodes: user 4242 cannot open vibrator/haptic_engine (OWNER 0444); next: chown it to "
          "4242"},
         {"CalibrationUnreadable",
@@ -105,10 +106,10 @@ const Broken kDrivers[] = {
 
         // what the nodes say
         {"MotorTypeUnknown",
-         [](Phone& phone) { phone.root.put(kLeds + "motor_type", "LINEAR_1041\n"); },
+         [](Phone& phone) { phone.root.put(kLedsDirectory + "motor_type", "LINEAR_1041\n"); },
          "bad  motor type: \"LINEAR_1041\" is unknown and counts as NONE; next: write LINEAR_1040"},
         {"MotorTypeWithoutANewline",
-         [](Phone& phone) { phone.root.put(kLeds + "motor_type", "LINEAR_1040"); },
+         [](Phone& phone) { phone.root.put(kLedsDirectory + "motor_type", "LINEAR_1040"); },
          "bad  motor type: \"LINEAR_1040\" without a newline is read as \"LINEAR_104\"; next: add "
          "the newline"},
         {"FeatureWordMisspelt",
@@ -123,9 +124,10 @@ const Broken kDrivers[] = {
         {"FeatureWordsInLines",
          [](Phone& phone) { phone.root.put(kFunctions, "INTENSITY\nHAPTIC_ENGINE\n"); },
          "note feature words: hasFeature needs single spaces between them; next: separate them so"},
-        {"FeatureWithoutItsNode", [](Phone& phone) { phone.root.remove(kLeds + "haptic_engine"); },
+        {"FeatureWithoutItsNode",
+         [](Phone& phone) { phone.root.remove(kLedsDirectory + "haptic_engine"); },
          "note feature words: HAPTIC_ENGINE is listed without a node; next: add haptic_engine"},
-        {"NoIntensity", [](Phone& phone) { phone.root.remove(kLeds + "intensity"); },
+        {"NoIntensity", [](Phone& phone) { phone.root.remove(kLedsDirectory + "intensity"); },
          "note feature words: INTENSITY is listed without a node; next: add intensity"},
         {"NoForceTouchIntensity", [](Phone& phone) { phone.list("FORCE_TOUCH_INTENSITY"); },
          "note feature words: FORCE_TOUCH_INTENSITY is listed without a node; next: add "
@@ -140,36 +142,39 @@ const Broken kDrivers[] = {
         {"NoHybrid", [](Phone& phone) { phone.list("HYBRID_HAPTIC_ENGINE"); },
          "note feature words: HYBRID_HAPTIC_ENGINE is listed without a node; next: add "
          "hybrid_haptic_engine"},
-        {"NoMotorType", [](Phone& phone) { phone.root.remove(kLeds + "motor_type"); },
+        {"NoMotorType", [](Phone& phone) { phone.root.remove(kLedsDirectory + "motor_type"); },
          "note motor type: without motor_type the amplitude tables are guessed; next: add the "
          "node"},
         {"NoPatternQueue",
          [](Phone& phone) {
-             phone.root.putNodes(kLeds, {"cp_trigger_index", "num_waves"});
+             phone.root.putNodes(kLedsDirectory, {"cp_trigger_index", "num_waves"});
          },
          "note nodes: without cp_trigger_queue no pattern is repeated or composed; next: add it"},
         {"NoPatternCount",
          [](Phone& phone) {
-             phone.root.putNodes(kLeds, {"cp_trigger_index", "cp_trigger_queue"});
+             phone.root.putNodes(kLedsDirectory, {"cp_trigger_index", "cp_trigger_queue"});
          },
          "note nodes: without num_waves clients get no number of patterns; next: add it"},
         {"NoHapticIntensities",
-         [](Phone& phone) { phone.root.remove(kLeds + "haptic_intensities"); },
+         [](Phone& phone) { phone.root.remove(kLedsDirectory + "haptic_intensities"); },
          "note intensities: intensities does not count without haptic_intensities; next: add it"},
-        {"NoIntensities", [](Phone& phone) { phone.root.remove(kLeds + "intensities"); },
+        {"NoIntensities", [](Phone& phone) { phone.root.remove(kLedsDirectory + "intensities"); },
          "note intensities: haptic_intensities does not count without intensities; next: add it"},
-        {"NodeWithoutItsFeature", [](Phone& phone) { phone.root.put(kLeds + "fifo"); },
+        {"NodeWithoutItsFeature", [](Phone& phone) { phone.root.put(kLedsDirectory + "fifo"); },
          "note feature words: FIFO_HAPTIC_ENGINE is not listed, so clients miss it; next: list it"},
         {"NoFeatureWords", [](Phone& phone) { phone.root.remove(kFunctions); },
          "note feature words: without functions, no compositions, no external control; next: add "
          "the node"},
         {"IntensityTableUnreadable",
-         [](Phone& phone) { phone.root.put(kLeds + "haptic_intensities", "0;5000;10000\n"); },
+         [](Phone& phone) {
+             phone.root.put(kLedsDirectory + "haptic_intensities", "0;5000;10000\n");
+         },
          "bad  intensities: haptic_intensities holds \"0;5000;10000\"; next: write numbers, commas "
          "between"},
-        {"IntensityTableEmpty", [](Phone& phone) { phone.root.put(kLeds + "intensities", "\n"); },
+        {"IntensityTableEmpty",
+         [](Phone& phone) { phone.root.put(kLedsDirectory + "intensities", "\n"); },
          "bad  intensities: intensities holds \"\"; next: write numbers, commas between"},
-        {"NodeMisnamed", [](Phone& phone) { phone.root.put(kLeds + "cp_trigger_indx"); },
+        {"NodeMisnamed", [](Phone& phone) { phone.root.put(kLedsDirectory + "cp_trigger_indx"); },
          "bad  node names: the service never opens cp_trigger_indx; next: call it "
          "cp_trigger_index"},
         {"CalibrationEmpty",

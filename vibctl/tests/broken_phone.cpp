@@ -24,10 +24,10 @@ void makeHealthy(Phone& phone) {
     root.putState(7, 'S', 100);
     root.putProcess(312, {kProgram}, kStranger);
     root.putState(312, 'S', 200);
-    root.putNodes(kLeds, {"activate", "duration", "state", "intensity", "haptic_engine"});
-    root.put(kLeds + "motor_type", "LINEAR_1040\n");
-    root.put(kLeds + "intensities", "0,5000,10000\n");
-    root.put(kLeds + "haptic_intensities", "0,5000,10000\n");
+    root.putNodes(kLedsDirectory, {"activate", "duration", "state", "intensity", "haptic_engine"});
+    root.put(kLedsDirectory + "motor_type", "LINEAR_1040\n");
+    root.put(kLedsDirectory + "intensities", "0,5000,10000\n");
+    root.put(kLedsDirectory + "haptic_intensities", "0,5000,10000\n");
     root.put(kFunctions, "INTENSITY HAPTIC_ENGINE PRIMITIVE_EFFECT_COMPOSE\n");
 }
 

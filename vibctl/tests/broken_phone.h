@@ -20,8 +20,8 @@ inline constexpr const char* kFragment =
         "/vendor/etc/vintf/manifest/android.hardware.vibrator-service.quorvan.xml";
 inline constexpr const char* kFunctions = "/sys/class/vib_info_class/vib_support_info/functions";
 inline constexpr const char* kList = "/proc/bus/input/devices";
-inline const std::string kLeds = "/sys/class/leds/vibrator/";
-inline const std::string kLegacy = "/sys/class/timed_output/vibrator/";
+inline const std::string kLedsDirectory = "/sys/class/leds/vibrator/";
+inline const std::string kLegacyDirectory = "/sys/class/timed_output/vibrator/";
 
 struct Phone {
     fake::Root root;
@@ -36,7 +36,7 @@ struct Phone {
 
     // A force-feedback phone instead of the LED-class one.
     void becomeForceFeedback() const {
-        root.remove(kLeds);
+        root.remove(kLedsDirectory);
         root.put(kList,
                  "N: Name=\"keys\"\nH: Handlers=kbd event0 \n\nN: "
                  "Name=\"qvx_vibrator_inputff\"\nH: Handlers=event3 \n\n");

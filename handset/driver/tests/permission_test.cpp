@@ -10,7 +10,7 @@
 namespace handset {
 namespace {
 
-constexpr Attributes kNode{0664, 1000, 1000};
+constexpr Attributes kNodeAttributes{0664, 1000, 1000};
 constexpr Attributes kReadOnlyNode{0444, 1000, 1000};
 constexpr Attributes kWriteOnlyNode{0220, 1000, 1000};
 
@@ -31,16 +31,16 @@ TEST(Permission, RootMayDoAnything) {
 }
 
 TEST(Permission, TheOwnerHasTheOwnersBits) {
-    EXPECT_TRUE(grants(kNode, {1000, 1000, {}}, kMayRead | kMayWrite));
+    EXPECT_TRUE(grants(kNodeAttributes, {1000, 1000, {}}, kMayRead | kMayWrite));
     EXPECT_TRUE(grants(kReadOnlyNode, {1000, 1000, {}}, kMayRead));
     EXPECT_FALSE(grants(kReadOnlyNode, {1000, 1000, {}}, kMayRead | kMayWrite));
     EXPECT_FALSE(grants(kWriteOnlyNode, {1000, 1000, {}}, kMayRead));
 }
 
 TEST(Permission, TheGroupHasTheGroupsBitsByEitherMembership) {
-    EXPECT_TRUE(grants(kNode, {2000, 1000, {}}, kMayWrite));
-    EXPECT_TRUE(grants(kNode, {2000, 2000, {5, 1000}}, kMayWrite));
-    EXPECT_FALSE(grants(kNode, {2000, 2000, {5, 1001}}, kMayWrite));
+    EXPECT_TRUE(grants(kNodeAttributes, {2000, 1000, {}}, kMayWrite));
+    EXPECT_TRUE(grants(kNodeAttributes, {2000, 2000, {5, 1000}}, kMayWrite));
+    EXPECT_FALSE(grants(kNodeAttributes, {2000, 2000, {5, 1001}}, kMayWrite));
 }
 
 TEST(Permission, TheOwnersBitsComeBeforeTheGroups) {
@@ -48,9 +48,9 @@ TEST(Permission, TheOwnersBitsComeBeforeTheGroups) {
 }
 
 TEST(Permission, OthersMayReadButNotWrite) {
-    EXPECT_TRUE(grants(kNode, {2000, 2000, {}}, kMayRead));
-    EXPECT_FALSE(grants(kNode, {2000, 2000, {}}, kMayWrite));
-    EXPECT_FALSE(grants(kNode, {2000, 2000, {}}, kMayRead | kMayWrite));
+    EXPECT_TRUE(grants(kNodeAttributes, {2000, 2000, {}}, kMayRead));
+    EXPECT_FALSE(grants(kNodeAttributes, {2000, 2000, {}}, kMayWrite));
+    EXPECT_FALSE(grants(kNodeAttributes, {2000, 2000, {}}, kMayRead | kMayWrite));
 }
 
 }  // namespace

@@ -243,7 +243,7 @@ std::string changedDirectories(const std::string &)
 		 outcome(mknod(kMissing.c_str(), S_IFIFO | 0644, 0))});
 }
 
-const Agreement kCases[] = {
+const Agreement kSysfsCases[] = {
 	{"RootOpensWhatHasTheMethod", kRoot, opens,
 	 "ok ok ok / ok EACCES EACCES / EACCES ok EACCES / ok ok ok / ENOENT "
 	 "ENOENT ENOENT / "},
@@ -322,7 +322,7 @@ TEST_P(SysfsAgreement, OfRealAndSimulated)
 	expectAgreement(GetParam());
 }
 
-INSTANTIATE_TEST_SUITE_P(Sysfs, SysfsAgreement, testing::ValuesIn(kCases),
+INSTANTIATE_TEST_SUITE_P(Sysfs, SysfsAgreement, testing::ValuesIn(kSysfsCases),
 			 nameOf<Agreement>);
 
 } // namespace

@@ -22,8 +22,6 @@ using ::testing::IsEmpty;
 using ::testing::Values;
 using ::testing::ValuesIn;
 
-const std::string kFunctions = kInfo + "functions";
-
 class Capabilities : public ServiceTest {
   protected:
     Capabilities() { addLedsClass(); }
@@ -181,17 +179,17 @@ TEST_F(PerformMethod, ReadOnlyNodeDoesNotCount) {
     EXPECT_EQ(makeHwApi()->getMotorPerformMethod(), 3);
 }
 
-struct Nodes {
+struct MethodRow {
     const char* name;
     std::vector<const char*> leaves;
     int method;
 };
 
-void PrintTo(const Nodes& nodes, std::ostream* out) {
+void PrintTo(const MethodRow& nodes, std::ostream* out) {
     *out << nodes.name;
 }
 
-const Nodes kNodes[] = {
+const MethodRow kMethodRows[] = {
         {"None", {}, 0},
         {"Intensity", {"intensity"}, 3},
         {"HapticEngine", {"haptic_engine"}, 2},
@@ -204,7 +202,7 @@ const Nodes kNodes[] = {
 
 // The method on both classes: true stands for the LED class.
 class PerformMethodOfClass : public ServiceTest,
-                             public ::testing::WithParamInterface<std::tuple<bool, Nodes>> {};
+                             public ::testing::WithParamInterface<std::tuple<bool, MethodRow>> {};
 
 TEST_P(PerformMethodOfClass, FollowsFromTheNodesAndIsKeptFromTheStart) {
     const auto& [isLeds, nodes] = GetParam();
@@ -218,7 +216,7 @@ TEST_P(PerformMethodOfClass, FollowsFromTheNodesAndIsKeptFromTheStart) {
 }
 
 INSTANTIATE_TEST_SUITE_P(PerformMethods, PerformMethodOfClass,
-                         Combine(Values(false, true), ValuesIn(kNodes)), [](const auto& row) {
+                         Combine(Values(false, true), ValuesIn(kMethodRows)), [](const auto& row) {
                              return std::string(std::get<0>(row.param) ? "Leds" : "Legacy") +
                                     std::get<1>(row.param).name;
                          });

@@ -24,7 +24,7 @@ using ::testing::StartsWith;
 using Clock = std::chrono::steady_clock;
 using Primitive = CompositePrimitive;
 
-constexpr CompletionTexts kTexts = {"begins", "calls"};
+constexpr CompletionTexts kCompletionTexts = {"begins", "calls"};
 
 using CompletionWorker = VibratorTest;
 
@@ -32,7 +32,7 @@ TEST_F(CompletionWorker, SleepsAndThenCalls) {
     std::vector<std::string> before;
     const auto completion =
             ndk::SharedRefBase::make<CountingCallback>([&] { before = kernel.calls(); });
-    EXPECT_TRUE(startCompletionWorker(kTexts, 1234, completion));
+    EXPECT_TRUE(startCompletionWorker(kCompletionTexts, 1234, completion));
     ASSERT_TRUE(completion->waitForCall());
     EXPECT_THAT(before, ElementsAre("sleep 1234 ms"));
     EXPECT_EQ(completion->calls(), 1);
@@ -41,7 +41,7 @@ TEST_F(CompletionWorker, SleepsAndThenCalls) {
 }
 
 TEST_F(CompletionWorker, WithoutACallbackSleepsAllTheSame) {
-    EXPECT_TRUE(startCompletionWorker(kTexts, 50, nullptr));
+    EXPECT_TRUE(startCompletionWorker(kCompletionTexts, 50, nullptr));
     ASSERT_TRUE(kernel.waitForCalls(1));
     EXPECT_THAT(kernel.calls(), ElementsAre("sleep 50 ms"));
     EXPECT_THAT(log.lines(), ElementsAre("I begins"));
@@ -50,7 +50,7 @@ TEST_F(CompletionWorker, WithoutACallbackSleepsAllTheSame) {
 TEST_F(CompletionWorker, CallsAtOnceWhenThereIsNothingToSleep) {
     for (const int64_t totalMs : {int64_t{0}, int64_t{-1}, std::numeric_limits<int64_t>::min()}) {
         const auto completion = ndk::SharedRefBase::make<CountingCallback>();
-        EXPECT_TRUE(startCompletionWorker(kTexts, totalMs, completion));
+        EXPECT_TRUE(startCompletionWorker(kCompletionTexts, totalMs, completion));
         EXPECT_TRUE(completion->waitForCall());
     }
     EXPECT_THAT(kernel.calls(), IsEmpty());
@@ -58,7 +58,7 @@ TEST_F(CompletionWorker, CallsAtOnceWhenThereIsNothingToSleep) {
 
 TEST_F(CompletionWorker, SleepsLongerThan32BitsHold) {
     const auto completion = ndk::SharedRefBase::make<CountingCallback>();
-    EXPECT_TRUE(startCompletionWorker(kTexts, 3276600000, completion));
+    EXPECT_TRUE(startCompletionWorker(kCompletionTexts, 3276600000, completion));
     EXPECT_TRUE(completion->waitForCall());
     EXPECT_THAT(kernel.calls(), ElementsAre("sleep 3276600000 ms"));
 }
@@ -67,7 +67,7 @@ TEST_F(CompletionWorker, DoesNotMindACallbackThatFails) {
     for (const binder_exception_t answer : {EX_ILLEGAL_STATE, EX_TRANSACTION_FAILED}) {
         log.clear();
         const auto failing = ndk::SharedRefBase::make<CountingCallback>([] {}, answer);
-        EXPECT_TRUE(startCompletionWorker(kTexts, 1, failing));
+        EXPECT_TRUE(startCompletionWorker(kCompletionTexts, 1, failing));
         EXPECT_TRUE(failing->waitForCall());
         EXPECT_THAT(log.lines(), ElementsAre("I begins", "I calls"));
     }
@@ -76,7 +76,7 @@ TEST_F(CompletionWorker, DoesNotMindACallbackThatFails) {
 TEST_F(CompletionWorker, LetsGoOfTheCallbackWhenItEnds) {
     auto completion = ndk::SharedRefBase::make<CountingCallback>();
     const std::weak_ptr<CountingCallback> watch = completion;
-    EXPECT_TRUE(startCompletionWorker(kTexts, 1, completion));
+    EXPECT_TRUE(startCompletionWorker(kCompletionTexts, 1, completion));
     completion.reset();
     while (!watch.expired()) std::this_thread::yield();
 }
@@ -85,7 +85,7 @@ TEST_F(CompletionWorker, WithoutAThreadIsRefusedAndThrowsNothing) {
     const auto completion = ndk::SharedRefBase::make<CountingCallback>();
     {
         const RefusedThreads threads;
-        EXPECT_NO_THROW(EXPECT_FALSE(startCompletionWorker(kTexts, 1, completion)));
+        EXPECT_NO_THROW(EXPECT_FALSE(startCompletionWorker(kCompletionTexts, 1, completion)));
     }
     EXPECT_EQ(completion.use_count(), 1);
     EXPECT_EQ(completion->calls(), 0);

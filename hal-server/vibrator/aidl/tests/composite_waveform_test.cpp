@@ -26,9 +26,9 @@ using testing::internal::GetCapturedStdout;
 
 using Bytes = std::vector<uint8_t>;
 
-constexpr int kInvalid = -22;
+constexpr int kInvalidWaveform = -22;
 // Written behind the output buffer, to show that nothing is written past its end.
-constexpr uint8_t kGuard = 0xa5;
+constexpr uint8_t kUntouched = 0xa5;
 
 struct Outcome {
     int result = 0;
@@ -38,7 +38,7 @@ struct Outcome {
 
 Outcome compile(std::string text) {
     Bytes buffer(1152, 0);
-    buffer.insert(buffer.end(), 64, kGuard);
+    buffer.insert(buffer.end(), 64, kUntouched);
     const LogCapture log;
     CaptureStdout();
     CaptureStderr();
@@ -49,7 +49,7 @@ Outcome compile(std::string text) {
     outcome.printed = GetCapturedStdout();
     EXPECT_EQ(GetCapturedStderr(), "");
     EXPECT_THAT(log.lines(), IsEmpty());
-    EXPECT_EQ(Bytes(buffer.begin() + 1152, buffer.end()), Bytes(64, kGuard));
+    EXPECT_EQ(Bytes(buffer.begin() + 1152, buffer.end()), Bytes(64, kUntouched));
     if (outcome.result > 0) outcome.bytes.assign(buffer.begin(), buffer.begin() + outcome.result);
     return outcome;
 }
@@ -63,7 +63,7 @@ void expectBytes(const std::string& text, const Bytes& expected) {
 
 void expectRefusal(const std::string& text, const std::string& message) {
     const Outcome outcome = compile(text);
-    EXPECT_EQ(outcome.result, kInvalid) << text;
+    EXPECT_EQ(outcome.result, kInvalidWaveform) << text;
     EXPECT_EQ(outcome.printed, message) << text;
 }
 
@@ -201,8 +201,8 @@ TEST(CompositeWaveform, AmplitudeIsOneToHundred) {
 TEST(CompositeWaveform, TooLongADurationIsRefused) {
     expectRefusal("1.50.16384", "Duration too long: 16384 ms\n");
     expectRefusal("1.50.65534", "Duration too long: 65534 ms\n");
-    EXPECT_EQ(compile("1.50.4294967296").result, kInvalid);
-    EXPECT_EQ(compile("1.50.99999999999999999999").result, kInvalid);
+    EXPECT_EQ(compile("1.50.4294967296").result, kInvalidWaveform);
+    EXPECT_EQ(compile("1.50.99999999999999999999").result, kInvalidWaveform);
 }
 
 TEST(CompositeWaveform, PauseIsOneToTenThousand) {

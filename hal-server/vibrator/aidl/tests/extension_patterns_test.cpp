@@ -18,11 +18,6 @@ using ::testing::HasSubstr;
 using ::testing::IsEmpty;
 using ::testing::Not;
 
-const std::string kIntensity = kLegacy + "intensity";
-const std::string kIndex = kLegacy + "cp_trigger_index";
-const std::string kQueue = kLegacy + "cp_trigger_queue";
-const std::string kEnable = kLegacy + "enable";
-
 class PatternPhone : public ExtensionTest {
   protected:
     PatternPhone() {
@@ -32,7 +27,7 @@ class PatternPhone : public ExtensionTest {
 };
 
 // One failure of the driver: what was written before it, and the last line of the service.
-struct Failure {
+struct PatternFailure {
     const char* name;
     Fault fault;
     std::vector<std::string> writes;
@@ -116,7 +111,8 @@ TEST_F(ExtensionPatternOnce, InterruptedCallsAreRepeated) {
                                              kEnable + " \"1000\\n\""));
 }
 
-class FailingPatternOnce : public PatternPhone, public testing::WithParamInterface<Failure> {};
+class FailingPatternOnce : public PatternPhone,
+                           public testing::WithParamInterface<PatternFailure> {};
 
 TEST_P(FailingPatternOnce, IsAnIllegalStateAndLeavesWhatWasWritten) {
     const auto extension = makeExtension();
@@ -127,7 +123,7 @@ TEST_P(FailingPatternOnce, IsAnIllegalStateAndLeavesWhatWasWritten) {
     EXPECT_EQ(log.lines().back(), GetParam().line);
 }
 
-const Failure kFailuresOnce[] = {
+const PatternFailure kFailuresOnce[] = {
         {"IntensityOpen",
          {.path = kIntensity, .operation = Operation::kOpen, .error = EACCES},
          {},
@@ -167,7 +163,7 @@ const Failure kFailuresOnce[] = {
 };
 
 INSTANTIATE_TEST_SUITE_P(Extension, FailingPatternOnce, testing::ValuesIn(kFailuresOnce),
-                         rowName<Failure>);
+                         rowName<PatternFailure>);
 
 class ExtensionPatternRepeated : public PatternPhone {
   protected:
@@ -225,7 +221,8 @@ TEST_F(ExtensionPatternRepeated, InterruptedCallsAreRepeated) {
     EXPECT_EQ(queued(3, 5000), std::string("3.50, 10, 0~\0", 13));
 }
 
-class FailingPatternRepeated : public PatternPhone, public testing::WithParamInterface<Failure> {};
+class FailingPatternRepeated : public PatternPhone,
+                               public testing::WithParamInterface<PatternFailure> {};
 
 TEST_P(FailingPatternRepeated, IsAnIllegalStateAndLeavesWhatWasWritten) {
     const auto extension = makeExtension();
@@ -236,7 +233,7 @@ TEST_P(FailingPatternRepeated, IsAnIllegalStateAndLeavesWhatWasWritten) {
     EXPECT_EQ(log.lines().back(), GetParam().line);
 }
 
-const Failure kFailuresRepeated[] = {
+const PatternFailure kFailuresRepeated[] = {
         {"SwitchOpen",
          {.path = kIndex, .operation = Operation::kOpen, .error = EACCES},
          {},
@@ -276,7 +273,7 @@ const Failure kFailuresRepeated[] = {
 };
 
 INSTANTIATE_TEST_SUITE_P(Extension, FailingPatternRepeated, testing::ValuesIn(kFailuresRepeated),
-                         rowName<Failure>);
+                         rowName<PatternFailure>);
 
 TEST_F(ExtensionPatternRepeated, MissingQueueIsLoggedWithItsErrorAfterTheSwitch) {
     kernel.removeNode(kQueue);

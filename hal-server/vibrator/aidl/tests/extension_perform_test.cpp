@@ -18,10 +18,6 @@ using ::testing::HasSubstr;
 using ::testing::IsEmpty;
 using ::testing::Not;
 
-const std::string kIntensity = kLegacy + "intensity";
-const std::string kIndex = kLegacy + "cp_trigger_index";
-const std::string kEnable = kLegacy + "enable";
-
 class ExtensionPerform : public ExtensionTest {
   protected:
     ExtensionPerform() {

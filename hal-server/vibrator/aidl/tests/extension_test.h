@@ -22,10 +22,10 @@ namespace aidl::vendor::quorvan::hardware::vibrator {
 
 using core::exceptionOf;
 
-inline constexpr int32_t kIntMin = std::numeric_limits<int32_t>::min();
-inline constexpr int32_t kIntMax = std::numeric_limits<int32_t>::max();
-
-inline const std::string kFunctions = kInfo + "functions";
+inline const std::string kIntensity = kLegacy + "intensity";
+inline const std::string kIndex = kLegacy + "cp_trigger_index";
+inline const std::string kQueue = kLegacy + "cp_trigger_queue";
+inline const std::string kEnable = kLegacy + "enable";
 inline const std::string kInputFf = "/sys/class/qvx_vib_inputff/control/";
 inline const std::string kMotorDevice = "/dev/input/event7";
 

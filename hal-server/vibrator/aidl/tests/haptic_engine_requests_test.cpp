@@ -15,7 +15,7 @@ using fake::Operation;
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 
-using Packets = std::vector<ZelHapticEnginePacket>;
+using EnginePackets = std::vector<ZelHapticEnginePacket>;
 
 ZelHapticEnginePacket packet(int32_t time, int32_t intensity, int32_t frequency,
                              int32_t overdrive) {
@@ -35,7 +35,7 @@ struct Request {
 };
 
 ndk::ScopedAStatus playPackets(Vibrator& extension, size_t count, int32_t amplitude) {
-    return extension.performHapticEngine(Packets(count), amplitude);
+    return extension.performHapticEngine(EnginePackets(count), amplitude);
 }
 
 ndk::ScopedAStatus playHybridPackets(Vibrator& extension, size_t count, int32_t amplitude) {
@@ -202,7 +202,7 @@ class HapticEngineRequest : public ExtensionTest {
         kernel.addNode(node, "unset");
     }
 
-    std::string textOf(const Packets& packets, int32_t amplitude) {
+    std::string textOf(const EnginePackets& packets, int32_t amplitude) {
         EXPECT_TRUE(makeExtension()->performHapticEngine(packets, amplitude).isOk());
         return kernel.text(node);
     }
@@ -245,7 +245,8 @@ TEST_F(HapticEngineRequest, FailingWriteIsAnIllegalStateAndStartsNothing) {
           fake::Fault{.path = node, .operation = Operation::kWrite, .result = 11}}) {
         kernel.clear();
         kernel.addFault(fault);
-        EXPECT_EQ(exceptionOf(extension->performHapticEngine(Packets(1), 5000)), EX_ILLEGAL_STATE);
+        EXPECT_EQ(exceptionOf(extension->performHapticEngine(EnginePackets(1), 5000)),
+                  EX_ILLEGAL_STATE);
         EXPECT_EQ(kernel.calls().size(), 3U);
         EXPECT_EQ(kernel.calls().back(), "close " + node);
         EXPECT_EQ(log.lines().back(), "I V_4_0: performHapticEngine UNKNOWN_ERROR");
@@ -273,7 +274,8 @@ TEST_F(RequestOnForceFeedback, PacketsAreRefusedSoftly) {
 TEST_F(RequestOnForceFeedback, BadPacketArgumentsAreStillIllegal) {
     const auto extension = makeExtension();
     EXPECT_EQ(exceptionOf(extension->performHapticEngine({}, 0)), EX_ILLEGAL_ARGUMENT);
-    EXPECT_EQ(exceptionOf(extension->performHapticEngine(Packets(340), 1)), EX_ILLEGAL_ARGUMENT);
+    EXPECT_EQ(exceptionOf(extension->performHapticEngine(EnginePackets(340), 1)),
+              EX_ILLEGAL_ARGUMENT);
 }
 
 TEST_F(RequestOnForceFeedback, HybridPacketsAndFifoHaveNoNodeAndAreAnIllegalState) {

@@ -15,10 +15,10 @@ using fake::Operation;
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 
-using Packets = std::vector<ZelPlaybackPacket>;
+using PlaybackPackets = std::vector<ZelPlaybackPacket>;
 
-const std::string kIndex = kLeds + "cp_trigger_index";
-const std::string kQueue = kLeds + "cp_trigger_queue";
+const std::string kLedsIndex = kLeds + "cp_trigger_index";
+const std::string kLedsQueue = kLeds + "cp_trigger_queue";
 
 ZelPlaybackPacket packet(int32_t patternIndex, int32_t level, int32_t option) {
     ZelPlaybackPacket packet;
@@ -40,19 +40,20 @@ TEST_F(PlaybackEngine, SwitchesToTheQueueFillsItAndStarts) {
     const auto extension = makeExtension();
     EXPECT_TRUE(extension->performPlaybackEngine({packet(5, 100, 0), packet(7, 80, 3)}, true, 0)
                         .isOk());
-    EXPECT_THAT(kernel.calls(),
-                ElementsAre("open " + kIndex + " O_RDWR", "write " + kIndex + " \"65534\\n\"",
-                            "close " + kIndex, "open " + kQueue + " O_RDWR",
-                            "write " + kQueue + " \"5.100,7.80,3,~\\0\"", "close " + kQueue,
-                            "open /sys/class/leds/vibrator/state O_RDWR",
-                            "write /sys/class/leds/vibrator/state \"1\\n\"",
-                            "close /sys/class/leds/vibrator/state",
-                            "open /sys/class/leds/vibrator/duration O_RDWR",
-                            "write /sys/class/leds/vibrator/duration \"1000\\n\"",
-                            "close /sys/class/leds/vibrator/duration",
-                            "open /sys/class/leds/vibrator/activate O_RDWR",
-                            "write /sys/class/leds/vibrator/activate \"1\\n\"",
-                            "close /sys/class/leds/vibrator/activate"));
+    EXPECT_THAT(
+            kernel.calls(),
+            ElementsAre("open " + kLedsIndex + " O_RDWR", "write " + kLedsIndex + " \"65534\\n\"",
+                        "close " + kLedsIndex, "open " + kLedsQueue + " O_RDWR",
+                        "write " + kLedsQueue + " \"5.100,7.80,3,~\\0\"", "close " + kLedsQueue,
+                        "open /sys/class/leds/vibrator/state O_RDWR",
+                        "write /sys/class/leds/vibrator/state \"1\\n\"",
+                        "close /sys/class/leds/vibrator/state",
+                        "open /sys/class/leds/vibrator/duration O_RDWR",
+                        "write /sys/class/leds/vibrator/duration \"1000\\n\"",
+                        "close /sys/class/leds/vibrator/duration",
+                        "open /sys/class/leds/vibrator/activate O_RDWR",
+                        "write /sys/class/leds/vibrator/activate \"1\\n\"",
+                        "close /sys/class/leds/vibrator/activate"));
     EXPECT_THAT(log.lines(),
                 ElementsAre("I V_4_0: performPlaybackEngine",
                             "I V_4_0: performPlaybackEngine packet_cnt : 2",
@@ -74,7 +75,7 @@ TEST_F(PlaybackEngine, SwitchesToTheQueueFillsItAndStarts) {
 
 struct Sequence {
     const char* name;
-    Packets packets;
+    PlaybackPackets packets;
     bool repeat;
     int32_t repeatCnt;
     const char* text;  // without the zero byte
@@ -88,7 +89,7 @@ TEST_P(PlaybackSequence, IsThisTextAndAZeroByte) {
     EXPECT_TRUE(
             extension->performPlaybackEngine(sequence.packets, sequence.repeat, sequence.repeatCnt)
                     .isOk());
-    EXPECT_EQ(kernel.text(kQueue), sequence.text + std::string(1, '\0'));
+    EXPECT_EQ(kernel.text(kLedsQueue), sequence.text + std::string(1, '\0'));
     EXPECT_EQ(log.line(5),
               std::string("I V_4_0: Packet data with repeat option : ") + sequence.text);
 }
@@ -123,22 +124,23 @@ INSTANTIATE_TEST_SUITE_P(Extension, PlaybackSequence, testing::ValuesIn(kSequenc
 
 TEST_F(PlaybackEngine, TwoHundredPacketsAreAccepted) {
     const auto extension = makeExtension();
-    EXPECT_TRUE(extension->performPlaybackEngine(Packets(200), true, 0).isOk());
-    EXPECT_EQ(kernel.text(kQueue).size(), 802U);
+    EXPECT_TRUE(extension->performPlaybackEngine(PlaybackPackets(200), true, 0).isOk());
+    EXPECT_EQ(kernel.text(kLedsQueue).size(), 802U);
     EXPECT_EQ(log.line(4), "I V_4_0: Packet data size with repeat option : 802");
 }
 
 TEST_F(PlaybackEngine, LongestSequenceIsNeverCut) {
     const auto extension = makeExtension();
-    EXPECT_TRUE(extension
-                        ->performPlaybackEngine(Packets(200, packet(kIntMin, kIntMin, kIntMin)),
-                                                true, kIntMax)
-                        .isOk());
+    EXPECT_TRUE(
+            extension
+                    ->performPlaybackEngine(PlaybackPackets(200, packet(kIntMin, kIntMin, kIntMin)),
+                                            true, kIntMax)
+                    .isOk());
     std::string expected;
     for (int i = 0; i < 200; ++i) expected += "-2147483648.-2147483648,-2147483648,";
     expected += "2147483647!";
     expected += '\0';
-    EXPECT_EQ(kernel.text(kQueue), expected);
+    EXPECT_EQ(kernel.text(kLedsQueue), expected);
     EXPECT_EQ(log.line(4), "I V_4_0: Packet data size with repeat option : 7212");
 }
 
@@ -146,7 +148,7 @@ TEST_F(PlaybackEngine, NoPacketsAndMoreThan200AreAnIllegalArgument) {
     const auto extension = makeExtension();
     for (const size_t count : {0U, 201U, 10000U}) {
         log.clear();
-        EXPECT_EQ(exceptionOf(extension->performPlaybackEngine(Packets(count), false, -5)),
+        EXPECT_EQ(exceptionOf(extension->performPlaybackEngine(PlaybackPackets(count), false, -5)),
                   EX_ILLEGAL_ARGUMENT)
                 << count;
         EXPECT_THAT(
@@ -164,7 +166,7 @@ TEST_F(PlaybackEngine, NegativeRepeatCountIsAnIllegalArgument) {
     const auto extension = makeExtension();
     for (const int32_t count : {-1, -5, kIntMin}) {
         log.clear();
-        EXPECT_EQ(exceptionOf(extension->performPlaybackEngine(Packets(1), true, count)),
+        EXPECT_EQ(exceptionOf(extension->performPlaybackEngine(PlaybackPackets(1), true, count)),
                   EX_ILLEGAL_ARGUMENT);
         EXPECT_THAT(
                 log.lines(),
@@ -184,14 +186,15 @@ TEST_F(PlaybackEngine, CountOfPacketsIsLookedAtBeforeTheRepeatCount) {
 }
 
 // One failure of the driver while it gets "5.100": what was written, and the service's last lines.
-struct Failure {
+struct PlaybackFailure {
     const char* name;
     Fault fault;
     std::vector<std::string> writes;
     std::vector<std::string> lines;  // from the service's own
 };
 
-class FailingPlayback : public PlaybackEngine, public testing::WithParamInterface<Failure> {};
+class FailingPlayback : public PlaybackEngine,
+                        public testing::WithParamInterface<PlaybackFailure> {};
 
 TEST_P(FailingPlayback, IsAnIllegalStateAndLeavesWhatWasWritten) {
     const auto extension = makeExtension();
@@ -206,33 +209,33 @@ TEST_P(FailingPlayback, IsAnIllegalStateAndLeavesWhatWasWritten) {
     EXPECT_EQ(std::vector(lines.begin() + 6, lines.end()), GetParam().lines);
 }
 
-const std::string kSwitched = kIndex + " \"65534\\n\"";
-const std::string kQueued = kQueue + " \"5.100\\0\"";
+const std::string kSwitched = kLedsIndex + " \"65534\\n\"";
+const std::string kQueued = kLedsQueue + " \"5.100\\0\"";
 
-const Failure kFailures[] = {
+const PlaybackFailure kFailures[] = {
         {"SwitchOpen",
-         {.path = kIndex, .operation = Operation::kOpen, .error = EACCES},
+         {.path = kLedsIndex, .operation = Operation::kOpen, .error = EACCES},
          {},
          {"I V_4_0: performPlaybackEngine write 0xFFFE fail"}},
         {"SwitchWrite",
-         {.path = kIndex, .operation = Operation::kWrite, .error = EIO},
+         {.path = kLedsIndex, .operation = Operation::kWrite, .error = EIO},
          {},
          {"I V_4_0: performPlaybackEngine write 0xFFFE fail"}},
         {"SwitchShort",
-         {.path = kIndex, .operation = Operation::kWrite, .limit = 5},
-         {kIndex + " \"65534\""},
+         {.path = kLedsIndex, .operation = Operation::kWrite, .limit = 5},
+         {kLedsIndex + " \"65534\""},
          {"I V_4_0: performPlaybackEngine write 0xFFFE fail"}},
         {"QueueOpen",
-         {.path = kQueue, .operation = Operation::kOpen, .error = ENOENT},
+         {.path = kLedsQueue, .operation = Operation::kOpen, .error = ENOENT},
          {kSwitched},
          {"I V_4_0: performPlaybackEngine is fail: 2"}},
         {"QueueWrite",
-         {.path = kQueue, .operation = Operation::kWrite, .error = EIO},
+         {.path = kLedsQueue, .operation = Operation::kWrite, .error = EIO},
          {kSwitched},
          {"I V_4_0: ret : -1", "I V_4_0: performPlaybackEngine repeat error"}},
         {"QueueTakesAllButTheZeroByte",
-         {.path = kQueue, .operation = Operation::kWrite, .limit = 5},
-         {kSwitched, kQueue + " \"5.100\""},
+         {.path = kLedsQueue, .operation = Operation::kWrite, .limit = 5},
+         {kSwitched, kLedsQueue + " \"5.100\""},
          {"I V_4_0: ret : 5", "I V_4_0: performPlaybackEngine repeat error"}},
         {"StartState",
          {.path = kLeds + "state", .operation = Operation::kWrite, .error = EIO},
@@ -245,16 +248,16 @@ const Failure kFailures[] = {
 };
 
 INSTANTIATE_TEST_SUITE_P(Extension, FailingPlayback, testing::ValuesIn(kFailures),
-                         rowName<Failure>);
+                         rowName<PlaybackFailure>);
 
 TEST_F(PlaybackEngine, InterruptedCallsAreRepeated) {
     const auto extension = makeExtension();
-    for (const std::string& node : {kIndex, kQueue, kLeds + "state"}) {
+    for (const std::string& node : {kLedsIndex, kLedsQueue, kLeds + "state"}) {
         kernel.addFault({.path = node, .operation = Operation::kOpen, .error = EINTR, .times = 2});
         kernel.addFault({.path = node, .operation = Operation::kWrite, .error = EINTR, .times = 2});
     }
     EXPECT_TRUE(extension->performPlaybackEngine({packet(5, 100, 0)}, false, 0).isOk());
-    EXPECT_EQ(kernel.text(kQueue), std::string("5.100\0", 6));
+    EXPECT_EQ(kernel.text(kLedsQueue), std::string("5.100\0", 6));
 }
 
 TEST_F(PlaybackEngine, OnForceFeedbackHasNoQueueAndIsAnIllegalState) {

@@ -16,7 +16,7 @@ using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 
 // The force-feedback operations that patterns call, one of which may fail.
-class FakeForceFeedback : public HwApi {
+class FailingForceFeedback : public HwApi {
   public:
     bool setForceFeedbackAmplitude(int gain) override {
         return answer("gain " + std::to_string(gain));
@@ -47,7 +47,7 @@ class PatternOnForceFeedback : public ServiceTest {
         log.clear();
     }
 
-    FakeForceFeedback hwApi;
+    FailingForceFeedback hwApi;
 };
 
 TEST_F(PatternOnForceFeedback, OnceSetsGainAndIndexAndStarts) {

@@ -19,11 +19,6 @@ using ::testing::ElementsAreArray;
 using ::testing::IsEmpty;
 using Primitive = CompositePrimitive;
 
-constexpr float kNan = std::numeric_limits<float>::quiet_NaN();
-constexpr float kInfinity = std::numeric_limits<float>::infinity();
-constexpr int32_t kIntMin = std::numeric_limits<int32_t>::min();
-constexpr int32_t kIntMax = std::numeric_limits<int32_t>::max();
-
 // A hardware layer that takes every waveform string and keeps the last.
 class WaveformTaker : public HwApi {
   public:

@@ -17,13 +17,7 @@ using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 using Primitive = CompositePrimitive;
 
-constexpr int32_t kIntMin = std::numeric_limits<int32_t>::min();
-constexpr int32_t kIntMax = std::numeric_limits<int32_t>::max();
-
 constexpr int kNoPrimitives[] = {9, -1, kIntMin, kIntMax};
-
-// The list of driver features, by which the compose feature is known.
-const std::string kFunctions = kInfo + "functions";
 
 using CompositionLimits = VibratorTest;
 

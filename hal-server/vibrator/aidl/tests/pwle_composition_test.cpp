@@ -23,11 +23,6 @@ using ::testing::IsEmpty;
 
 using Entries = std::vector<PrimitivePwle>;
 
-constexpr float kNan = std::numeric_limits<float>::quiet_NaN();
-constexpr float kInfinity = std::numeric_limits<float>::infinity();
-constexpr int32_t kIntMin = std::numeric_limits<int32_t>::min();
-constexpr int32_t kIntMax = std::numeric_limits<int32_t>::max();
-
 PrimitivePwle ramp(float startAmplitude, float startFrequency, float endAmplitude,
                    float endFrequency, int32_t durationMs) {
     ActivePwle active;

@@ -4,6 +4,8 @@
 // process-wide values, and the phones that tests ask for.
 #pragma once
 
+#include <cstdint>
+#include <limits>
 #include <memory>
 #include <string>
 
@@ -37,3 +39,10 @@ class ServiceTest : public ::testing::Test {
 inline const std::string kLegacy = "/sys/class/timed_output/vibrator/";
 inline const std::string kLeds = "/sys/class/leds/vibrator/";
 inline const std::string kInfo = "/sys/class/vib_info_class/vib_support_info/";
+inline const std::string kFunctions = kInfo + "functions";
+
+// The ends of what a parameter may be.
+inline constexpr int32_t kIntMin = std::numeric_limits<int32_t>::min();
+inline constexpr int32_t kIntMax = std::numeric_limits<int32_t>::max();
+inline constexpr float kNan = std::numeric_limits<float>::quiet_NaN();
+inline constexpr float kInfinity = std::numeric_limits<float>::infinity();

@@ -24,8 +24,6 @@ using ::testing::Contains;
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
 
-const std::string kFunctions = kInfo + "functions";
-
 using Life = VibratorTest;
 
 TEST_F(Life, BeginningAndEndAreLogged) {
