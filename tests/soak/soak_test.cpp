@@ -13,6 +13,7 @@
 #include <filesystem>
 #include <fstream>
 #include <functional>
+#include <iostream>
 #include <map>
 #include <memory>
 #include <random>
@@ -45,6 +46,7 @@ using std::chrono::seconds;
 
 constexpr uid_t kUsers[] = {kRoot, kSystem, kShell, kApp};
 constexpr const char* kSanitizerReports = "/run/soak";
+constexpr const char* kBinderState = "/sys/kernel/debug/binder/state";
 constexpr size_t kRequestsPerRound = std::size(kUsers) * User::kPerRound;
 constexpr int kFaultsPerRound = 20;
 constexpr int kUserDeathsPerRound = 2;
@@ -100,6 +102,8 @@ class Soak : public testing::TestWithParam<const char*> {
         for (const auto& report : std::filesystem::directory_iterator(kSanitizerReports)) {
             ADD_FAILURE() << std::ifstream(report.path()).rdbuf();
         }
+        // Whose nodes and references these are.
+        if (HasFailure()) std::cout << std::ifstream(kBinderState).rdbuf();
     }
 
     // The manager's death, and another one in its place; that is init's work, and there is none here.
