@@ -16,6 +16,7 @@ using android::base::Result;
 using std::chrono::milliseconds;
 
 constexpr std::string_view kDone = "ok";
+constexpr std::string_view kKernelsNodes = "the nodes are the kernel's: read and write their files";
 constexpr unsigned kLongestWait = 3600000;  // an hour, in milliseconds
 
 std::string refusal(std::string_view why) {
@@ -73,7 +74,7 @@ int ControlRequests::runDue() {
 std::string ControlRequests::addFault(std::string_view json) {
     Result<Fault> fault = parseFault(json, mProfile);
     if (!fault) return refusal(fault.error().message());
-    mFaults.add(std::move(*fault));
+    if (auto done = mFaults.add(std::move(*fault)); !done) return refusal(done.error().message());
     return std::string(kDone);
 }
 
@@ -109,7 +110,8 @@ std::string ControlRequests::schedule(std::string_view verb, std::string_view ar
 }
 
 std::string ControlRequests::getNode(std::string_view path) const {
-    const Node* node = mTree.nodeAt(path);
+    if (mTree == nullptr) return refusal(kKernelsNodes);
+    const Node* node = mTree->nodeAt(path);
     if (node == nullptr) return noSuchNode(path);
     nlohmann::ordered_json content;
     putBytes(content, "text", "hex", node->text());
@@ -119,7 +121,8 @@ std::string ControlRequests::getNode(std::string_view path) const {
 
 std::string ControlRequests::setNode(std::string_view argument) const {
     const auto [path, content] = splitWord(argument);
-    Node* node = mTree.nodeAt(path);
+    if (mTree == nullptr) return refusal(kKernelsNodes);
+    Node* node = mTree->nodeAt(path);
     if (node == nullptr) return noSuchNode(path);
     if (content.empty()) return refusal("set: a JSON string expected after the path");
     const Result<Json> text = parseJson(content);

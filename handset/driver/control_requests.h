@@ -34,9 +34,9 @@ namespace handset {
 
 class ControlRequests {
   public:
-    // The references outlive the object. `settle` returns once the journal has what was done so
+    // The references outlive the object. `tree` is null where the nodes are the kernel's. `settle` returns once the journal has what was done so
     // far; it is called before each request.
-    ControlRequests(const Profile& profile, const NodeTree& tree, FaultInjector& faults,
+    ControlRequests(const Profile& profile, const NodeTree* tree, FaultInjector& faults,
                     Journal& journal, std::function<void()> settle)
         : mProfile(profile),
           mTree(tree),
@@ -64,7 +64,7 @@ class ControlRequests {
     std::string setNode(std::string_view argument) const;
 
     const Profile& mProfile;
-    const NodeTree& mTree;
+    const NodeTree* mTree;
     FaultInjector& mFaults;
     Journal& mJournal;
     std::function<void()> mSettle;

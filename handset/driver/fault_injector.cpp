@@ -8,9 +8,10 @@
 
 namespace handset {
 
-void FaultInjector::add(Fault fault) {
+android::base::Result<void> FaultInjector::add(Fault fault) {
     const std::lock_guard lock(mMutex);
     mRecords.push_back({std::move(fault)});
+    return {};
 }
 
 void FaultInjector::clear() {
@@ -18,11 +19,11 @@ void FaultInjector::clear() {
     {
         const std::lock_guard lock(mMutex);
         mRecords.clear();
-        for (auto& [node, plug] : mPlugs) {
-            if (!std::exchange(plug.plugged, true)) back.push_back(node);
+        for (const auto& [node, plug] : mPlugs) {
+            if (!plug.plugged) back.push_back(node);
         }
     }
-    for (const std::string& node : back) announce(node, true);
+    for (const std::string& node : back) plug(node);
 }
 
 std::vector<FaultInjector::Record> FaultInjector::list() const {

@@ -11,6 +11,7 @@
 #include <string_view>
 #include <vector>
 
+#include <android-base/result.h>
 #include <android-base/thread_annotations.h>
 
 #include "handset/driver/fault.h"
@@ -21,6 +22,11 @@ namespace handset {
 // call, the one added first decides. All operations may be called from any thread.
 class FaultInjector {
   public:
+    FaultInjector() = default;
+    virtual ~FaultInjector() = default;
+    FaultInjector(const FaultInjector&) = delete;
+    FaultInjector& operator=(const FaultInjector&) = delete;
+
     // A fault with what has become of it.
     struct Record {
         Fault fault;
@@ -32,13 +38,14 @@ class FaultInjector {
     using OnPlug = std::function<void(std::string_view node, bool plugged)>;
     void setOnPlug(OnPlug onPlug) { mOnPlug = std::move(onPlug); }
 
-    void add(Fault fault);
+    // An error where the driver cannot have the fault; this one has them all.
+    virtual android::base::Result<void> add(Fault fault);
 
     // Forgets every fault; what was unplugged is plugged in again.
-    void clear();
+    virtual void clear();
 
     // The faults in the order in which they were added.
-    std::vector<Record> list() const;
+    virtual std::vector<Record> list() const;
 
     // Counts one call and says what happens to it. `unplugs` is what unplugsOf() said when the file
     // was opened: a file of a device that has gone since stays dead when another one comes. A read
@@ -48,8 +55,8 @@ class FaultInjector {
     FaultAction nextOf(std::string_view node, FaultOp op, uint64_t unplugs, bool continues = false);
 
     // Takes a node or the motor away, or brings it back.
-    void unplug(std::string_view node);
-    void plug(std::string_view node);
+    virtual void unplug(std::string_view node);
+    virtual void plug(std::string_view node);
 
     // True once a fault or unplug() has taken `node` away.
     bool isUnplugged(std::string_view node) const;

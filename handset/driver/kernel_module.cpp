@@ -70,20 +70,31 @@ Result<void> giveToSystemUser(const std::vector<NodeProfile>& nodes) {
     return {};
 }
 
+// Takes a member out of a line: null where there is none.
+JournalFields taken(JournalFields& fields, const char* key) {
+    JournalFields value = fields.value(key, JournalFields());
+    fields.erase(key);
+    return value;
+}
+
 // A line of the report as the journal has it.
-void record(Journal& journal, const std::string& line) {
+void record(Journal& journal, KernelFaults& faults, const std::string& line) {
     JournalFields fields = JournalFields::parse(line, nullptr, false);
     if (!fields.is_object()) return;
     const Caller caller = {fields.value("pid", 0), fields.value("uid", 0U)};
     fields.erase("pid");
     fields.erase("uid");
-    if (const auto digits = fields.find("hex"); digits != fields.end()) {
-        const std::string bytes = decodeHex(digits->get<std::string>()).value_or("");
-        const auto result = fields["result"];
-        fields.erase("hex");
-        fields.erase("result");
-        putBytes(fields, "data", "hex", bytes);
+    fields["result"] = resultOf(fields.value("result", 0));
+    const JournalFields fault = taken(fields, "fault");
+    const JournalFields took = taken(fields, "took");
+    if (const JournalFields digits = taken(fields, "hex"); digits.is_string()) {
+        const JournalFields result = taken(fields, "result");
+        putBytes(fields, "data", "hex", decodeHex(digits.get<std::string>()).value_or(""));
         fields["result"] = result;
+    }
+    if (fault.is_number()) {
+        fields["fault"] = toJson(faults.struck(fault.get<size_t>()));
+        fields["took"] = took;
     }
     journal.record(caller, fields);
 }
@@ -101,7 +112,9 @@ std::optional<unsigned> findEvent(const std::string& name) {
 }
 
 Result<std::string> moduleParameters(const Profile& profile) {
-    if (!profile.faults.empty()) return Error() << "the kernel module takes no faults";
+    for (const Fault& fault : profile.faults) {
+        if (auto done = kernelFaultRequest(fault); !done) return done.error();
+    }
     std::vector<std::string> nodes;
     for (const NodeProfile& node : profile.nodes) {
         Result<std::string> description = describe(node);
@@ -148,7 +161,7 @@ KernelModule::~KernelModule() {
     syscall(SYS_delete_module, kModule, 0);
 }
 
-void KernelModule::report(Journal& journal) {
+void KernelModule::report(Journal& journal, KernelFaults& faults) {
     std::array<char, 16384> part;
     for (;;) {
         const ssize_t size = read(mReport.get(), part.data(), part.size());
@@ -162,7 +175,7 @@ void KernelModule::report(Journal& journal) {
         size_t begin = 0;
         for (size_t end = mRest.find('\n'); end != std::string::npos;
              end = mRest.find('\n', begin)) {
-            record(journal, mRest.substr(begin, end - begin));
+            record(journal, faults, mRest.substr(begin, end - begin));
             begin = end + 1;
         }
         mRest.erase(0, begin);

@@ -12,12 +12,13 @@
 #include <android-base/unique_fd.h>
 
 #include "handset/driver/journal.h"
+#include "handset/driver/kernel_faults.h"
 #include "handset/driver/profile.h"
 
 namespace handset {
 
 // What the module is loaded with to be the profile's phone. An error for what it cannot be: a node
-// that is not /sys/class/CLASS/DEVICE/NAME, a motor of a chosen number, faults.
+// that is not /sys/class/CLASS/DEVICE/NAME, a motor of a chosen number, faults it cannot have.
 android::base::Result<std::string> moduleParameters(const Profile& profile);
 
 // The number N of the kernel's input device of that name, as /dev/input/eventN; empty without one.
@@ -40,9 +41,10 @@ class KernelModule {
     // The number of the motor's /dev/input/eventN; 0 without a motor.
     unsigned event() const { return mEvent; }
 
-    // Puts what the module has been asked since the last time into the journal. Opens and closes
-    // are not among it: a driver does not learn of them.
-    void report(Journal& journal);
+    // Puts what the module has been asked since the last time into the journal, with what `faults`
+    // knows of the calls it struck. Opens and closes are not among it: a driver does not learn of
+    // them.
+    void report(Journal& journal, KernelFaults& faults);
 
   private:
     KernelModule() = default;

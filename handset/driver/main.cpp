@@ -66,7 +66,8 @@ Requests on the control socket, one a line, answered by "ok ..." or "error MESSA
   set PATH "TEXT"   change a node's text            stop    end
   settle            wait until the journal has every close so far
 With --module the kernel's driver takes the place of the simulated one: its nodes are everybody's, the
-journal has no opens and closes, and of the requests there are reset, settle and stop.
+journal has no opens and closes, faults strike the calls that a driver is told of, and get and set are
+refused.
 
 Exit status: 0 stopped, 1 could not start or lost its mount, 2 wrong usage or a wrong profile.)";
 
@@ -112,18 +113,12 @@ Result<void> showFiles(const Profile& profile, PlacedFiles& files, StagingDirect
     return list.show();
 }
 
-// What a driver with the kernel module can be asked for; the journal is complete by then.
-std::string answerForModule(std::string_view request, Journal& journal, bool* stopWanted) {
-    if (request == "reset") journal.reset();
-    if (request == "stop") *stopWanted = true;
-    if (request == "reset" || request == "settle" || request == "stop") return "ok";
-    return "error with the kernel module only reset, settle and stop are accepted";
-}
-
 // The phone with the kernel module, until something asks for the end.
 int runModule(const Options& options, const Profile& profile, Journal& journal, int signals) {
     Result<StagingDirectory> staging = StagingDirectory::create();
     if (!staging) return fail(kFailed, staging.error().message());
+    if (auto done = moduleParameters(profile); !done)
+        return fail(kBadInput, fmt::format("{}: {}", options.profile, done.error().message()));
     const auto module = KernelModule::load(options.module, profile);
     if (!module) return fail(kFailed, module.error().message());
     PlacedFiles files;
@@ -135,13 +130,23 @@ int runModule(const Options& options, const Profile& profile, Journal& journal, 
     if (profile.inputDevices) {
         if (auto done = list.show(); !done) return fail(kFailed, done.error().message());
     }
-    bool stopWanted = false;
+    KernelFaults faults([&] { (*module)->report(journal, faults); });
+    faults.setOnPlug([&](std::string_view node, bool plugged) {
+        journal.record({}, {{"op", plugged ? "plug" : "unplug"}, {"node", node}});
+        if (node != kMotorNode) return;
+        Result<void> done;
+        if (plugged) done = EventNode().handOver((*module)->event());
+        if (done && profile.inputDevices) done = list.setPlugged(plugged);
+        if (!done) fail(kFailed, done.error().message());
+    });
+    for (const Fault& fault : profile.faults) {
+        if (auto done = faults.add(fault); !done) return fail(kFailed, done.error().message());
+    }
+    ControlRequests requests(profile, nullptr, faults, journal, [&] { faults.drain(); });
     std::unique_ptr<ControlSocket> control;
     if (!options.control.empty()) {
-        auto listening = ControlSocket::listenAt(options.control, [&](std::string_view line) {
-            (*module)->report(journal);
-            return answerForModule(line, journal, &stopWanted);
-        });
+        auto listening = ControlSocket::listenAt(
+                options.control, [&](std::string_view line) { return requests.answer(line); });
         if (!listening) return fail(kBadInput, listening.error().message());
         control = std::move(*listening);
     }
@@ -149,12 +154,13 @@ int runModule(const Options& options, const Profile& profile, Journal& journal, 
     pollfd polled[] = {{signals, POLLIN, 0},
                        {(*module)->descriptor(), POLLIN, 0},
                        {control != nullptr ? control->descriptor() : -1, POLLIN, 0}};
-    while (!stopWanted && polled[0].revents == 0) {
-        if (poll(polled, std::size(polled), -1) < 0 && errno != EINTR) return kFailed;
-        if (polled[1].revents != 0) (*module)->report(journal);
+    while (!requests.isStopWanted() && polled[0].revents == 0) {
+        if (poll(polled, std::size(polled), requests.runDue()) < 0 && errno != EINTR)
+            return kFailed;
+        if (polled[1].revents != 0) faults.drain();
         if (polled[2].revents != 0) control->serve();
     }
-    (*module)->report(journal);
+    faults.drain();
     return kStopped;
 }
 
@@ -215,7 +221,7 @@ int run(const Options& options) {
             SysfsServer::start(tree, faults, **journal, ended.get());
     if (!server) return fail(kFailed, server.error().message());
 
-    ControlRequests requests(*profile, tree, faults, **journal, [&] { (*server)->settle(); });
+    ControlRequests requests(*profile, &tree, faults, **journal, [&] { (*server)->settle(); });
     std::unique_ptr<ControlSocket> control;
     if (!options.control.empty()) {
         auto listening = ControlSocket::listenAt(

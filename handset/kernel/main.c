@@ -33,6 +33,7 @@ no_nodes:
 
 static void __exit qvx_vibrator_exit(void)
 {
+	qvx_faults_exit();
 	qvx_motor_exit();
 	qvx_nodes_exit();
 	qvx_report_exit();

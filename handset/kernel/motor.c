@@ -5,9 +5,11 @@
  */
 #include <linux/err.h>
 #include <linux/input.h>
+#include <linux/minmax.h>
 #include <linux/mm.h>
 #include <linux/module.h>
 #include <linux/string.h>
+#include <linux/workqueue.h>
 
 #include "qvx_vibrator.h"
 
@@ -22,6 +24,12 @@ module_param_named(motor, motor_name, charp, 0444);
 MODULE_PARM_DESC(motor, "Name of the input device; empty: no motor");
 
 static struct input_dev *motor;
+static void remove_motor(struct work_struct *work);
+static DECLARE_WORK(unplugging, remove_motor);
+static struct qvx_target motor_target = {.unplug = &unplugging};
+
+/* A client has closed the motor: the core erases its effects. */
+static bool closing;
 
 /* The motor's waveform memory: each effect's samples, at its id. */
 static s16 *samples[FF_MAX_EFFECTS];
@@ -45,11 +53,12 @@ static int motor_upload(struct input_dev *device, struct ff_effect *effect,
 	const struct ff_periodic_effect *periodic = &effect->u.periodic;
 	const struct ff_envelope *envelope = &periodic->envelope;
 	s16 *copy = copy_samples(effect);
+	struct qvx_strike strike;
+	int error;
 
 	if (IS_ERR(copy))
 		return PTR_ERR(copy);
-	kvfree(samples[effect->id]);
-	samples[effect->id] = copy;
+	error = qvx_meet_fault(&motor_target, QVX_UPLOAD, NULL, &strike);
 	qvx_report_bytes(
 		copy, copy ? periodic->custom_len * sizeof(s16) : 0,
 		"\"op\":\"upload\",\"node\":\"motor\",\"id\":%d,\"result\":%d,"
@@ -58,25 +67,48 @@ static int motor_upload(struct input_dev *device, struct ff_effect *effect,
 		"\"magnitude\":%d,\"offset\":%d,\"phase\":%u,"
 		"\"attack_length\":%u,\"attack_level\":%u,"
 		"\"fade_length\":%u,\"fade_level\":%u,"
-		"\"custom_len\":%u,\"custom_hex\":",
-		effect->id, effect->id, effect->type, periodic->waveform,
-		effect->replay.length, effect->replay.delay, effect->direction,
-		effect->trigger.button, effect->trigger.interval,
-		periodic->period, periodic->magnitude, periodic->offset,
-		periodic->phase, envelope->attack_length,
+		"\"custom_len\":%u%s,\"custom_hex\":",
+		old ? effect->id : -1, error ? error : effect->id, effect->type,
+		periodic->waveform, effect->replay.length, effect->replay.delay,
+		effect->direction, effect->trigger.button,
+		effect->trigger.interval, periodic->period, periodic->magnitude,
+		periodic->offset, periodic->phase, envelope->attack_length,
 		envelope->attack_level, envelope->fade_length,
-		envelope->fade_level, periodic->custom_len);
-	return 0;
+		envelope->fade_level, periodic->custom_len, strike.members);
+	if (!error)
+		swap(samples[effect->id], copy);
+	kvfree(copy);
+	return error;
 }
 
 static int motor_erase(struct input_dev *device, int id)
 {
-	kvfree(samples[id]);
-	samples[id] = NULL;
+	struct qvx_strike strike = {};
+	int error = 0;
+
+	if (!closing)
+		error = qvx_meet_fault(&motor_target, QVX_ERASE, NULL, &strike);
 	qvx_report("\"op\":\"erase\",\"node\":\"motor\",\"id\":%d,"
-		   "\"result\":0",
-		   id);
-	return 0;
+		   "\"result\":%d%s",
+		   id, error, strike.members);
+	if (!error) {
+		kvfree(samples[id]);
+		samples[id] = NULL;
+	}
+	return error;
+}
+
+/* Evdev calls this and all that uploads and erases under one lock. */
+static int motor_flush(struct input_dev *device, struct file *file)
+{
+	int error;
+
+	if (!file)
+		return 0; /* the motor goes, and its effects with it */
+	closing = true;
+	error = input_ff_flush(device, file);
+	closing = false;
+	return error;
 }
 
 static void report_event(unsigned int code, int value)
@@ -111,6 +143,7 @@ static int create_effects(struct input_dev *device)
 	device->ff->erase = motor_erase;
 	device->ff->playback = motor_playback;
 	device->ff->set_gain = motor_set_gain;
+	device->flush = motor_flush;
 	return 0;
 }
 
@@ -118,7 +151,8 @@ int qvx_motor_init(void)
 {
 	int error;
 
-	if (!*motor_name)
+	flush_work(&unplugging);
+	if (!*motor_name || motor)
 		return 0;
 	motor = input_allocate_device();
 	if (!motor)
@@ -139,12 +173,26 @@ int qvx_motor_init(void)
 	return error;
 }
 
-void qvx_motor_exit(void)
+static void remove_motor(struct work_struct *work)
 {
 	int id;
 
 	if (motor)
 		input_unregister_device(motor);
-	for (id = 0; id < FF_MAX_EFFECTS; id++)
+	motor = NULL;
+	for (id = 0; id < FF_MAX_EFFECTS; id++) {
 		kvfree(samples[id]);
+		samples[id] = NULL;
+	}
+}
+
+struct qvx_target *qvx_motor_target(void)
+{
+	return *motor_name ? &motor_target : NULL;
+}
+
+void qvx_motor_exit(void)
+{
+	cancel_work_sync(&unplugging);
+	remove_motor(NULL);
 }

@@ -20,6 +20,7 @@
 struct qvx_node {
 	struct list_head link;
 	struct device_attribute attribute;
+	struct qvx_target target;
 	bool hold;
 	size_t length;
 	char text[PAGE_SIZE];
@@ -68,15 +69,22 @@ static ssize_t node_show(struct device *device,
 			 struct device_attribute *attribute, char *buffer)
 {
 	struct qvx_node *node = node_of(attribute);
-	size_t shown;
+	struct qvx_strike strike;
+	ssize_t shown;
+	int error = qvx_meet_fault(&node->target, QVX_READ, buffer, &strike);
 
 	mutex_lock(&text_lock);
-	/* A page filled to its end is more than sysfs lets a node show. */
-	shown = min_t(size_t, node->length, PAGE_SIZE - 1);
-	memcpy(buffer, node->text, shown);
+	if (strike.shown < 0) {
+		/* A page filled to its end is more than sysfs shows. */
+		strike.shown = min_t(size_t, node->length, PAGE_SIZE - 1);
+		memcpy(buffer, node->text, strike.shown);
+	}
 	mutex_unlock(&text_lock);
-	qvx_report("\"op\":\"read\"," NODE_PATH ",\"result\":%zu",
-		   NODE_PATH_OF(device, attribute), shown);
+	shown = min_t(unsigned int, strike.shown, strike.most);
+	if (error)
+		shown = error;
+	qvx_report("\"op\":\"read\"," NODE_PATH ",\"result\":%zd%s",
+		   NODE_PATH_OF(device, attribute), shown, strike.members);
 	return shown;
 }
 
@@ -85,19 +93,43 @@ static ssize_t node_store(struct device *device,
 			  size_t size)
 {
 	struct qvx_node *node = node_of(attribute);
+	struct qvx_strike strike;
+	int error = qvx_meet_fault(&node->target, QVX_WRITE, NULL, &strike);
+	ssize_t taken = min_t(size_t, size, strike.most);
 
+	if (error)
+		taken = error;
 	mutex_lock(&text_lock);
-	if (!node->hold) {
+	if (!node->hold && !error) {
 		/* sysfs hands over a page at most. */
-		memcpy(node->text, bytes, size);
-		node->length = size;
+		memcpy(node->text, bytes, taken);
+		node->length = taken;
 	}
 	mutex_unlock(&text_lock);
 	qvx_report_bytes(bytes, size,
 			 "\"op\":\"write\"," NODE_PATH
-			 ",\"result\":%zu,\"hex\":",
-			 NODE_PATH_OF(device, attribute), size);
-	return size;
+			 ",\"result\":%zd%s,\"hex\":",
+			 NODE_PATH_OF(device, attribute), taken,
+			 strike.members);
+	return taken;
+}
+
+struct qvx_target *qvx_target_of(const char *name)
+{
+	struct qvx_directory *directory;
+	struct qvx_node *node;
+	char path[256];
+
+	list_for_each_entry(directory, &directories, link) {
+		list_for_each_entry(node, &directory->nodes, link) {
+			snprintf(path, sizeof(path), "%s/%s/%s",
+				 directory->class_name, directory->name,
+				 node->attribute.attr.name);
+			if (!strcmp(path, name))
+				return &node->target;
+		}
+	}
+	return strcmp(name, "motor") ? NULL : qvx_motor_target();
 }
 
 /* What a node may be asked for: the third word of its description. */

@@ -29,7 +29,7 @@
 #include "qvx_vibrator.h"
 
 #define QVX_REPORT_SIZE (1U << 18) /* bytes of lines nobody has read yet */
-#define QVX_SHORT_LINE 256
+#define QVX_SHORT_LINE 320
 #define QVX_LONG_HEAD 640 /* of a line with bytes: all before them */
 
 static DEFINE_SPINLOCK(report_lock); /* writers, among them the input core */

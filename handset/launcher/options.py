@@ -83,7 +83,7 @@ def parse(program, description, words, takes_command):
                         help="processors (default 1)")
     parser.add_argument("--driver", metavar="WHICH", default="simulated",
                         help="simulated (default), or kernel: the nodes and the motor of the kernel "
-                             "module, without faults and unplugging")
+                             "module")
     parser.add_argument("--counted", action="store_true",
                         help="let the guest's clock count instructions: 1 ns is one instruction")
     parser.add_argument("--timing", metavar="FILE", type=path,

@@ -31,7 +31,7 @@ class Requests : public testing::Test {
     FaultInjector mFaults;
     std::unique_ptr<Journal> mJournal = std::move(*Journal::create(fileIn(mDirectory, "journal")));
     std::function<void()> mLate = [] {};
-    ControlRequests mRequests{mProfile, mTree, mFaults, *mJournal, [this] { mLate(); }};
+    ControlRequests mRequests{mProfile, &mTree, mFaults, *mJournal, [this] { mLate(); }};
 };
 
 TEST_F(Requests, FaultTakesEffectAtOnce) {

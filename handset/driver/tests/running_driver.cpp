@@ -15,18 +15,22 @@ namespace {
 
 using android::base::Result;
 
-qvx::test::Program programIn(const TemporaryDir& directory, const std::string& profile) {
+qvx::test::Program programIn(const TemporaryDir& directory, const std::string& profile,
+                             const std::string& module) {
     std::ofstream(fileIn(directory, "profile.json")) << profile;
-    return {.words = {QVX_DRIVER, "--profile", fileIn(directory, "profile.json"), "--journal",
+    qvx::test::Program program{
+            .words = {QVX_DRIVER, "--profile", fileIn(directory, "profile.json"), "--journal",
                       fileIn(directory, "journal"), "--control", fileIn(directory, "control")},
             .errors = fileIn(directory, "errors"),
             .tellsReadiness = true};
+    if (!module.empty()) program.words.insert(program.words.end(), {"--module", module});
+    return program;
 }
 
 }  // namespace
 
-RunningDriver::RunningDriver(const std::string& profile)
-    : mProcess(qvx::test::kRoot, programIn(mDirectory, profile)) {}
+RunningDriver::RunningDriver(const std::string& profile, const std::string& module)
+    : mProcess(qvx::test::kRoot, programIn(mDirectory, profile, module)) {}
 
 RunningDriver::~RunningDriver() {
     end(SIGTERM);

@@ -7,6 +7,8 @@
 #include <string>
 #include <vector>
 
+#include <gtest/gtest.h>
+
 #include "handset/driver/tests/client_process.h"
 #include "handset/driver/tests/test_files.h"
 #include "tests/support/process.h"
@@ -17,10 +19,17 @@ namespace handset {
 inline const std::string kDuration = "/sys/class/leds/vibrator/duration";
 inline const std::string kWaves = "/sys/class/leds/vibrator/num_waves";
 
+// What tests of both drivers are run with: the simulated one, and the kernel module.
+inline const char* const kBothDrivers[] = {"", QVX_MODULE};
+inline std::string driverName(const testing::TestParamInfo<const char*>& info) {
+    return info.index == 0 ? "Simulated" : "Kernel";
+}
+
 class RunningDriver {
   public:
-    // Starts the driver with a profile's text and waits until it is ready or has ended.
-    explicit RunningDriver(const std::string& profile);
+    // Starts the driver with a profile's text, with the kernel module in `module` if there is one,
+    // and waits until it is ready or has ended.
+    explicit RunningDriver(const std::string& profile, const std::string& module = "");
 
     // Stops it, if it runs still.
     ~RunningDriver();

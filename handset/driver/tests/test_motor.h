@@ -5,9 +5,12 @@
 
 #include <fcntl.h>
 
+#include <climits>
 #include <string>
 #include <vector>
 
+#include "handset/driver/event_node.h"
+#include "handset/driver/kernel_module.h"
 #include "handset/driver/tests/motor_file.h"
 #include "handset/driver/tests/running_driver.h"
 
@@ -22,10 +25,15 @@ inline std::string profileWith(const std::string& faults) {
     return R"({"motor": {"event": 9, "effects_max": 3}, "faults": [)" + faults + "]}";
 }
 
+// Where the motor of a profile that names no number is, for whoever sees its driver's mounts.
+inline std::string motorPath() {
+    return eventNodePath(findEvent(MotorProfile().name).value_or(UINT_MAX));
+}
+
 // The motor of that profile, open.
 class OpenMotor : public MotorFile {
   public:
-    explicit OpenMotor(int flags = O_RDWR) : MotorFile(kMotor, flags) {}
+    explicit OpenMotor(int flags = O_RDWR) : MotorFile(motorPath(), flags) {}
 };
 
 // The part of a line from "op" on, of the journal's lines with that op.

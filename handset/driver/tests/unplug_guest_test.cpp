@@ -8,8 +8,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include "handset/driver/tests/motor_file.h"
-#include "handset/driver/tests/running_driver.h"
+#include "handset/driver/tests/test_motor.h"
 
 namespace handset {
 namespace {
@@ -17,46 +16,60 @@ namespace {
 using testing::HasSubstr;
 using testing::Not;
 
-constexpr const char* kMotor = "/dev/input/event9";
 constexpr const char* kDevices = "/proc/bus/input/devices";
 
-TEST(Unplug, AMotorThatComesBackServesNewFilesOnly) {
-    const RunningDriver driver(R"({"motor": {"event": 9}})");
+// With either driver.
+class Unplug : public testing::TestWithParam<const char*> {};
+
+INSTANTIATE_TEST_SUITE_P(With, Unplug, testing::ValuesIn(kBothDrivers), driverName);
+
+TEST_P(Unplug, AMotorThatComesBackServesNewFilesOnly) {
+    const RunningDriver driver(R"({"motor": {}})", GetParam());
     ASSERT_TRUE(driver.isReady()) << driver.errors();
     EXPECT_EQ(driver.inside([&] {
-        const MotorFile before(kMotor, O_RDWR);
+        const std::string path = motorPath();
+        const MotorFile before(path, O_RDWR);
         std::string results = before.upload();
         results += " " + driver.ask("unplug motor");
         results += before.upload();
-        results += " " + openNode(kMotor, O_RDWR);
+        results += " " + openNode(path, O_RDWR);
         results += " " + driver.ask("plug motor");
         results += before.upload();
-        const MotorFile after(kMotor, O_RDWR);
+        const MotorFile after(path, O_RDWR);
         return results + " " + after.upload();
     }),
-              "0 ok ENODEV ENODEV ok ENODEV 0");
+              std::string("0 ok ENODEV ") + (*GetParam() == '\0' ? "ENODEV" : "ENOENT") +
+                      " ok ENODEV 0");
     EXPECT_THAT(driver.rawJournal(), HasSubstr(R"("op":"unplug","node":"motor"})"));
     EXPECT_THAT(driver.rawJournal(), HasSubstr(R"("op":"plug","node":"motor"})"));
 }
 
-TEST(Unplug, TheListOfInputDevicesFollows) {
-    const RunningDriver driver(R"({"motor": {"event": 9}, "faults": [
-            {"node": "motor", "op": "upload", "unplug": true, "times": 1}]})");
+TEST_P(Unplug, TheListOfInputDevicesFollows) {
+    const RunningDriver driver(R"({"motor": {}, "faults": [
+            {"node": "motor", "op": "upload", "unplug": true, "times": 1}]})",
+                               GetParam());
     ASSERT_TRUE(driver.isReady()) << driver.errors();
     const auto devices = [&] { return driver.inside([] { return readNode(kDevices); }); };
-    EXPECT_THAT(devices(), HasSubstr("Handlers=event9 "));
-    EXPECT_EQ(driver.inside([] { return MotorFile(kMotor, O_RDWR).upload(); }), "ENODEV");
-    EXPECT_THAT(devices(), Not(HasSubstr("Handlers=event9 ")));
-    EXPECT_THAT(devices(), HasSubstr("Handlers=sysrq kbd leds event0 "));
-    driver.ask("plug motor");
-    EXPECT_THAT(devices(), HasSubstr("Handlers=event9 "));
+    EXPECT_THAT(devices(), HasSubstr("\"qvx_vibrator_inputff\""));
+    EXPECT_EQ(driver.inside([] { return OpenMotor().upload(); }), "ENODEV");
+    driver.ask("settle");
+    EXPECT_THAT(devices(), Not(HasSubstr("\"qvx_vibrator_inputff\"")));
+    EXPECT_THAT(devices(), HasSubstr(" kbd "));
+    EXPECT_EQ(driver.ask("clear"), "ok ");
+    EXPECT_THAT(devices(), HasSubstr("\"qvx_vibrator_inputff\""));
+    EXPECT_EQ(driver.inside(1000, [] { return OpenMotor().upload(); }), "0");
 }
 
-TEST(OtherContents, ANodeShowsThemOnce) {
+class OtherContents : public testing::TestWithParam<const char*> {};
+
+INSTANTIATE_TEST_SUITE_P(With, OtherContents, testing::ValuesIn(kBothDrivers), driverName);
+
+TEST_P(OtherContents, ANodeShowsThemOnce) {
     const RunningDriver driver(R"({"nodes": {"/sys/class/leds/vibrator/motor_type":
             {"mode": "ro", "text": "LINEAR_1040\n"}}, "faults": [
             {"node": "/sys/class/leds/vibrator/motor_type", "op": "read", "text": "COIN\n",
-             "times": 1}]})");
+             "times": 1}]})",
+                               GetParam());
     ASSERT_TRUE(driver.isReady()) << driver.errors();
     const auto shown = [&] {
         return driver.inside([] { return readNode("/sys/class/leds/vibrator/motor_type"); });

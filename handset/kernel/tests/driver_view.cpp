@@ -50,14 +50,12 @@ class InputCore
 	}
 
       private:
-	// A driver is told the id the core has chosen; what the core refuses it
-	// never hears of.
-	std::vector<Json> upload(Json line)
+	// What the core refuses a driver never hears of.
+	std::vector<Json> upload(const Json &line)
 	{
 		if (!line.at("result").is_number())
 			return {};
-		line["id"] = line["result"];
-		mLive.insert(line["id"].get<int>());
+		mLive.insert(line.at("result").get<int>());
 		return {line};
 	}
 
