@@ -105,8 +105,9 @@ int qvx_meet_fault(struct qvx_target *target, enum qvx_op op, char *buffer,
 		return 0;
 	/* One tick more: the one that runs has begun already. */
 	if (delay && wait_event_interruptible_timeout(
-			     delayed, leaving, msecs_to_jiffies(delay) + 1))
-		error = -EINTR;
+			     delayed, leaving || target->lost,
+			     msecs_to_jiffies(delay) + 1))
+		error = target->lost ? -ENODEV : -EINTR;
 	snprintf(strike->members, sizeof(strike->members),
 		 ",\"fault\":%d,\"took\":%lld", number,
 		 ktime_us_delta(ktime_get(), arrival));
@@ -166,7 +167,12 @@ static int set_plugged(struct qvx_target *target, bool plugged)
 	else
 		unplug(target);
 	mutex_unlock(&fault_lock);
-	if (!plugged && target->unplug)
+	if (!target->unplug)
+		return 0;
+	/* A motor in a call goes when that has ended. */
+	target->lost = !plugged;
+	wake_up_all(&delayed);
+	if (!plugged)
 		flush_work(target->unplug);
 	return 0;
 }

@@ -34,7 +34,8 @@ struct work_struct;
 
 /* Whose calls faults strike: a node or the motor. */
 struct qvx_target {
-	bool gone;		    /* unplugged: calls fail */
+	bool gone; /* unplugged: calls fail */
+	bool lost; /* a motor unplugged by request: a delayed call ends */
 	struct work_struct *unplug; /* takes the motor away; null for a node */
 };
 

@@ -60,6 +60,17 @@ TEST_P(Unplug, TheListOfInputDevicesFollows) {
     EXPECT_EQ(driver.inside(1000, [] { return OpenMotor().upload(); }), "0");
 }
 
+// With the kernel's driver, where the motor can go only when nobody is in a call.
+TEST(UnplugOfTheKernels, AMotorDoesNotWaitForADelay) {
+    const RunningDriver driver(R"({"motor": {}, "faults": [
+            {"node": "motor", "op": "upload", "delay": 100000}]})",
+                               QVX_MODULE);
+    ASSERT_TRUE(driver.isReady()) << driver.errors();
+    EXPECT_EQ(driver.ask("unplug motor 3000"), "ok ");
+    EXPECT_EQ(driver.inside(1000, [] { return OpenMotor().upload(); }), "ENODEV");
+    EXPECT_THAT(driver.rawJournal(), HasSubstr(R"("fault":{"delay":100000},"took":)"));
+}
+
 class OtherContents : public testing::TestWithParam<const char*> {};
 
 INSTANTIATE_TEST_SUITE_P(With, OtherContents, testing::ValuesIn(kBothDrivers), driverName);
