@@ -34,8 +34,8 @@ namespace handset {
 
 class ControlRequests {
   public:
-    // The references outlive the object. `tree` is null where the nodes are the kernel's. `settle` returns once the journal has what was done so
-    // far; it is called before each request.
+    // The references outlive the object. `tree` is null where the nodes are the kernel's. `settle`
+    // returns once the journal has what was done so far; it is called before each request.
     ControlRequests(const Profile& profile, const NodeTree* tree, FaultInjector& faults,
                     Journal& journal, std::function<void()> settle)
         : mProfile(profile),
