@@ -37,8 +37,6 @@ constexpr Name kStatusNames[] = {
         {STATUS_UNEXPECTED_NULL, "UNEXPECTED_NULL"},
 };
 
-constexpr int32_t kHasReplyHeader = -128;  // on the wire only, see status_header.cpp
-
 constexpr Name kExceptionNames[] = {
         {EX_NONE, "EX_NONE"},
         {EX_SECURITY, "EX_SECURITY"},

@@ -18,6 +18,9 @@ struct AStatus {
 
 namespace binder_ndk {
 
+// The exception that stands for a header in front of the status: on the wire only.
+inline constexpr int32_t kHasReplyHeader = -128;
+
 class Parcel;
 
 // `status`, or STATUS_UNKNOWN_ERROR, with a warning, for a value that has no name.

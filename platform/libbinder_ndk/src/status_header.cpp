@@ -16,8 +16,6 @@
 namespace binder_ndk {
 namespace {
 
-constexpr int32_t kHasReplyHeader = -128;
-
 // Skips a block whose size word counts itself from `start` or only what follows it.
 binder_status_t skipBlock(const Parcel& parcel, bool sizeCountsItself) {
     const size_t start = parcel.position();
