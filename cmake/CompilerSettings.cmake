@@ -41,7 +41,7 @@ if(QVX_SANITIZE)
 endif()
 
 # A target's sources are compiled six at a time, in half the time: most of it goes into what they
-# share, so their unnamed namespaces must not declare the same name. Lint reads each alone.
+# share, so their unnamed namespaces must not declare the same name.
 function(qvx_compile_together name)
     set_target_properties(${name} PROPERTIES UNITY_BUILD ON UNITY_BUILD_BATCH_SIZE 6)
 endfunction()
