@@ -63,12 +63,16 @@ void letThreadsEnd();
 // Instructions since the guest's start, in a guest whose clock counts them.
 int64_t now();
 
+// Puts the kernel's random pool, which takes in every input event, into the same state again.
+void alignRandomPool();
+
 // Counts of the same thing.
 class Series {
   public:
     // Counts one call.
     template <typename Call>
     void measure(const Call& call) {
+        alignRandomPool();
         const int64_t start = now();
         call();
         add(now() - start);
