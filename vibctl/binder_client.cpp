@@ -97,7 +97,6 @@ Service connect(const std::string& iface, Problem& problem) {
 }
 
 Outcome listServices() {
-    using Clock = std::chrono::steady_clock;
     std::vector<std::string> names;
     const std::shared_ptr<IServiceManager> manager = findManager();
     if (manager == nullptr) return outcomeOf(ndk::ScopedAStatus::fromStatus(STATUS_DEAD_OBJECT));

@@ -166,7 +166,6 @@ struct Binding<kMember> {
     }
 
     static Outcome makeCall(I& service, Values& values, const Callback& callback, Show show) {
-        using Clock = std::chrono::steady_clock;
         const Clock::time_point before = Clock::now();
         const ndk::ScopedAStatus status = std::apply(
                 [&](auto&... value) { return (service.*kMember)(passOn<P>(value, callback)...); },

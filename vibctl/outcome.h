@@ -23,6 +23,9 @@ enum class Exit : int {
     kNoCallback = 4,  // the call succeeded, and the awaited callback did not come
 };
 
+// What a call's times are taken by.
+using Clock = std::chrono::steady_clock;
+
 // What became of the callback of a composition.
 struct Completion {
     enum class Kind { kNotAwaited, kCompleted, kTimedOut };

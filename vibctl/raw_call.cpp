@@ -63,7 +63,6 @@ Problem parseRawCall(Words arguments, RawCall& call) {
 }
 
 Outcome sendRaw(const Service& service, const RawCall& call) {
-    using Clock = std::chrono::steady_clock;
     const ndk::SpAIBinder binder = service->asBinder();
     ndk::ScopedAParcel in;
     ndk::ScopedAParcel out;

@@ -22,7 +22,6 @@ namespace vibctl {
 
 namespace {
 
-using Clock = std::chrono::steady_clock;
 using std::chrono::milliseconds;
 
 // What is waited for after a call: the callback, or the death of the one who was to call it.

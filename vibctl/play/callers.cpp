@@ -23,7 +23,6 @@ namespace vibctl {
 
 namespace {
 
-using Clock = std::chrono::steady_clock;
 using android::base::unique_fd;
 
 // The users who call, but for this one.

@@ -29,7 +29,7 @@ class Callers {
     void keepOwn(Plan& plan) const;
 
     // Waits until every process is ready to play, or has given up; when the calls at 0 are due.
-    std::chrono::steady_clock::time_point start();
+    Clock::time_point start();
 
     // To be called at the end by each of them. In the first process, waits for the others: `own`, or
     // what the first of them came to that did not end well. In the others `own`.

@@ -20,8 +20,6 @@ namespace vibctl {
 
 namespace {
 
-using Clock = std::chrono::steady_clock;
-
 // A composition has to be given one; when it is called does not matter here.
 class IgnoredCallback : public aidl::android::hardware::vibrator::BnVibratorCallback {
     ndk::ScopedAStatus onComplete() override { return ndk::ScopedAStatus::ok(); }

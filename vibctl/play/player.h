@@ -19,7 +19,7 @@ Offers askOffers(const CommandLine& line, Outcome& outcome);
 using OnCall = std::function<void(const TimedCall& call, const Outcome& outcome, int64_t late)>;
 
 // When the calls at 0 are due; asked when everything is ready for them.
-using Start = std::function<std::chrono::steady_clock::time_point()>;
+using Start = std::function<Clock::time_point()>;
 
 // Makes the calls at absolute times. The outcome is that of the first call that failed, else of the
 // last; one that does not get through ends the playing.
