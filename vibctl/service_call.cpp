@@ -36,18 +36,21 @@ class CompletionCallback : public aidl::android::hardware::vibrator::BnVibratorC
 
     // To be called before the call: `callback` hears of the death of the service.
     static void watch(const std::shared_ptr<CompletionCallback>& callback, const Service& service) {
-        callback->mService = service;
         callback->mCalled = Clock::now();
         // Whoever holds the callback may let go of it before the service dies. The recipient and what
-        // it is given stay: a notice may be on its way at any time.
-        using Weak = std::weak_ptr<CompletionCallback>;
+        // it is given stay: a notice may be on its way at any time. So does the service: to let go of
+        // it is to ask for no notice, and the kernel complains of who ends before that is confirmed.
+        struct Watch {
+            std::weak_ptr<CompletionCallback> callback;
+            Service service;
+        };
         static AIBinder_DeathRecipient* const recipient =
-                AIBinder_DeathRecipient_new([](void* weak) {
-                    if (const auto self = static_cast<Weak*>(weak)->lock())
+                AIBinder_DeathRecipient_new([](void* watch) {
+                    if (const auto self = static_cast<Watch*>(watch)->callback.lock())
                         self->finish(End::kDied);
                 });
-        auto* const weak = new Weak(callback);
-        if (AIBinder_linkToDeath(service->asBinder().get(), recipient, weak) != STATUS_OK)
+        auto* const watch = new Watch{callback, service};
+        if (AIBinder_linkToDeath(service->asBinder().get(), recipient, watch) != STATUS_OK)
             callback->finish(End::kDied);
     }
 
@@ -71,7 +74,6 @@ class CompletionCallback : public aidl::android::hardware::vibrator::BnVibratorC
     std::mutex mMutex;
     std::condition_variable mEnded;
     End mEnd = End::kTimedOut;
-    Service mService;
     Clock::time_point mCalled;
     Clock::time_point mWhen;
 };

@@ -2,7 +2,11 @@
 //
 // The client over a real binder: exit statuses, callbacks, and every way in which there may be no
 // service.
+#include <sys/mount.h>
+#include <unistd.h>
+
 #include <chrono>
+#include <fstream>
 #include <memory>
 #include <string>
 #include <vector>
@@ -36,6 +40,18 @@ constexpr const char* kManifest =
 // Both of the program's streams are in the result's `out`.
 CommandResult run(const std::string& arguments) {
     return qvx::test::runShell(std::string(VIBCTL_PROGRAM) + " " + arguments + " 2>&1");
+}
+
+// How often the driver has been asked for this since the guest's start.
+long countOf(const std::string& request) {
+    constexpr const char* kStatistics = "/sys/kernel/debug/binder/stats";
+    if (access(kStatistics, R_OK) != 0) mount("none", "/sys/kernel/debug", "debugfs", 0, nullptr);
+    std::ifstream file(kStatistics);
+    long count = 0;
+    for (std::string word; file >> word && word != "proc";) {
+        if (word == request) file >> count;
+    }
+    return count;
 }
 
 class VibctlTest : public ::testing::Test {
@@ -222,6 +238,15 @@ TEST_F(VibctlWithService, ReportsWhenACompositionCompletes) {
     EXPECT_LT(callback.get<int>(), 2000);
     EXPECT_THAT(run("std compose 20,CLICK,1 --callback").out,
                 HasSubstr("compose: ok, completed after "));
+}
+
+// Whoever ends before the driver has confirmed that leaves a complaint in the kernel's log.
+TEST_F(VibctlWithService, EndsWithoutAskingForNoNoticeOfTheServicesDeath) {
+    const long asked = countOf("BC_REQUEST_DEATH_NOTIFICATION:");
+    const long takenBack = countOf("BC_CLEAR_DEATH_NOTIFICATION:");
+    EXPECT_TRUE(callbackOf("std compose 20,CLICK,1 --callback").is_number());
+    EXPECT_EQ(countOf("BC_REQUEST_DEATH_NOTIFICATION:"), asked + 1);
+    EXPECT_EQ(countOf("BC_CLEAR_DEATH_NOTIFICATION:"), takenBack);
 }
 
 TEST_F(VibctlWithService, ReportsWhenAPiecewiseLinearCompositionCompletes) {
