@@ -46,7 +46,6 @@ using std::chrono::seconds;
 
 constexpr uid_t kUsers[] = {kRoot, kSystem, kShell, kApp};
 constexpr const char* kSanitizerReports = "/run/soak";
-constexpr const char* kBinderState = "/sys/kernel/debug/binder/state";
 constexpr size_t kRequestsPerRound = std::size(kUsers) * User::kPerRound;
 constexpr int kFaultsPerRound = 20;
 constexpr int kUserDeathsPerRound = 2;
@@ -205,7 +204,7 @@ class Soak : public testing::TestWithParam<const char*> {
         if (isCalm(round)) processes["service"] = service;
         mSamples.push_back(footprintOf(processes));
         if (!isCalm(round) || isCalm(round + 1)) return;
-        EXPECT_THAT(growthOver({mSamples.end() - kStretch, mSamples.end()}), IsEmpty());
+        EXPECT_THAT(growthOver({mSamples.end() - kStretch, mSamples.end()}, "service"), IsEmpty());
     }
 
     void report() const {
